@@ -1,0 +1,22 @@
+# What every target is compiled with.
+add_library(vexo_settings INTERFACE)
+target_compile_options(vexo_settings INTERFACE -Wall -Wextra -Wpedantic -Wshadow -Wnon-virtual-dtor
+                                               -Woverloaded-virtual -fno-omit-frame-pointer)
+# Operations and fields of the system begin with an underscore and keep their names to the letter. As class
+# members they clash with nothing, so Clang's warning about reserved names says nothing useful here.
+if(CMAKE_CXX_COMPILER_ID STREQUAL "Clang")
+    target_compile_options(vexo_settings INTERFACE -Wno-reserved-identifier -Wthread-safety)
+endif()
+if(VEXO_WARNINGS_AS_ERRORS)
+    target_compile_options(vexo_settings INTERFACE -Werror)
+endif()
+if(VEXO_SANITIZE)
+    target_compile_options(vexo_settings INTERFACE -fsanitize=${VEXO_SANITIZE} -fno-sanitize-recover=all)
+    target_link_options(vexo_settings INTERFACE -fsanitize=${VEXO_SANITIZE})
+endif()
+
+find_program(CCACHE ccache)
+if(CCACHE)
+    set(CMAKE_CXX_COMPILER_LAUNCHER ${CMAKE_COMMAND} -E env
+        CCACHE_SLOPPINESS=pch_defines,time_macros,include_file_mtime,include_file_ctime ${CCACHE})
+endif()

@@ -1,0 +1,14 @@
+// Class-level utilities. Callable from any thread.
+#pragma once
+
+#include <string>
+
+namespace vexo {
+
+struct VXMediaBrowserUtilities {
+    // supportedMovieFile:; whether the host plays the file at `path` as a movie, told by its type. Does not
+    // read the file.
+    static bool supportedMovieFile(const std::string& path);
+};
+
+}  // namespace vexo

@@ -1,0 +1,88 @@
+// One item of a tree: a movie file, or a movie that stands for a project.
+//
+// Items have identity and are shared. Every operation is callable from any thread; a reader sees either the
+// old or the new value of a field that is being set.
+#pragma once
+
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "host/VXMetadata.h"
+#include "platform/Image.h"
+#include "platform/SnapshotList.h"
+#include "platform/ThreadSafety.h"
+#include "platform/URL.h"
+#include "platform/Value.h"
+
+namespace vexo {
+
+class VXMediaObject;
+using VXMediaObjectRef = std::shared_ptr<VXMediaObject>;
+
+class VXMediaObject final {
+  public:
+    // Items are made by VXMediaManager::newMediaObjectWithType, nothing else needs this.
+    VXMediaObject(int mediaType, std::string name, std::string objectID);
+
+    int mediaType() const { return mediaType_; }
+    const std::string& ID() const { return ID_; }
+
+    std::string name() const VX_EXCLUDES(mutex_);
+    void setName(std::string name) VX_EXCLUDES(mutex_);
+    std::optional<std::string> path() const VX_EXCLUDES(mutex_);
+    void setPath(std::string path) VX_EXCLUDES(mutex_);
+    std::optional<platform::URL> URL() const;  // of the path; nil without one
+    int mediaSourceType() const VX_EXCLUDES(mutex_);
+    void setMediaSourceType(int mediaSourceType) VX_EXCLUDES(mutex_);
+
+    // Seconds; 0 when unknown. Waits for the file's metadata where the attribute is not set.
+    double duration() const;
+
+    platform::ImageRef icon() const VX_EXCLUDES(mutex_);
+    void setIcon(platform::ImageRef icon) VX_EXCLUDES(mutex_);
+    platform::ImageRef thumbnailImage() const VX_EXCLUDES(mutex_);
+    // Setting an item's own thumbnail again makes the host redraw it.
+    void setThumbnailImage(platform::ImageRef image) VX_EXCLUDES(mutex_);
+
+    // attributeForKey:. What is not set falls back on the file's metadata properties for the duration, the
+    // resolution and its text, and may then wait for the file.
+    std::optional<platform::Value> attributeForKey(std::string_view key) const VX_EXCLUDES(mutex_);
+    // setAttribute:forKey:
+    void setAttribute(platform::Value attribute, std::string_view forKey) VX_EXCLUDES(mutex_);
+    // What was set, without the fallback.
+    platform::Dictionary attributes() const VX_EXCLUDES(mutex_);
+
+    // setSpotlightProperties:
+    void setSpotlightProperties(VXMetadataPropertiesRef properties) VX_EXCLUDES(mutex_);
+    VXMetadataPropertiesRef spotlightProperties() const VX_EXCLUDES(mutex_);  // nil when none were set
+    // spotlightProperties:; the properties of the file at `path`, never nil.
+    static VXMetadataPropertiesRef spotlightProperties(const std::string& path);
+
+    // The path as other programs know it; nil without a path or where its volume is gone.
+    std::optional<std::string> aliasResolvedPath() const;
+    // aliasResolvedPath:; `path` with aliases resolved. Links are followed by the file system itself, so a
+    // library that is a link keeps its own path; a name under /Volumes becomes the real path, where the
+    // volume is there, and stays as it is where not.
+    static std::string aliasResolvedPath(const std::string& path);
+
+  private:
+    std::optional<platform::Value> metadataAttributeForKey(std::string_view key) const;
+
+    const int mediaType_;
+    const std::string ID_;
+
+    mutable platform::Mutex mutex_;
+    std::string name_ VX_GUARDED_BY(mutex_);
+    std::optional<std::string> path_ VX_GUARDED_BY(mutex_);
+    platform::Dictionary attributes_ VX_GUARDED_BY(mutex_);
+    platform::ImageRef icon_ VX_GUARDED_BY(mutex_);
+    platform::ImageRef thumbnailImage_ VX_GUARDED_BY(mutex_);
+    VXMetadataPropertiesRef spotlightProperties_ VX_GUARDED_BY(mutex_);
+    int mediaSourceType_ VX_GUARDED_BY(mutex_) = 0;
+};
+
+using VXMediaObjectList = platform::SnapshotList<VXMediaObjectRef>;
+
+}  // namespace vexo

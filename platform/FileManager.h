@@ -1,0 +1,77 @@
+// What the plug-in and the host ask of the file system. Callable from any thread.
+//
+// Every operation takes paths as bytes and understands "/Volumes/<display name>/…" as a name for the mount
+// point of the volume with that display name, unless a real entry of that name exists. Nothing here writes.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <span>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "platform/ByteSource.h"
+#include "platform/Date.h"
+
+namespace platform {
+
+// The basic item flags, with the values of the system's item-flag word.
+enum ItemFlags : std::uint32_t {
+    itemIsPackage = 0x02,    // a folder that is shown as one document
+    itemIsContainer = 0x08,  // a folder, package or volume; a symbolic link never is one
+    itemIsInvisible = 0x40,  // hidden by any of the platform's means
+};
+
+enum class FileKind { file, directory };  // `file` is anything that is no directory
+
+struct FileAttributes {
+    std::uint64_t size = 0;
+    DateRef modificationDate;  // nil when unknown
+    DateRef creationDate;      // nil when the file system tells neither birth nor modification time
+};
+
+class FileManager {
+  public:
+    virtual ~FileManager() = default;
+
+    // nil when there is no home.
+    virtual std::optional<std::string> homeDirectory() const = 0;
+
+    // fileExistsAtPath:isDirectory:; links are followed. nil when nothing exists there.
+    virtual std::optional<FileKind> kindOfItemAtPath(const std::string& path) const = 0;
+    bool fileExistsAtPath(const std::string& path) const { return kindOfItemAtPath(path).has_value(); }
+
+    // contentsOfDirectoryAtPath:error:; the names as the file system lists them, without "." and "..".
+    // nil when the folder can't be listed; the reason goes to the system log.
+    virtual std::optional<std::vector<std::string>> contentsOfDirectoryAtPath(const std::string& path) const = 0;
+
+    // attributesOfItemAtPath:error:; links are followed. nil when they can't be read.
+    virtual std::optional<FileAttributes> attributesOfItemAtPath(const std::string& path) const = 0;
+
+    // LSCopyItemInfoForURL with the basic flags, a combination of ItemFlags; nil when there is no such item.
+    virtual std::optional<std::uint32_t> itemFlagsAtPath(const std::string& path) const = 0;
+
+    // displayNameAtPath:; a volume's label for a mount point, else the last component. nil for no item.
+    virtual std::optional<std::string> displayNameAtPath(const std::string& path) const = 0;
+
+    // getxattr. Answers the size of the value, or a negative number when the attribute is missing or does
+    // not fit. An empty buffer asks for the size alone. Links are followed.
+    virtual std::ptrdiff_t extendedAttribute(const std::string& path, std::string_view name,
+                                             std::span<char> buffer) const = 0;
+
+    // statfs; the file system's type name ("ext4", "msdos", "nfs", …). nil when the call fails.
+    virtual std::optional<std::string> fileSystemTypeNameAtPath(const std::string& path) const = 0;
+
+    // Opens a plain file for reading. nil when it can't be read or is no plain file: FIFOs, devices,
+    // sockets and folders are never opened, so the call doesn't block.
+    virtual std::unique_ptr<ByteSource> openFileAtPath(const std::string& path) const = 0;
+
+    // The path with "/Volumes/<display name>" replaced by the volume's mount point; any other path as it is.
+    // nil where no volume has the name.
+    virtual std::optional<std::string> resolvedPath(const std::string& path) const = 0;
+};
+
+}  // namespace platform

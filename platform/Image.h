@@ -1,0 +1,71 @@
+// Images with identity. Two images may show the same picture and still be two objects: `copy` makes a
+// distinct image that shares the picture.
+//
+// An image is set up by the thread that makes it and is not changed once others can see it.
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "platform/Value.h"
+
+namespace platform {
+
+// Pixels as premultiplied ARGB, 8 bits a channel in native byte order, rows from the top without padding.
+struct Bitmap {
+    int width = 0;
+    int height = 0;
+    std::vector<std::uint32_t> pixels;
+};
+
+// A picture that can be drawn at any size. Immutable and thread-safe.
+class Picture {
+  public:
+    virtual ~Picture() = default;
+
+    virtual Size naturalSize() const = 0;  // in points
+    // False when the picture's data is damaged.
+    virtual bool isDrawable() const = 0;
+    // The whole picture scaled to `width` x `height` pixels; nil when it can't be drawn.
+    virtual std::optional<Bitmap> draw(int width, int height) const = 0;
+};
+
+class Image;
+using ImageRef = std::shared_ptr<Image>;
+
+class Image {
+  public:
+    explicit Image(std::shared_ptr<const Picture> picture, std::string name = {});
+
+    // A distinct image of the same picture, name and size.
+    ImageRef copy() const;
+
+    const std::string& name() const { return name_; }  // empty when it has none
+    Size size() const { return size_; }                // in points
+    void setSize(Size size) { size_ = size; }
+    // Whether a change of size scales the picture (else it is drawn at its natural size).
+    bool scalesWhenResized() const { return scalesWhenResized_; }
+    void setScalesWhenResized(bool scales) { scalesWhenResized_ = scales; }
+
+    // False when the image can't be drawn.
+    bool isValid() const;
+    const std::shared_ptr<const Picture>& picture() const { return picture_; }
+
+  private:
+    std::shared_ptr<const Picture> picture_;
+    std::string name_;
+    Size size_;
+    bool scalesWhenResized_ = false;
+};
+
+// A picture from an SVG or PNG file, read at once; nil when there is no such file. A damaged file gives a
+// picture that is not drawable.
+std::shared_ptr<const Picture> pictureWithContentsOfFile(const std::string& path);
+
+// The PNG encoding of a bitmap.
+std::vector<std::byte> pngData(const Bitmap& bitmap);
+
+}  // namespace platform
