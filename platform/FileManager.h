@@ -68,6 +68,17 @@ class FileManager {
     // Opens a plain file for reading. nil when it can't be read or is no plain file: FIFOs, devices,
     // sockets and folders are never opened, so the call doesn't block.
     virtual std::unique_ptr<ByteSource> openFileAtPath(const std::string& path) const = 0;
+    // contentsAtPath:; all of a plain file of at most `limit` bytes. nil for a longer one, and for what
+    // openFileAtPath refuses.
+    std::optional<std::vector<std::byte>> contentsAtPath(const std::string& path, std::uint64_t limit) const {
+        const std::unique_ptr<ByteSource> file = openFileAtPath(path);
+        if (!file || file->size() > limit)
+            return std::nullopt;
+        std::vector<std::byte> bytes(file->size());
+        if (!file->read(0, bytes))
+            return std::nullopt;
+        return bytes;
+    }
 
     // The path with "/Volumes/<display name>" replaced by the volume's mount point; any other path as it is.
     // nil where no volume has the name.

@@ -4,9 +4,11 @@
 // An image is set up by the thread that makes it and is not changed once others can see it.
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <memory>
 #include <optional>
+#include <span>
 #include <string>
 #include <vector>
 
@@ -29,7 +31,8 @@ class Picture {
     virtual Size naturalSize() const = 0;  // in points
     // False when the picture's data is damaged.
     virtual bool isDrawable() const = 0;
-    // The whole picture scaled to `width` x `height` pixels; nil when it can't be drawn.
+    // The whole picture scaled to `width` x `height` pixels; nil when it can't be drawn, or for sizes below 1
+    // or beyond what pictureWithData allows.
     virtual std::optional<Bitmap> draw(int width, int height) const = 0;
 };
 
@@ -61,11 +64,16 @@ class Image {
     bool scalesWhenResized_ = false;
 };
 
-// A picture from an SVG or PNG file, read at once; nil when there is no such file. A damaged file gives a
-// picture that is not drawable.
+// A picture of the bytes of an SVG or PNG file, never nil. Damaged bytes give a picture that is not drawable;
+// so do pictures of more than 16384 points a side or 64 Mi points in all, compressed SVG, and SVG that tells
+// no size. Nothing outside the bytes is loaded, whatever an SVG refers to.
+std::shared_ptr<const Picture> pictureWithData(std::span<const std::byte> data);
+
+// The picture in an SVG or PNG file, read at once through the file manager; nil when there is no plain file
+// of at most 8 MiB that can be read.
 std::shared_ptr<const Picture> pictureWithContentsOfFile(const std::string& path);
 
-// The PNG encoding of a bitmap.
+// The PNG encoding of a bitmap; empty when the bitmap is, or when it can't be encoded.
 std::vector<std::byte> pngData(const Bitmap& bitmap);
 
 }  // namespace platform

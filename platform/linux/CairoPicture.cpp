@@ -1,0 +1,218 @@
+// Pictures drawn with Cairo: PNG by its own decoder, SVG by librsvg.
+#include <cairo.h>
+#include <librsvg/rsvg.h>
+
+#include <array>
+#include <cstring>
+#include <new>
+
+#include "platform/Image.h"
+#include "platform/ThreadSafety.h"
+
+namespace platform {
+
+namespace {
+
+using Bytes = std::span<const std::byte>;
+
+struct Free {
+    void operator()(cairo_surface_t* surface) const { cairo_surface_destroy(surface); }
+    void operator()(cairo_t* context) const { cairo_destroy(context); }
+    void operator()(RsvgHandle* handle) const { g_object_unref(handle); }
+};
+using Surface = std::unique_ptr<cairo_surface_t, Free>;
+using Context = std::unique_ptr<cairo_t, Free>;
+using Handle = std::unique_ptr<RsvgHandle, Free>;
+
+bool isAllowedSize(double width, double height) {
+    constexpr double longestSide = 16384;
+    constexpr double largestArea = 64.0 * 1024 * 1024;
+    return width >= 1 && height >= 1 && width <= longestSide && height <= longestSide &&
+           width * height <= largestArea;
+}
+
+// A surface that shows the bitmap's own pixels. Cairo takes no const pixels; one that is only read from
+// leaves them alone.
+Surface surfaceOf(const Bitmap& bitmap) {
+    auto* pixels = reinterpret_cast<unsigned char*>(const_cast<std::uint32_t*>(bitmap.pixels.data()));
+    return Surface(cairo_image_surface_create_for_data(pixels, CAIRO_FORMAT_ARGB32, bitmap.width,
+                                                       bitmap.height, bitmap.width * 4));
+}
+
+// What `drawContent` draws on an area of `contentSize`, as a bitmap of the given pixels.
+template <typename DrawContent>
+std::optional<Bitmap> paint(int width, int height, Size contentSize, const DrawContent& drawContent) {
+    if (!isAllowedSize(width, height))
+        return std::nullopt;
+    Bitmap bitmap{width, height, std::vector<std::uint32_t>(std::size_t(width) * std::size_t(height))};
+    const Surface surface = surfaceOf(bitmap);
+    const Context context(cairo_create(surface.get()));
+    cairo_scale(context.get(), width / contentSize.width, height / contentSize.height);
+    if (!drawContent(context.get()) || cairo_status(context.get()) != CAIRO_STATUS_SUCCESS)
+        return std::nullopt;
+    cairo_surface_flush(surface.get());
+    return bitmap;
+}
+
+class UndrawablePicture final : public Picture {
+  public:
+    Size naturalSize() const override { return {}; }
+    bool isDrawable() const override { return false; }
+    std::optional<Bitmap> draw(int, int) const override { return std::nullopt; }
+};
+
+class BitmapPicture final : public Picture {
+  public:
+    explicit BitmapPicture(Bitmap bitmap) : bitmap_(std::move(bitmap)) {}
+
+    Size naturalSize() const override { return {double(bitmap_.width), double(bitmap_.height)}; }
+    bool isDrawable() const override { return true; }
+    std::optional<Bitmap> draw(int width, int height) const override {
+        return paint(width, height, naturalSize(), [this](cairo_t* context) {
+            // Cairo counts the users of a surface's pixels without a lock, so each call has a surface of its
+            // own.
+            const Surface surface = surfaceOf(bitmap_);
+            cairo_set_source_surface(context, surface.get(), 0, 0);
+            // Without it the edges of an enlarged picture fade out.
+            cairo_pattern_set_extend(cairo_get_source(context), CAIRO_EXTEND_PAD);
+            cairo_paint(context);
+            return true;
+        });
+    }
+
+  private:
+    const Bitmap bitmap_;
+};
+
+class VectorPicture final : public Picture {
+  public:
+    VectorPicture(Handle handle, Size size) : handle_(std::move(handle)), size_(size) {}
+
+    Size naturalSize() const override { return size_; }
+    bool isDrawable() const override { return true; }
+    std::optional<Bitmap> draw(int width, int height) const override VX_EXCLUDES(mutex_) {
+        return paint(width, height, size_, [this](cairo_t* context) { return render(context); });
+    }
+
+  private:
+    bool render(cairo_t* context) const VX_EXCLUDES(mutex_) {
+        const RsvgRectangle area{0, 0, size_.width, size_.height};
+        Locked lock(mutex_);
+        return rsvg_handle_render_document(handle_.get(), context, &area, nullptr);
+    }
+
+    mutable Mutex mutex_;
+    const Handle handle_ VX_GUARDED_BY(mutex_);  // even drawing changes its state
+    const Size size_;
+};
+
+constexpr std::array<unsigned char, 8> pngSignature{0x89, 'P', 'N', 'G', '\r', '\n', 0x1a, '\n'};
+
+bool isPNG(Bytes data) {
+    return data.size() >= pngSignature.size() && std::memcmp(data.data(), pngSignature.data(), 8) == 0;
+}
+
+std::uint32_t bigEndian(Bytes data, std::size_t offset) {
+    std::uint32_t number = 0;
+    for (std::byte byte : data.subspan(offset, 4))
+        number = number << 8 | std::to_integer<std::uint32_t>(byte);
+    return number;
+}
+
+// Whether the header declares a size that may be decoded. It stands at a fixed place in every PNG.
+bool declaresAllowedSize(Bytes png) {
+    constexpr std::size_t widthOffset = 16, heightOffset = 20, headerEnd = 24;
+    return png.size() >= headerEnd &&
+           isAllowedSize(bigEndian(png, widthOffset), bigEndian(png, heightOffset));
+}
+
+cairo_status_t takeBytes(void* closure, unsigned char* buffer, unsigned int count) {
+    Bytes& rest = *static_cast<Bytes*>(closure);
+    if (count > rest.size())
+        return CAIRO_STATUS_READ_ERROR;
+    std::memcpy(buffer, rest.data(), count);
+    rest = rest.subspan(count);
+    return CAIRO_STATUS_SUCCESS;
+}
+
+std::optional<Bitmap> decodedPNG(Bytes data) {
+    if (!declaresAllowedSize(data))
+        return std::nullopt;
+    const Surface surface(cairo_image_surface_create_from_png_stream(takeBytes, &data));
+    if (cairo_surface_status(surface.get()) != CAIRO_STATUS_SUCCESS)
+        return std::nullopt;
+    const int width = cairo_image_surface_get_width(surface.get());
+    const int height = cairo_image_surface_get_height(surface.get());
+    return paint(width, height, {double(width), double(height)}, [&](cairo_t* context) {
+        cairo_set_source_surface(context, surface.get(), 0, 0);
+        cairo_paint(context);
+        return true;
+    });
+}
+
+bool isCompressed(Bytes data) {
+    return data.size() >= 2 && data[0] == std::byte{0x1f} && data[1] == std::byte{0x8b};
+}
+
+Handle parsedSVG(Bytes data) {
+    // A compressed picture could unfold to any size. Data without a base location can load no other file.
+    if (data.empty() || isCompressed(data))
+        return nullptr;
+    Handle handle(
+        rsvg_handle_new_from_data(reinterpret_cast<const guint8*>(data.data()), data.size(), nullptr));
+    if (handle)
+        rsvg_handle_set_dpi(handle.get(), 96);  // 96 CSS pixels are an inch
+    return handle;
+}
+
+// From width and height, else from the view box. A point is a CSS pixel.
+Size sizeOf(RsvgHandle& handle) {
+    Size size;
+    if (rsvg_handle_get_intrinsic_size_in_pixels(&handle, &size.width, &size.height))
+        return size;
+    gboolean hasViewBox = FALSE;
+    RsvgRectangle viewBox{};
+    rsvg_handle_get_intrinsic_dimensions(&handle, nullptr, nullptr, nullptr, nullptr, &hasViewBox, &viewBox);
+    return hasViewBox ? Size{viewBox.width, viewBox.height} : Size{};
+}
+
+cairo_status_t appendBytes(void* closure, const unsigned char* buffer, unsigned int count) try {
+    auto& bytes = *static_cast<std::vector<std::byte>*>(closure);
+    const auto* first = reinterpret_cast<const std::byte*>(buffer);
+    bytes.insert(bytes.end(), first, first + count);
+    return CAIRO_STATUS_SUCCESS;
+} catch (const std::bad_alloc&) {
+    return CAIRO_STATUS_NO_MEMORY;  // no exception may pass through Cairo
+}
+
+bool isWhole(const Bitmap& bitmap) {
+    return isAllowedSize(bitmap.width, bitmap.height) &&
+           bitmap.pixels.size() == std::size_t(bitmap.width) * std::size_t(bitmap.height);
+}
+
+}  // namespace
+
+std::shared_ptr<const Picture> pictureWithData(std::span<const std::byte> data) {
+    if (isPNG(data)) {
+        if (auto bitmap = decodedPNG(data))
+            return std::make_shared<BitmapPicture>(*std::move(bitmap));
+        return std::make_shared<UndrawablePicture>();
+    }
+    Handle handle = parsedSVG(data);
+    const Size size = handle ? sizeOf(*handle) : Size{};
+    if (!isAllowedSize(size.width, size.height))
+        return std::make_shared<UndrawablePicture>();
+    return std::make_shared<VectorPicture>(std::move(handle), size);
+}
+
+std::vector<std::byte> pngData(const Bitmap& bitmap) {
+    std::vector<std::byte> bytes;
+    if (!isWhole(bitmap))
+        return bytes;
+    const Surface surface = surfaceOf(bitmap);
+    if (cairo_surface_write_to_png_stream(surface.get(), appendBytes, &bytes) != CAIRO_STATUS_SUCCESS)
+        bytes.clear();
+    return bytes;
+}
+
+}  // namespace platform

@@ -1,0 +1,249 @@
+#include "platform/Image.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <thread>
+
+#include "tests/support/TemporaryFolder.h"
+
+namespace platform {
+namespace {
+
+using testing::Each;
+using testing_support::TemporaryFolder;
+
+constexpr std::uint32_t opaqueRed = 0xffff0000, opaqueBlue = 0xff0000ff, transparent = 0;
+
+std::shared_ptr<const Picture> pictureOf(std::string_view text) {
+    return pictureWithData(std::as_bytes(std::span(text)));
+}
+
+std::string svg(std::string_view attributes, std::string_view content) {
+    return "<svg xmlns='http://www.w3.org/2000/svg' xmlns:xlink='http://www.w3.org/1999/xlink' " +
+           std::string(attributes) + ">" + std::string(content) + "</svg>";
+}
+
+// Red on the left, blue on the right.
+std::string twoColours(std::string_view attributes = "width='4' height='2'") {
+    return svg(attributes,
+               "<rect width='2' height='2' fill='#f00'/><rect x='2' width='2' height='2' fill='#00f'/>");
+}
+
+Bitmap redBesideBlue() {
+    return {2, 1, {opaqueRed, opaqueBlue}};
+}
+
+std::shared_ptr<const Picture> pngPictureOf(const Bitmap& bitmap) {
+    return pictureWithData(pngData(bitmap));
+}
+
+std::uint32_t pixel(const Bitmap& bitmap, int x, int y) {
+    return bitmap.pixels[std::size_t(y * bitmap.width + x)];
+}
+
+auto startOfImageData(std::vector<std::byte>& png) {
+    const std::string_view marker = "IDAT";
+    return std::ranges::search(png, std::as_bytes(std::span(marker))).begin();
+}
+
+TEST(Image, TakesItsSizeFromThePicture) {
+    EXPECT_EQ(Image(pictureOf(twoColours())).size(), (Size{4, 2}));
+}
+
+TEST(Image, ACopyIsAnotherObjectWithTheSamePictureNameSizeAndFlag) {
+    Image image(pictureOf(twoColours()), "two");
+    image.setSize({16, 16});
+    image.setScalesWhenResized(true);
+
+    const ImageRef copy = image.copy();
+
+    EXPECT_NE(copy.get(), &image);
+    EXPECT_EQ(copy->picture(), image.picture());
+    EXPECT_EQ(copy->name(), "two");
+    EXPECT_EQ(copy->size(), (Size{16, 16}));
+    EXPECT_TRUE(copy->scalesWhenResized());
+}
+
+TEST(Image, ChangingACopyLeavesTheOriginalAlone) {
+    Image image(pictureOf(twoColours()));
+    image.copy()->setSize({16, 16});
+    EXPECT_EQ(image.size(), (Size{4, 2}));
+}
+
+TEST(Image, IsValidOnlyWithAPictureThatCanBeDrawn) {
+    EXPECT_TRUE(Image(pictureOf(twoColours())).isValid());
+    EXPECT_FALSE(Image(pictureOf("<svg")).isValid());
+    EXPECT_FALSE(Image(nullptr).isValid());
+}
+
+TEST(Picture, SVGIsSizedInPointsByWidthAndHeight) {
+    EXPECT_EQ(pictureOf(twoColours("width='32' height='16' viewBox='0 0 4 2'"))->naturalSize(),
+              (Size{32, 16}));
+    EXPECT_EQ(pictureOf(twoColours("width='1in' height='12px'"))->naturalSize(), (Size{96, 12}));
+}
+
+TEST(Picture, SVGWithoutWidthAndHeightIsSizedByItsViewBox) {
+    EXPECT_EQ(pictureOf(twoColours("viewBox='0 0 4 2'"))->naturalSize(), (Size{4, 2}));
+}
+
+TEST(Picture, SVGOfUnknownSizeIsNotDrawable) {
+    EXPECT_FALSE(pictureOf(twoColours(""))->isDrawable());
+}
+
+TEST(Picture, SVGIsCrispAtEverySize) {
+    const auto picture = pictureOf(twoColours());
+    for (int scale : {1, 7, 96}) {
+        const auto bitmap = picture->draw(4 * scale, 2 * scale);
+        ASSERT_TRUE(bitmap);
+        ASSERT_EQ(bitmap->pixels.size(), std::size_t(8 * scale * scale));
+        for (int y = 0; y < bitmap->height; ++y) {
+            for (int x = 0; x < bitmap->width; ++x)
+                ASSERT_EQ(pixel(*bitmap, x, y), x < 2 * scale ? opaqueRed : opaqueBlue) << x << ", " << y;
+        }
+    }
+}
+
+TEST(Picture, FillsSizesOfOtherProportionsWhole) {
+    for (const auto& picture : {pictureOf(twoColours()), pngPictureOf(redBesideBlue())}) {
+        const auto bitmap = picture->draw(2, 12);
+        ASSERT_TRUE(bitmap);
+        EXPECT_EQ(pixel(*bitmap, 0, 0), opaqueRed);
+        EXPECT_EQ(pixel(*bitmap, 1, 11), opaqueBlue);
+    }
+}
+
+TEST(Picture, WhatAnSVGLeavesFreeIsTransparent) {
+    const auto bitmap = pictureOf(svg("width='2' height='2'", ""))->draw(8, 8);
+    ASSERT_TRUE(bitmap);
+    EXPECT_THAT(bitmap->pixels, Each(transparent));
+}
+
+TEST(Picture, HalfTransparentColoursArePremultiplied) {
+    const auto picture =
+        pictureOf(svg("width='2' height='2'", "<rect width='2' height='2' fill='#fff' opacity='.5'/>"));
+    const auto bitmap = picture->draw(2, 2);
+    ASSERT_TRUE(bitmap);
+    EXPECT_THAT(bitmap->pixels, Each(testing::AnyOf(0x80808080u, 0x7f7f7f7fu)));
+}
+
+TEST(Picture, PNGKeepsEveryPixel) {
+    const Bitmap original{2, 2, {opaqueRed, opaqueBlue, transparent, 0x80800000}};
+    const auto picture = pngPictureOf(original);
+    ASSERT_TRUE(picture->isDrawable());
+    EXPECT_EQ(picture->naturalSize(), (Size{2, 2}));
+    EXPECT_EQ(picture->draw(2, 2)->pixels, original.pixels);
+}
+
+TEST(Picture, EnlargedPNGDoesNotFadeAtItsEdges) {
+    const auto bitmap = pngPictureOf(redBesideBlue())->draw(64, 32);
+    ASSERT_TRUE(bitmap);
+    EXPECT_EQ(pixel(*bitmap, 0, 0), opaqueRed);
+    EXPECT_EQ(pixel(*bitmap, 63, 31), opaqueBlue);
+}
+
+TEST(Picture, DamagedDataIsNotDrawable) {
+    std::vector<std::byte> shortPNG = pngData(redBesideBlue());
+    shortPNG.resize(shortPNG.size() / 2);
+    std::vector<std::byte> brokenPNG = pngData(redBesideBlue());
+    *(startOfImageData(brokenPNG) + 4) ^= std::byte{0xff};
+
+    for (const auto& picture :
+         {pictureWithData({}), pictureOf("no picture"), pictureOf(twoColours().substr(0, 90)),
+          pictureWithData(shortPNG), pictureWithData(brokenPNG)}) {
+        ASSERT_TRUE(picture);
+        EXPECT_FALSE(picture->isDrawable());
+        EXPECT_FALSE(picture->draw(16, 16));
+        EXPECT_EQ(picture->naturalSize(), Size());
+    }
+}
+
+TEST(Picture, EveryBeginningOfAPNGIsHarmless) {
+    const std::vector<std::byte> png = pngData(redBesideBlue());
+    for (std::size_t length = 0; length < png.size(); ++length)
+        ASSERT_TRUE(pictureWithData(std::span(png).first(length)));
+}
+
+TEST(Picture, HugeSVGIsNotDrawable) {
+    EXPECT_TRUE(pictureOf(twoColours("width='16384' height='4'"))->isDrawable());
+    EXPECT_FALSE(pictureOf(twoColours("width='16385' height='4'"))->isDrawable());
+    EXPECT_FALSE(pictureOf(twoColours("width='16384' height='16384'"))->isDrawable());
+    EXPECT_FALSE(pictureOf(twoColours("width='1e300' height='4'"))->isDrawable());
+    EXPECT_FALSE(pictureOf(twoColours("width='0' height='0'"))->isDrawable());
+}
+
+TEST(Picture, HugePNGIsRefusedBeforeItIsDecoded) {
+    std::vector<std::byte> png = pngData(redBesideBlue());
+    png[16] = std::byte{0x7f};  // the first byte of the declared width
+    EXPECT_FALSE(pictureWithData(png)->isDrawable());
+}
+
+TEST(Picture, IsNotDrawnAtImpossibleSizes) {
+    const auto picture = pictureOf(twoColours());
+    EXPECT_FALSE(picture->draw(0, 16));
+    EXPECT_FALSE(picture->draw(16, -1));
+    EXPECT_FALSE(picture->draw(16385, 1));
+    EXPECT_FALSE(picture->draw(16384, 16384));
+}
+
+TEST(Picture, SVGLoadsNoOtherFile) {
+    const TemporaryFolder folder;
+    const std::vector<std::byte> png = pngData(redBesideBlue());
+    const std::string other =
+        folder.writeFile("other.png", {reinterpret_cast<const char*>(png.data()), png.size()});
+    for (const std::string& reference : {other, "file://" + other}) {
+        const auto picture =
+            pictureOf(svg("width='2' height='1'", "<image width='2' height='1' href='" + reference +
+                                                      "' xlink:href='" + reference + "'/>"));
+        const auto bitmap = picture->draw(2, 1);
+        ASSERT_TRUE(bitmap);
+        EXPECT_THAT(bitmap->pixels, Each(transparent));
+    }
+}
+
+TEST(Picture, SVGIncludesNoOtherFile) {
+    const TemporaryFolder folder;
+    const std::string other = folder.writeFile("other.svg", twoColours());
+    const auto picture = pictureOf(svg("width='4' height='2' xmlns:xi='http://www.w3.org/2001/XInclude'",
+                                       "<xi:include href='file://" + other + "'/>"));
+    const auto bitmap = picture->draw(4, 2);
+    EXPECT_THAT(bitmap.value_or(Bitmap{}).pixels, Each(transparent));
+}
+
+TEST(Picture, EntitiesThatMultiplyAreHarmless) {
+    std::string document = "<!DOCTYPE svg [<!ENTITY a0 '<g/>'>";
+    for (int i = 1; i < 40; ++i) {
+        const std::string previous = "&a" + std::to_string(i - 1) + ";";
+        document += "<!ENTITY a" + std::to_string(i) + " '" + previous + previous + previous + "'>";
+    }
+    document += "]>" + svg("width='4' height='2'", "&a39;");
+    EXPECT_FALSE(pictureOf(document)->isDrawable());
+}
+
+TEST(Picture, CompressedSVGIsRefused) {
+    EXPECT_FALSE(pictureOf("\x1f\x8b\x08")->isDrawable());
+}
+
+TEST(Picture, DrawsOnManyThreadsAtOnce) {
+    for (const auto& picture : {pictureOf(twoColours()), pngPictureOf(redBesideBlue())}) {
+        const auto expected = picture->draw(32, 16)->pixels;
+        std::vector<std::thread> threads;
+        for (int i = 0; i < 4; ++i) {
+            threads.emplace_back([&] {
+                for (int repeat = 0; repeat < 50; ++repeat)
+                    EXPECT_EQ(picture->draw(32, 16)->pixels, expected);
+            });
+        }
+        for (auto& thread : threads)
+            thread.join();
+    }
+}
+
+TEST(PNGData, IsEmptyForABitmapThatIsNotWhole) {
+    EXPECT_TRUE(pngData({}).empty());
+    EXPECT_TRUE(pngData({2, 2, {opaqueRed}}).empty());
+    EXPECT_TRUE(pngData({-1, -1, {opaqueRed}}).empty());
+}
+
+}  // namespace
+}  // namespace platform
