@@ -1,0 +1,54 @@
+#include "framework/ImageManager.h"
+
+#include <span>
+
+#include "framework/FrameworkResources.h"
+#include "host/VXMediaBrowserUtilities.h"
+#include "platform/FileManager.h"
+#include "platform/Services.h"
+#include "platform/Workspace.h"
+
+namespace vexo {
+
+namespace {
+
+platform::ImageRef frameworkIcon(const std::string& name) {
+    const std::string_view svg = *frameworkResource("icons/" + name + ".svg");
+    return std::make_shared<platform::Image>(platform::pictureWithData(std::as_bytes(std::span(svg))), name);
+}
+
+bool isVolume(const std::string& path) {
+    const auto mountPoint = platform::services().fileManager.resolvedPath(path);
+    const auto volumes = platform::services().workspace.mountedLocalVolumePaths();
+    return mountPoint && std::find(volumes.begin(), volumes.end(), *mountPoint) != volumes.end();
+}
+
+}  // namespace
+
+VXMediaBrowserImageManager& VXMediaBrowserImageManager::sharedInstance() {
+    static ImageManager shared(
+        [](const std::string& path) { return VXMediaBrowserUtilities::supportedMovieFile(path); });
+    return shared;
+}
+
+ImageManager::ImageManager(std::function<bool(const std::string& path)> isMovie)
+    : isMovie_(std::move(isMovie)),
+      folder_(frameworkIcon("folder")),
+      movie_(frameworkIcon("movie")),
+      package_(frameworkIcon("package")),
+      document_(frameworkIcon("document")),
+      volume_(frameworkIcon("volume")) {}
+
+platform::ImageRef ImageManager::iconForFile(const std::string& path) {
+    const auto& fileManager = platform::services().fileManager;
+    const auto flags = fileManager.itemFlagsAtPath(path);
+    if (!flags)
+        return nullptr;
+    if (*flags & platform::itemIsPackage)
+        return package_;
+    if (fileManager.kindOfItemAtPath(path) == platform::FileKind::directory)
+        return isVolume(path) ? volume_ : folder_;
+    return isMovie_(path) ? movie_ : document_;
+}
+
+}  // namespace vexo
