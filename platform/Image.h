@@ -65,8 +65,8 @@ class Image {
 };
 
 // A picture of the bytes of an SVG or PNG file, never nil. Damaged bytes give a picture that is not drawable;
-// so do pictures of more than 16384 points a side or 64 Mi points in all, compressed SVG, and SVG that tells
-// no size. Nothing outside the bytes is loaded, whatever an SVG refers to.
+// so do pictures of more than 16384 points a side or 64 Mi points in all, and SVG that is compressed,
+// declares entities or tells no size. Nothing outside the bytes is loaded, whatever an SVG refers to.
 std::shared_ptr<const Picture> pictureWithData(std::span<const std::byte> data);
 
 // The picture in an SVG or PNG file, read at once through the file manager; nil when there is no plain file

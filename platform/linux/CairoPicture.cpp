@@ -154,9 +154,15 @@ bool isCompressed(Bytes data) {
     return data.size() >= 2 && data[0] == std::byte{0x1f} && data[1] == std::byte{0x8b};
 }
 
+bool declaresEntities(Bytes data) {
+    const std::string_view text(reinterpret_cast<const char*>(data.data()), data.size());
+    return text.find("<!ENTITY") != std::string_view::npos;
+}
+
 Handle parsedSVG(Bytes data) {
-    // A compressed picture could unfold to any size. Data without a base location can load no other file.
-    if (data.empty() || isCompressed(data))
+    // A compressed picture could unfold to any size, and librsvg never frees the text of an entity. Data
+    // without a base location can load no other file.
+    if (data.empty() || isCompressed(data) || declaresEntities(data))
         return nullptr;
     Handle handle(
         rsvg_handle_new_from_data(reinterpret_cast<const guint8*>(data.data()), data.size(), nullptr));
