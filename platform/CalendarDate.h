@@ -1,8 +1,16 @@
 // Dates that know their year and can be read and printed with %-conversion formats.
 //
-// Conversions: %Y (year), %y (year in its century), %m %d %e %H %I %M %S %F (milliseconds), %j (day of the
-// year), %p (AM/PM), %a %A %b %B (day and month names), %c %x %X (the locale's own forms), %w, %z %Z
-// (zone), %%. Everything else in a format stands for itself.
+// Conversions:
+//   %Y  year, four digits or more       %H  hour, 00 to 23           %a %A  day of the week, short and full
+//   %y  year of the century, 00 to 99   %I  hour, 01 to 12           %b %B  month, short and full
+//   %m  month, 01 to 12                 %p  half of the day, "AM"    %c     the locale's date and time
+//   %d  day of the month, 01 to 31      %M  minute, 00 to 59         %x     the locale's date
+//   %e  the same without leading zero   %S  second, 00 to 59         %X     the locale's time
+//   %j  day of the year, 001 to 366     %F  millisecond, 000 to 999  %z     zone, "+0100"
+//   %w  day of the week, 0 is Sunday    %%  "%"                      %Z     zone's abbreviation, "CET"
+// Everything else in a format stands for itself.
+//
+// The calendar is the Gregorian one for all times; the year before year 1 is year 0.
 //
 // Thread-safe. Parsing and printing use the local time zone at the moment of the call, so a change of TZ
 // or of the machine's zone counts from the next call on; a CalendarDate keeps the zone offset it was made
@@ -35,16 +43,29 @@ class CalendarDate final : public Date {
     CalendarDate(double secondsSinceReferenceDate, int secondsFromGMT);
 
     // dateWithString:calendarFormat:
-    // Reads `string` by `calendarFormat` in the local time zone; nil when it does not match. Text that goes
-    // on after the format's end makes the parse fail. %Y takes as many digits as there are (nine at most),
-    // but exactly four when the next conversion follows it without a separator. A local time that a
-    // daylight-saving change skips is moved forward by the length of the gap; one that occurs twice is the
-    // earlier.
+    // Reads `string` by `calendarFormat` in the local time zone and with the names of the user's locale, in
+    // any case of letters; nil when it does not match, or names a day or time that does not exist. Text that
+    // goes on after the format's end makes the parse fail; blanks match only themselves.
+    //
+    // Numbers may have fewer digits than are printed. %Y takes as many digits as there are (nine at most),
+    // but exactly four when another conversion or a digit follows it without a separator. %y means 1969 to
+    // 2068. %S takes 60, the leap second, for the next minute's first second.
+    //
+    // Fields that the format does not mention are those of 2001-01-01 00:00:00. Of fields that say the same
+    // thing the later counts, %H before %I with %p, and month and day before %j; days of the week are read
+    // and count for nothing.
+    //
+    // A local time that a daylight-saving change skips is moved forward by the length of the gap; one that
+    // occurs twice is the earlier, unless %Z says which. %z, and "GMT" or "UTC" for %Z, mean that zone
+    // instead of the local one; other abbreviations must be the local zone's at that time.
     static CalendarDateRef dateWithString(std::string_view string, std::string_view calendarFormat);
 
     // descriptionWithCalendarFormat:locale:
+    // In the date's own zone. %Z is printed like %z when the local zone has another offset at that time.
+    // Empty for a date that is not a number.
     std::string descriptionWithCalendarFormat(std::string_view format, const Locale& locale) const;
 
+    // In the date's own zone; 0 for a date that is not a number.
     int yearOfCommonEra() const;
     int secondsFromGMT() const { return secondsFromGMT_; }
 

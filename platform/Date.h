@@ -36,10 +36,14 @@ class Date {
     const double seconds_;
 };
 
+// Both count a date that is more than a billion years away as that far away; one that is not a number has
+// the year 0 and an empty text. The year before year 1 is year 0.
+
 // The year of `date` in the user's calendar, which on Linux is the Gregorian one, in the local time zone.
 int yearInCurrentCalendar(const Date& date);
 
-// ISO 8601 in UTC with whole seconds, rounded down: "2008-12-31T23:59:59Z", "+12000-01-01T00:00:00Z".
+// ISO 8601 in UTC with whole seconds, rounded down: "2008-12-31T23:59:59Z", "+12000-01-01T00:00:00Z",
+// "-0044-03-15T00:00:00Z".
 std::string iso8601String(const Date& date);
 
 }  // namespace platform

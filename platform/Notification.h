@@ -13,7 +13,8 @@
 
 namespace platform {
 
-// Posted by the workspace's centre when a volume was mounted; user information: "NSDevicePath", the mount path.
+// Posted by the workspace's centre when a volume was mounted; user information: "NSDevicePath", the mount
+// path.
 inline constexpr std::string_view NSWorkspaceDidMountNotification = "NSWorkspaceDidMountNotification";
 // Posted for a metadata query whose results changed after its first gathering.
 inline constexpr std::string_view kMDQueryDidUpdateNotification = "kMDQueryDidUpdateNotification";
@@ -21,10 +22,12 @@ inline constexpr std::string_view kMDQueryDidUpdateNotification = "kMDQueryDidUp
 struct Notification {
     std::string name;
     const void* object = nullptr;  // the sender, for comparing only
-    Dictionary userInfo;
+    Dictionary userInfo = {};
 };
 
-// Thread-safe. Observers run on the posting thread, outside the centre's lock.
+// Thread-safe. Observers run on the posting thread in the order in which they were added, outside the
+// centre's lock, so they may add observers and post in their turn; an observer that is added during a post
+// is not told of it. An exception that leaves an observer leaves the post.
 class NotificationCenter {
   public:
     using Handler = std::function<void(const Notification&)>;
@@ -42,6 +45,10 @@ class NotificationCenter {
         std::string name;
         Handler handler;
     };
+
+    std::vector<Registration> registrationsFor(const std::string& name) VX_EXCLUDES(mutex_);
+    // The registrations whose observers are gone, which are registrations no longer.
+    std::vector<Registration> takeExpired() VX_REQUIRES(mutex_);
 
     Mutex mutex_;
     std::vector<Registration> registrations_ VX_GUARDED_BY(mutex_);

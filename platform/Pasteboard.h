@@ -23,6 +23,8 @@ class Pasteboard {
     std::optional<Value> valueForType(std::string_view type) const;
 
   private:
+    bool hasType(std::string_view type) const;
+
     std::vector<std::string> types_;
     std::map<std::string, Value, std::less<>> values_;
 };

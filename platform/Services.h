@@ -21,11 +21,11 @@ struct Services {
     SystemLog& systemLog;
 };
 
-// Requires: a ServicesScope exists.
+// Callable from any thread. Requires: a ServicesScope exists; std::logic_error is thrown where none does.
 const Services& services();
 
 // Puts services in place and, when it goes, the ones before it back. Not thread-safe: made and destroyed
-// while no other thread uses services.
+// while no other thread uses services. Scopes nest: the one made last goes first.
 class ServicesScope {
   public:
     explicit ServicesScope(const Services& services);

@@ -1,0 +1,47 @@
+#include "platform/LocalZone.h"
+
+#include <ctime>
+
+#include "platform/Date.h"
+
+namespace platform {
+
+namespace {
+
+constexpr auto secondsTo1970 = static_cast<std::int64_t>(Date::secondsFrom1970ToReferenceDate);
+
+// Farther than any zone is from GMT, and nearer than any two changes of a zone are to each other.
+constexpr std::int64_t beyondAnyOffset = 26 * 3600;
+
+bool clockShows(const ZonedTime& time, std::int64_t civilSeconds) {
+    return time.seconds + time.secondsFromGMT == civilSeconds;
+}
+
+}  // namespace
+
+ZonedTime localZoneAt(std::int64_t seconds) {
+    const std::time_t time = seconds + secondsTo1970;
+    std::tm fields{};
+    tzset();  // localtime_r need not look at TZ again
+    if (!localtime_r(&time, &fields))
+        return {seconds, 0, "UTC"};  // only for years that no int can hold
+    return {seconds, static_cast<int>(fields.tm_gmtoff), fields.tm_zone ? fields.tm_zone : ""};
+}
+
+std::vector<ZonedTime> timesOfLocalClock(std::int64_t civilSeconds) {
+    const int offsetBefore = localZoneAt(civilSeconds - beyondAnyOffset).secondsFromGMT;
+    const int offsetAfter = localZoneAt(civilSeconds + beyondAnyOffset).secondsFromGMT;
+    const ZonedTime byOffsetBefore = localZoneAt(civilSeconds - offsetBefore);
+    const ZonedTime byOffsetAfter = localZoneAt(civilSeconds - offsetAfter);
+
+    std::vector<ZonedTime> times;
+    if (clockShows(byOffsetBefore, civilSeconds))
+        times.push_back(byOffsetBefore);
+    if (offsetAfter != offsetBefore && clockShows(byOffsetAfter, civilSeconds))
+        times.push_back(byOffsetAfter);
+    if (times.empty())
+        times.push_back(byOffsetBefore);
+    return times;
+}
+
+}  // namespace platform
