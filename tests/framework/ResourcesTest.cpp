@@ -9,6 +9,7 @@
 
 #include "framework/BundleStrings.h"
 #include "framework/FrameworkResources.h"
+#include "platform/CalendarDate.h"
 #include "platform/Image.h"
 #include "tests/support/TemporaryFolder.h"
 
@@ -195,6 +196,33 @@ TEST(Strings, ClipDatesAreShownInEveryLanguageByKnownConversionsToTheSecond) {
         EXPECT_THAT(conversions, testing::HasSubstr("Y")) << language;
         EXPECT_THAT(conversions, testing::EndsWith("HMS")) << language;
     }
+}
+
+TEST(Strings, ClipDatesReadAsTheyAreWrittenInFileNames) {
+    const std::string format = bundleStrings().stringForKey("ReelixClipNameFormat").value_or("");
+    const auto date = platform::CalendarDate::dateWithString("2011-03-09 17;05;08", format);
+    ASSERT_TRUE(date);
+    EXPECT_EQ(date->descriptionWithCalendarFormat(format, {"en_US_POSIX"}), "2011-03-09 17;05;08");
+}
+
+TEST(Strings, ClipDatesLookNaturalInEveryLanguage) {
+    const auto date = platform::CalendarDate::dateWithString("2011-03-09 17;05;08", "%Y-%m-%d %H;%M;%S");
+    ASSERT_TRUE(date);
+    std::map<std::string, std::string> shown;
+    const BundleStrings strings = bundleStrings();
+    for (const char* language : {"en", "de", "es", "fr", "it", "ja", "nl", "pt_BR"}) {
+        const ScopedEnvironment environment("LANGUAGE", language);
+        const std::string format = strings.stringForKey("ReelixClipNameDisplayFormat").value_or("");
+        shown[language] = date->descriptionWithCalendarFormat(format, {language});
+    }
+    EXPECT_THAT(shown, testing::ElementsAre(testing::Pair("de", "9. März 2011, 17:05:08"),
+                                            testing::Pair("en", "Mar 9, 2011, 17:05:08"),
+                                            testing::Pair("es", "9 de marzo de 2011, 17:05:08"),
+                                            testing::Pair("fr", "9 mars 2011 à 17:05:08"),
+                                            testing::Pair("it", "9 marzo 2011, 17:05:08"),
+                                            testing::Pair("ja", "2011年03月09日 17:05:08"),
+                                            testing::Pair("nl", "9 maart 2011, 17:05:08"),
+                                            testing::Pair("pt_BR", "9 de março de 2011, 17:05:08")));
 }
 
 }  // namespace
