@@ -13,6 +13,20 @@ constexpr auto secondsTo1970 = static_cast<std::int64_t>(Date::secondsFrom1970To
 // Farther than any zone is from GMT, and nearer than any two changes of a zone are to each other.
 constexpr std::int64_t beyondAnyOffset = 26 * 3600;
 
+// By the zone that was last looked up.
+ZonedTime zoneAt(std::int64_t seconds) {
+    const std::time_t time = seconds + secondsTo1970;
+    std::tm fields{};
+    if (!localtime_r(&time, &fields))
+        return {seconds, 0, "UTC"};  // only for years that no int can hold
+    return {seconds, static_cast<int>(fields.tm_gmtoff), fields.tm_zone ? fields.tm_zone : ""};
+}
+
+// localtime_r need not notice that the zone has changed.
+void lookUpZone() {
+    tzset();
+}
+
 bool clockShows(const ZonedTime& time, std::int64_t civilSeconds) {
     return time.seconds + time.secondsFromGMT == civilSeconds;
 }
@@ -20,19 +34,16 @@ bool clockShows(const ZonedTime& time, std::int64_t civilSeconds) {
 }  // namespace
 
 ZonedTime localZoneAt(std::int64_t seconds) {
-    const std::time_t time = seconds + secondsTo1970;
-    std::tm fields{};
-    tzset();  // localtime_r need not look at TZ again
-    if (!localtime_r(&time, &fields))
-        return {seconds, 0, "UTC"};  // only for years that no int can hold
-    return {seconds, static_cast<int>(fields.tm_gmtoff), fields.tm_zone ? fields.tm_zone : ""};
+    lookUpZone();
+    return zoneAt(seconds);
 }
 
 std::vector<ZonedTime> timesOfLocalClock(std::int64_t civilSeconds) {
-    const int offsetBefore = localZoneAt(civilSeconds - beyondAnyOffset).secondsFromGMT;
-    const int offsetAfter = localZoneAt(civilSeconds + beyondAnyOffset).secondsFromGMT;
-    const ZonedTime byOffsetBefore = localZoneAt(civilSeconds - offsetBefore);
-    const ZonedTime byOffsetAfter = localZoneAt(civilSeconds - offsetAfter);
+    lookUpZone();
+    const int offsetBefore = zoneAt(civilSeconds - beyondAnyOffset).secondsFromGMT;
+    const int offsetAfter = zoneAt(civilSeconds + beyondAnyOffset).secondsFromGMT;
+    const ZonedTime byOffsetBefore = zoneAt(civilSeconds - offsetBefore);
+    const ZonedTime byOffsetAfter = zoneAt(civilSeconds - offsetAfter);
 
     std::vector<ZonedTime> times;
     if (clockShows(byOffsetBefore, civilSeconds))
