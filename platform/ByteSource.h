@@ -4,6 +4,7 @@
 // truncated while it is mapped kills the process, a read that comes up short is an ordinary failure.
 #pragma once
 
+#include <array>
 #include <cstddef>
 #include <cstdint>
 #include <span>
@@ -26,6 +27,18 @@ class ByteSource {
     virtual std::string name() const { return {}; }
 };
 
+// Bytes that somebody else keeps alive for as long as the source is used.
+class BorrowedByteSource final : public ByteSource {
+  public:
+    explicit BorrowedByteSource(std::span<const std::byte> bytes) : bytes_(bytes) {}
+
+    std::uint64_t size() const override { return bytes_.size(); }
+    [[nodiscard]] bool read(std::uint64_t offset, std::span<std::byte> buffer) override;
+
+  private:
+    const std::span<const std::byte> bytes_;
+};
+
 class MemoryByteSource final : public ByteSource {
   public:
     explicit MemoryByteSource(std::vector<std::byte> bytes, std::string name = {})
@@ -38,6 +51,41 @@ class MemoryByteSource final : public ByteSource {
   private:
     const std::vector<std::byte> bytes_;
     const std::string name_;
+};
+
+// Keeps the pages of a source that were read last, so that many small reads near one another cost one read of
+// the source. Reads of a page's size and more go straight through. Not thread-safe.
+class PageCache {
+  public:
+    static constexpr std::size_t pageSize = 4096;
+    static constexpr std::size_t pageCount = 16;
+
+    // `source` is not owned.
+    explicit PageCache(ByteSource& source);
+    PageCache(const PageCache&) = delete;
+    PageCache& operator=(const PageCache&) = delete;
+
+    std::uint64_t size() const { return size_; }
+    // As ByteSource::read.
+    [[nodiscard]] bool read(std::uint64_t offset, std::span<std::byte> buffer);
+
+  private:
+    struct Page {
+        static constexpr std::uint64_t none = ~std::uint64_t{0};
+        std::uint64_t number = none;
+        std::uint64_t lastUse = 0;
+        std::array<std::byte, pageSize> bytes;
+    };
+
+    // Makes a page the latest; false when it can't be read.
+    bool fetch(std::uint64_t number);
+    bool load(Page& page, std::uint64_t number);
+
+    ByteSource& source_;
+    const std::uint64_t size_;
+    std::vector<Page> pages_;
+    Page* latest_;
+    std::uint64_t uses_ = 0;
 };
 
 }  // namespace platform

@@ -60,11 +60,12 @@ class Value {
     const Array* array() const;
     const Dictionary* dictionary() const;
 
-    // The numeric value of a boolean, an integer, a real, or text that begins with a number (other text
-    // is 0.0, as the platform converts it); nil for every other kind.
+    // The numeric value of a boolean, an integer, a real, or text that begins with a decimal number after
+    // whitespace ("0.7abc" is 0.7, other text is 0.0, as the platform converts it); nil for every other kind.
+    // Never depends on the locale.
     std::optional<double> doubleValue() const;
-    // The truth of a boolean or a number (not zero), or of text that says yes, true or a number other than
-    // zero; nil for every other kind.
+    // The truth of a boolean or a number (not zero), or of text that begins with "y" or "t" in either case
+    // (yes, true) or with a number other than zero; nil for every other kind.
     std::optional<bool> boolValue() const;
 
     // Equal kind and equal content; dates by their time, containers element by element.
