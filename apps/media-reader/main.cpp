@@ -1,0 +1,57 @@
+// Reads movies for a host that started it: one file after another, each by a descriptor that the host sends,
+// until the host closes the channel. Runs confined, because the files may be anybody's.
+#include <cstdio>
+#include <exception>
+
+#include "apps/media-reader/Channel.h"
+#include "apps/media-reader/Confinement.h"
+#include "apps/media-reader/MediaFile.h"
+#include "apps/media-reader/MediaSummary.h"
+
+extern "C" {
+#include <libavutil/log.h>
+#include <libavutil/mem.h>
+}
+
+namespace {
+
+constexpr std::size_t largestAllocation = 256u << 20;
+
+vexo::MediaReaderAnswer answerTo(const reader::Job& job) {
+    reader::renewProcessorTime();
+    try {
+        return reader::summaryOf(reader::MediaFile(job.file.number(), job.request.readLimit));
+    } catch (const std::exception& error) {
+        return vexo::MediaFailure{error.what()};
+    }
+}
+
+// What one request asks for; false when the host has gone. The file is closed before the host hears of it.
+bool readNext() {
+    std::string reply;
+    if (const auto job = reader::Channel::receive())
+        reply = vexo::encodeReply({job->request.number, answerTo(*job)});
+    return !reply.empty() && reader::Channel::send(reply);
+}
+
+int refuse(const char* reason) {
+    std::fprintf(stderr, "vexo-media-reader: %s\n", reason);
+    return 2;
+}
+
+}  // namespace
+
+int main() {
+    if (!reader::Channel::isOpen())
+        return refuse("is started by programs that show movies, not by hand");
+    if (!reader::confine())
+        return refuse("cannot limit itself, so it reads nothing");
+    reader::Channel::endWithHost();
+    av_log_set_level(AV_LOG_QUIET);
+    av_max_alloc(largestAllocation);
+
+    reader::Channel::send(vexo::encodeGreeting());
+    while (readNext()) {
+    }
+    return 0;
+}
