@@ -1,0 +1,30 @@
+// Gets a media file's answer from where it costs least: the index, else the reader, whose answer is then kept
+// in the index. Callable from any thread.
+#pragma once
+
+#include <memory>
+#include <optional>
+#include <string>
+
+#include "framework/metadata/MediaReader.h"
+#include "framework/metadata/MetadataIndex.h"
+
+namespace vexo {
+
+class MetadataCache {
+  public:
+    MetadataCache(const std::optional<std::string>& indexPath, std::shared_ptr<MediaReader> reader);
+
+    // The answer for the file at a real path. Waits for the reader where the index does not know the file.
+    MediaReaderAnswer answerForFile(const std::string& path) VX_EXCLUDES(reading_);
+
+    std::string indexPath() const { return index_.path(); }
+
+  private:
+    const std::shared_ptr<MediaReader> reader_;
+    MetadataIndex index_;
+    // Held while a file is read, on purpose: whoever asks for the same file meanwhile finds it in the index.
+    platform::Mutex reading_;
+};
+
+}  // namespace vexo

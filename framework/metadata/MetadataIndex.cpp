@@ -1,0 +1,132 @@
+#include "framework/metadata/MetadataIndex.h"
+
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/stat.h>
+
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
+
+#include "framework/metadata/FileDescriptor.h"
+#include "framework/metadata/ReaderMessage.h"
+#include "platform/Path.h"
+
+namespace vexo {
+
+namespace {
+
+using Outcome = IndexTable::Outcome;
+
+void makeFolderForUserAlone(const std::string& folder) {
+    std::error_code ignored;
+    std::filesystem::create_directories(platform::path::withoutLastComponent(folder), ignored);
+    mkdir(folder.c_str(), 0700);
+}
+
+// Renames the database together with the journals that belong to it: apart they would spoil each other.
+void setAside(const std::string& path) {
+    for (const char* part : {"", "-wal", "-shm"}) {
+        const std::string aside = path + ".set-aside" + part;
+        std::remove(aside.c_str());
+        std::rename((path + part).c_str(), aside.c_str());
+    }
+}
+
+// The right to replace the database; at most one process has it. Does not wait.
+FileDescriptor lockForReplacing(const std::string& path) {
+    FileDescriptor lock(open((path + ".lock").c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600));
+    if (lock && flock(lock.number(), LOCK_EX | LOCK_NB) != 0)
+        return {};
+    return lock;
+}
+
+bool setAsideUnderLock(const std::string& path) {
+    const FileDescriptor lock = lockForReplacing(path);
+    if (lock)
+        setAside(path);
+    return static_cast<bool>(lock);
+}
+
+}  // namespace
+
+MetadataIndex::MetadataIndex(const std::optional<std::string>& path) : path_(path.value_or("")) {
+    platform::Locked lock(mutex_);
+    if (path_.empty())
+        openMemory();
+    else
+        openFile();
+}
+
+MetadataIndex::~MetadataIndex() = default;
+
+std::optional<std::string> MetadataIndex::defaultPath() {
+    // A relative XDG_CACHE_HOME is to be ignored.
+    if (const char* cache = std::getenv("XDG_CACHE_HOME"); cache && *cache == '/')
+        return platform::path::appending(cache, "vexo/metadata.sqlite");
+    if (const char* home = std::getenv("HOME"); home && *home)
+        return platform::path::appending(home, ".cache/vexo/metadata.sqlite");
+    return std::nullopt;
+}
+
+std::string MetadataIndex::path() const {
+    platform::Locked lock(mutex_);
+    return path_;
+}
+
+void MetadataIndex::openFile() {
+    makeFolderForUserAlone(platform::path::withoutLastComponent(path_));
+    Outcome outcome = IndexTable::open(path_, table_);
+    if (outcome == Outcome::damaged)
+        outcome = replaceFile();
+    if (outcome != Outcome::done)
+        openMemory();
+}
+
+void MetadataIndex::openMemory() {
+    path_.clear();
+    IndexTable::open(":memory:", table_);
+}
+
+Outcome MetadataIndex::replaceFile() {
+    const FileDescriptor lock = lockForReplacing(path_);
+    if (!lock)
+        return Outcome::unavailable;
+    // Another process may have replaced it since.
+    const Outcome outcome = IndexTable::open(path_, table_);
+    if (outcome != Outcome::damaged)
+        return outcome;
+    setAside(path_);
+    return IndexTable::open(path_, table_);
+}
+
+void MetadataIndex::recoverFrom(Outcome outcome) {
+    if (outcome != Outcome::damaged)
+        return;
+    table_.reset();
+    if (!path_.empty() && setAsideUnderLock(path_))
+        openFile();
+    else
+        openMemory();
+}
+
+std::optional<MediaReaderAnswer> MetadataIndex::find(const FileKey& key) {
+    platform::Locked lock(mutex_);
+    if (!table_)
+        return std::nullopt;
+    std::string answer;
+    const Outcome outcome = table_->find(key, answer);
+    recoverFrom(outcome);
+    return outcome == Outcome::done ? decodeAnswer(answer) : std::nullopt;
+}
+
+void MetadataIndex::store(const FileKey& key, const MediaReaderAnswer& answer) {
+    const auto* failure = std::get_if<MediaFailure>(&answer);
+    if (failure && failure->cause != FailureCause::file)
+        return;
+    platform::Locked lock(mutex_);
+    if (table_)
+        recoverFrom(table_->store(key, encodeAnswer(answer)));
+}
+
+}  // namespace vexo

@@ -1,0 +1,48 @@
+// Remembers what media files said, failures included, so that each is read once for as long as it stays the
+// same. Kept in a file that the user's processes share; losing it costs nothing but time.
+//
+// A file that is damaged or of another version is set aside (".set-aside" is appended to its name) and a new
+// one begun. Where the folder can't be written, the index lives in memory. Nothing here fails: what cannot be
+// remembered is read again. Callable from any thread.
+#pragma once
+
+#include <memory>
+#include <optional>
+#include <string>
+
+#include "framework/metadata/IndexTable.h"
+#include "framework/metadata/MediaProperties.h"
+#include "platform/ThreadSafety.h"
+
+namespace vexo {
+
+class MetadataIndex {
+  public:
+    // Opens the file, making it and its folder (for the user alone) as needed. nil for one in memory.
+    explicit MetadataIndex(const std::optional<std::string>& path);
+    ~MetadataIndex();
+
+    // "metadata.sqlite" in the user's cache folder for vexo; nil when there is neither XDG_CACHE_HOME nor
+    // HOME.
+    static std::optional<std::string> defaultPath();
+
+    // The file in use; empty while the index lives in memory.
+    std::string path() const VX_EXCLUDES(mutex_);
+
+    std::optional<MediaReaderAnswer> find(const FileKey& key) VX_EXCLUDES(mutex_);
+    // Failures that do not lie in the file are not kept.
+    void store(const FileKey& key, const MediaReaderAnswer& answer) VX_EXCLUDES(mutex_);
+
+  private:
+    void openFile() VX_REQUIRES(mutex_);
+    void openMemory() VX_REQUIRES(mutex_);
+    IndexTable::Outcome replaceFile() VX_REQUIRES(mutex_);
+    // Begins anew when an operation found the file damaged.
+    void recoverFrom(IndexTable::Outcome outcome) VX_REQUIRES(mutex_);
+
+    mutable platform::Mutex mutex_;
+    std::string path_ VX_GUARDED_BY(mutex_);
+    std::unique_ptr<IndexTable> table_ VX_GUARDED_BY(mutex_);  // nil only when memory is short
+};
+
+}  // namespace vexo
