@@ -7,7 +7,6 @@
 #include <chrono>
 #include <exception>
 #include <functional>
-#include <initializer_list>
 #include <string_view>
 #include <vector>
 

@@ -1,0 +1,31 @@
+// A file descriptor that is closed when its owner goes.
+#pragma once
+
+#include <unistd.h>
+
+#include <utility>
+
+namespace platform {
+
+class FileDescriptor {
+  public:
+    FileDescriptor() = default;
+    explicit FileDescriptor(int number) : number_(number) {}
+    FileDescriptor(FileDescriptor&& other) noexcept : number_(std::exchange(other.number_, -1)) {}
+    FileDescriptor& operator=(FileDescriptor&& other) noexcept {
+        std::swap(number_, other.number_);
+        return *this;
+    }
+    ~FileDescriptor() {
+        if (number_ >= 0)
+            close(number_);
+    }
+
+    int number() const { return number_; }
+    explicit operator bool() const { return number_ >= 0; }
+
+  private:
+    int number_ = -1;
+};
+
+}  // namespace platform

@@ -1,0 +1,86 @@
+#include "platform/linux/LinuxWorkspace.h"
+
+#include <gio/gunixmounts.h>
+#include <unistd.h>
+
+#include <algorithm>
+
+#include "platform/linux/IconLookup.h"
+
+namespace platform {
+
+namespace {
+
+constexpr std::string_view reelixCreatorCode = "rlxm";
+constexpr std::string_view reelixIdentifier = "com.norvale.ReelixApp";
+
+ApplicationReference referenceToApplication(const DesktopEntry& entry) {
+    ApplicationReference application{entry.identifier, std::nullopt, entry.icon};
+    if (auto path = entry.programPath())
+        application.url = URL::fileURLWithPath(std::move(*path));
+    return application;
+}
+
+}  // namespace
+
+LinuxWorkspace::LinuxWorkspace(const MountTable& mountTable)
+    : mountTable_(mountTable),
+      dataFolders_(desktopDataFolders()),
+      entries_(dataFolders_),
+      monitor_(g_unix_mount_monitor_get()),
+      knownVolumes_(mountedLocalVolumePaths()) {
+    const auto changed =
+        +[](GUnixMountMonitor*, gpointer self) { static_cast<LinuxWorkspace*>(self)->mountsChanged(); };
+    monitorHandler_ = g_signal_connect(monitor_, "mounts-changed", G_CALLBACK(changed), this);
+}
+
+LinuxWorkspace::~LinuxWorkspace() {
+    g_signal_handler_disconnect(monitor_, monitorHandler_);
+    g_object_unref(monitor_);
+}
+
+std::vector<std::string> LinuxWorkspace::mountedLocalVolumePaths() const {
+    std::vector<std::string> paths;
+    for (const Mount& mount : mountTable_.mounts())
+        paths.push_back(mount.path);
+    return paths;
+}
+
+std::vector<std::string> LinuxWorkspace::mountedRemovableMedia() const {
+    std::vector<std::string> paths;
+    for (const Mount& mount : mountTable_.mounts())
+        if (mount.removable)
+            paths.push_back(mount.path);
+    return paths;
+}
+
+std::optional<ApplicationReference> LinuxWorkspace::applicationForCreator(
+    std::string_view creatorCode) const {
+    auto entry = entries_.entryWithCreatorCode(creatorCode);
+    if (!entry && creatorCode == reelixCreatorCode)
+        entry = entries_.entryWithIdentifier(reelixIdentifier);
+    return entry ? std::optional(referenceToApplication(*entry)) : std::nullopt;
+}
+
+std::string LinuxWorkspace::absolutePathForAppBundleWithIdentifier(std::string_view identifier) const {
+    const auto entry = entries_.entryWithIdentifier(identifier);
+    const auto path = entry ? entry->programPath() : std::nullopt;
+    return path && access(path->c_str(), X_OK) == 0 ? *path : "";
+}
+
+ImageRef LinuxWorkspace::iconForApplication(const ApplicationReference& application) const {
+    const auto path = pathOfIcon(application.icon, dataFolders_);
+    auto picture = path ? pictureWithContentsOfFile(*path) : nullptr;
+    return picture ? std::make_shared<Image>(std::move(picture), application.icon) : nullptr;
+}
+
+void LinuxWorkspace::mountsChanged() {
+    auto volumes = mountedLocalVolumePaths();
+    volumes.swap(knownVolumes_);
+    for (const auto& path : std::vector(knownVolumes_))
+        if (std::find(volumes.begin(), volumes.end(), path) == volumes.end())
+            notificationCenter().post(
+                {std::string(NSWorkspaceDidMountNotification), this, {{"NSDevicePath", path}}});
+}
+
+}  // namespace platform

@@ -1,0 +1,51 @@
+// Volumes from the mount table and applications from desktop entries.
+//
+// The environment (XDG_DATA_HOME, XDG_DATA_DIRS) counts as it was when the workspace was made. Mounts are
+// posted on the main run loop.
+#pragma once
+
+#include <gio/gio.h>
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "platform/Workspace.h"
+#include "platform/linux/DesktopEntries.h"
+#include "platform/linux/MountTable.h"
+
+typedef struct _GUnixMountMonitor GUnixMountMonitor;
+
+namespace platform {
+
+// Made and destroyed on the main thread; otherwise callable from any thread.
+class LinuxWorkspace final : public Workspace {
+  public:
+    // `mountTable` must outlive the workspace.
+    explicit LinuxWorkspace(const MountTable& mountTable);
+    ~LinuxWorkspace() override;
+
+    std::vector<std::string> mountedLocalVolumePaths() const override;
+    std::vector<std::string> mountedRemovableMedia() const override;
+
+    // The entry that states the code; for ReelixApp's own code also the entry of its identifier. The
+    // application has no URL when its program is nowhere in PATH, and one that leads nowhere when the entry
+    // gives a path where no file is left.
+    std::optional<ApplicationReference> applicationForCreator(std::string_view creatorCode) const override;
+    std::string absolutePathForAppBundleWithIdentifier(std::string_view identifier) const override;
+    ImageRef iconForApplication(const ApplicationReference& application) const override;
+
+  private:
+    void mountsChanged();
+
+    const MountTable& mountTable_;
+    const std::vector<std::string> dataFolders_;
+    const DesktopEntries entries_;
+
+    // The main thread's own.
+    GUnixMountMonitor* const monitor_;
+    gulong monitorHandler_;
+    std::vector<std::string> knownVolumes_;
+};
+
+}  // namespace platform

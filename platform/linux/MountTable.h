@@ -1,0 +1,57 @@
+// The volumes that are mounted and hold users' files.
+//
+// What counts as one is decided in MountRules.h, what it is called in VolumeProperties.h.
+// Callable from any thread.
+#pragma once
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "platform/ThreadSafety.h"
+#include "platform/linux/FileDescriptor.h"
+
+namespace platform {
+
+struct Mount {
+    std::string path;         // of the mount point
+    std::string device;       // "/dev/sdb1"; what the file system was mounted from
+    std::string fileSystem;   // Linux's name of its type, "ext4", "fuse.encfs"
+    std::string displayName;  // never empty, holds no "/"
+    bool removable = false;
+
+    bool operator==(const Mount&) const = default;
+};
+
+class MountTable {
+  public:
+    virtual ~MountTable() = default;
+
+    // In mount order, "/" first.
+    virtual std::vector<Mount> mounts() const = 0;
+};
+
+// The kernel's mount table. Read again only after the kernel reports a change of it, so asking often is
+// cheap; a label that is changed while its volume is mounted shows after the next change of the table.
+//
+// Network and FUSE file systems are never touched: their server may be gone, and then every look at them
+// waits.
+class SystemMountTable final : public MountTable {
+  public:
+    SystemMountTable();
+
+    std::vector<Mount> mounts() const override VX_EXCLUDES(mutex_);
+
+  private:
+    using Snapshot = std::shared_ptr<const std::vector<Mount>>;
+
+    Snapshot snapshot() const VX_EXCLUDES(mutex_);
+    bool hasChanged() const VX_REQUIRES(mutex_);
+
+    const FileDescriptor changes_;  // the kernel tells each open file of the table once of every change
+
+    mutable Mutex mutex_;
+    mutable Snapshot current_ VX_GUARDED_BY(mutex_);  // nil until it is first asked for
+};
+
+}  // namespace platform

@@ -1,0 +1,17 @@
+// A mount table that a test fills in.
+#pragma once
+
+#include <vector>
+
+#include "platform/linux/MountTable.h"
+
+class FakeMountTable final : public platform::MountTable {
+  public:
+    std::vector<platform::Mount> mounts() const override {
+        ++questions;
+        return list;
+    }
+
+    std::vector<platform::Mount> list;
+    mutable int questions = 0;
+};
