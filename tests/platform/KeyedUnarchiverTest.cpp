@@ -363,10 +363,8 @@ TEST(KeyedUnarchiver, AskingAnythingButADictionaryForAKeyRaises) {
 
 TEST(KeyedUnarchiver, WhatIsNoKeyedArchiveIsRejectedWhenItIsOpened) {
     const std::map<std::string, std::string> expected{
-        {"truncated", "the trailer is damaged"},
-        {"trailing-garbage", "the trailer is damaged"},
-        {"self-reference", "no keyed archive"},
-        {"other-archiver", "made by an unknown archiver"},
+        {"truncated", "the trailer is damaged"},    {"trailing-garbage", "the trailer is damaged"},
+        {"self-reference", "no keyed archive"},     {"other-archiver", "made by an unknown archiver"},
         {"other-version", "of an unknown version"},
     };
     for (const auto& [name, problem] : expected)
@@ -498,7 +496,7 @@ TEST(KeyedUnarchiver, AQuestionThatReadsTooManyObjectsIsRejected) {
 
 TEST(KeyedUnarchiver, ADocumentThatIsTruncatedWhileOpenIsRejected) {
     WatchedSource::Watch watch;
-    KeyedUnarchiver unarchiver(std::make_unique<WatchedSource>(projectDocument(60000), watch), nullptr);
+    KeyedUnarchiver unarchiver(std::make_unique<WatchedSource>(projectDocument(3000), watch), nullptr);
     watch.readableSize = 0;
     EXPECT_EQ(errorOf([&] { trailerOf(unarchiver); }), "watched: the file can't be read to its end");
 
