@@ -1,4 +1,5 @@
 # The plug-in: its code as objects, which the tests link as well, and the bundle around the module.
+file(GLOB PLUGIN_SOURCES CONFIGURE_DEPENDS core/*.cpp projects/*.cpp events/*.cpp watching/*.cpp browser/*.cpp)
 add_library(reelix_objects OBJECT ${PLUGIN_SOURCES})
 target_include_directories(reelix_objects PUBLIC ${CMAKE_SOURCE_DIR})
 target_link_libraries(reelix_objects PRIVATE vexo_settings)

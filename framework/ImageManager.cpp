@@ -3,7 +3,6 @@
 #include <span>
 
 #include "framework/FrameworkResources.h"
-#include "host/VXMediaBrowserUtilities.h"
 #include "platform/FileManager.h"
 #include "platform/Services.h"
 #include "platform/Workspace.h"
@@ -24,12 +23,6 @@ bool isVolume(const std::string& path) {
 }
 
 }  // namespace
-
-VXMediaBrowserImageManager& VXMediaBrowserImageManager::sharedInstance() {
-    static ImageManager shared(
-        [](const std::string& path) { return VXMediaBrowserUtilities::supportedMovieFile(path); });
-    return shared;
-}
 
 ImageManager::ImageManager(std::function<bool(const std::string& path)> isMovie)
     : isMovie_(std::move(isMovie)),

@@ -55,7 +55,8 @@ class VXMediaGroup final {
     bool dynamicMediaObjects() const VX_EXCLUDES(mutex_);
     void setDynamicMediaObjects(bool dynamic) VX_EXCLUDES(mutex_);
 
-    platform::Dictionary attributes() const VX_EXCLUDES(mutex_);
+    // Never nil.
+    std::shared_ptr<const platform::Dictionary> attributes() const VX_EXCLUDES(mutex_);
     void setAttributes(platform::Dictionary attributes) VX_EXCLUDES(mutex_);
     // The date to store with setModificationDate for a file; nil when it can't be read.
     static platform::DateRef modDateForFile(const std::string& path);
@@ -79,7 +80,7 @@ class VXMediaGroup final {
         platform::DateRef modificationDate;
         VXMediaGroupList childGroups;
         std::optional<VXMediaObjectList> mediaObjects;
-        std::shared_ptr<const platform::Dictionary> attributes;
+        std::shared_ptr<const platform::Dictionary> attributes;  // nil until set
         bool dynamicMediaObjects = false;
     };
 

@@ -6,6 +6,7 @@
 // to itself is callable from any thread.
 #pragma once
 
+#include <chrono>
 #include <functional>
 #include <memory>
 #include <optional>
@@ -52,7 +53,7 @@ class VXMediaManager : public VXPathObserver, public std::enable_shared_from_thi
     virtual platform::ImageRef rootMediaGroupIcon() = 0;  // 16 x 16; nil when there is none
     virtual unsigned mediaTypesSupported() = 0;           // a mask, VXMediaTypeMaskMovie
     virtual std::string uniqueID() = 0;
-    virtual std::string displayName() = 0;         // deprecated, use rootMediaGroupTitle
+    virtual std::string displayName() = 0;          // deprecated, use rootMediaGroupTitle
     virtual platform::ImageRef displayImage() = 0;  // deprecated, use rootMediaGroupIcon
 
     // Flat lists of groups, without their order in the tree.
@@ -81,18 +82,20 @@ class VXMediaManager : public VXPathObserver, public std::enable_shared_from_thi
 
     // writeMediaGroups:toPasteboard: and writeMediaObjects:toPasteboard:; whether anything was written. The
     // base writes the paths as "text/uri-list" and "text/plain".
-    virtual bool writeMediaGroups(const std::vector<VXMediaGroupRef>& mediaGroups, platform::Pasteboard& toPasteboard);
+    virtual bool writeMediaGroups(const std::vector<VXMediaGroupRef>& mediaGroups,
+                                  platform::Pasteboard& toPasteboard);
     virtual bool writeMediaObjects(const std::vector<VXMediaObjectRef>& mediaObjects,
                                    platform::Pasteboard& toPasteboard);
 
     // thumbnailOverlayForMediaObject:inMediaGroups:atSize:; nil for no overlay, as the base answers.
-    virtual platform::ImageRef thumbnailOverlayForMediaObject(const VXMediaObjectRef& mediaObject,
-                                                              const std::vector<VXMediaGroupRef>& inMediaGroups,
-                                                              platform::Size atSize);
+    virtual platform::ImageRef thumbnailOverlayForMediaObject(
+        const VXMediaObjectRef& mediaObject, const std::vector<VXMediaGroupRef>& inMediaGroups,
+        platform::Size atSize);
 
     // Changes of watched paths and queries; the base ignores them.
     void watchedPathChanged(const std::string& path, std::uint64_t fileChangedEventFlags) override;
-    void watchedQueryChanged(const platform::Notification& notification, const VXPathListRef& queryScope) override;
+    void watchedQueryChanged(const platform::Notification& notification,
+                             const VXPathListRef& queryScope) override;
 
     // --- What a plug-in asks of its host -------------------------------------------------------------------
 
@@ -117,7 +120,8 @@ class VXMediaManager : public VXPathObserver, public std::enable_shared_from_thi
     // newMediaGroupWithTypeIdentifier:groupID:
     VXMediaGroupRef newMediaGroupWithTypeIdentifier(const VXGroupTypeIdentifier& typeIdentifier,
                                                     std::optional<std::string> groupID);
-    // newMediaObjectWithType:name:objectID:; the item is found by its ID once a tree that holds it is installed.
+    // newMediaObjectWithType:name:objectID:; the item is found by its ID once a tree that holds it is
+    // installed.
     VXMediaObjectRef newMediaObjectWithType(int mediaType, std::string name, std::string objectID);
     // mediaObjectForID:; the item registered under `ID`, nil when there is none or it has gone. The first
     // item with an ID wins while it lives.
@@ -125,7 +129,7 @@ class VXMediaManager : public VXPathObserver, public std::enable_shared_from_thi
 
     // localizedString:; nil for a key that the bundle lacks.
     std::optional<std::string> localizedString(std::string_view key) const;
-    // iconNamed:; nil for a name that the bundle lacks.
+    // iconNamed:; an image of the caller's own; nil for a name that the bundle lacks.
     platform::ImageRef iconNamed(std::string_view name) const;
 
     // --- What a host program does with a plug-in -----------------------------------------------------------
@@ -136,7 +140,8 @@ class VXMediaManager : public VXPathObserver, public std::enable_shared_from_thi
 
     // Asks the load in progress to stop; what it answers is dropped and the last tree stays.
     void cancelLoad();
-    // Waits until no load is in progress.
+    // Waits until no load is in progress, `atMost` as long. Answers whether that is so.
+    bool waitUntilLoaded(std::chrono::nanoseconds atMost) const;
     void waitUntilLoaded() const;
     // Asks everything in progress to stop and starts nothing more. The object is of no use afterwards.
     void close();

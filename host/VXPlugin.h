@@ -6,7 +6,9 @@
 #pragma once
 
 #include <memory>
+#include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "platform/Image.h"
@@ -28,7 +30,7 @@ class VXBundle {
     virtual const std::string& identifier() const = 0;
     // The text in the user's language; nil for a key that the bundle lacks.
     virtual std::optional<std::string> localizedString(std::string_view key) const = 0;
-    // The image of that name, the same object each time; nil when the bundle has none.
+    // The image of that name, a new object each time; nil when the bundle has none.
     virtual platform::ImageRef iconNamed(std::string_view name) const = 0;
 };
 using VXBundleRef = std::shared_ptr<const VXBundle>;

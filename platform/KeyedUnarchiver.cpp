@@ -193,15 +193,10 @@ std::string descriptionOfUUID(const Data& data) {
     return text;
 }
 
-// An object of a class that is decoded here. None but dictionaries has entries.
+// An object of a class that is decoded here.
 class DecodedObject : public ArchivedObject {
   public:
     explicit DecodedObject(Archive& archive) : archive_(archive) {}
-
-    ArchivedObjectRef objectForKey(std::string_view key) const override {
-        return archive_.owner.reject(
-            fmt::format("an object is asked for its key {} and is no dictionary", key));
-    }
 
   protected:
     Archive& archive_;
@@ -495,6 +490,8 @@ ArchivedObjectRef KeyedUnarchiver::Implementation::object(const Content& referen
     if (const auto known = decoded.find(number); known != decoded.end())
         return known->second;
     ArchivedObjectRef made = make(number);
+    if (made)
+        made->unarchiver_ = &owner;
     decoded.emplace(number, made);
     return made;
 }
@@ -588,6 +585,13 @@ ArchivedObjectRef KeyedUnarchiver::decodeObjectForKey(std::string_view key) {
 
 void KeyedUnarchiver::finishDecoding() {
     implementation_->isFinished = true;
+}
+
+ArchivedObjectRef ArchivedObject::objectForKey(std::string_view key) const {
+    const std::string problem = fmt::format("an object is asked for its key {} and is no dictionary", key);
+    if (!unarchiver_)
+        throw ArchiveError({}, problem);
+    return unarchiver_->reject(problem);
 }
 
 ArchivedObjectRef KeyedUnarchiver::reject(const std::string& problem) {

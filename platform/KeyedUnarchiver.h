@@ -1,14 +1,15 @@
 // Reads keyed archives, binary or XML, object by object.
 //
 // Only what is asked for is decoded: reaching one entry of a large binary archive reads the few objects on
-// the way to it and nothing else. An archive that is rejected raises ArchiveError, at once or when the damaged
-// part is reached. A binary archive is read where it lies; an XML archive is read whole when it is opened.
+// the way to it and nothing else. An archive that is rejected raises ArchiveError, at once or when the
+// damaged part is reached. A binary archive is read where it lies; an XML archive is read whole when it is
+// opened.
 //
-// Everything an archive can declare is bounded: what one call has to read, how deep objects are made within one
-// another (512 levels). The objects of an archive may refer to each other in circles.
+// Everything an archive can declare is bounded: what one call has to read, how deep objects are made within
+// one another (512 levels). The objects of an archive may refer to each other in circles.
 //
-// The classes decoded here are those of strings, numbers, dates, data, dictionaries, arrays, sets, URLs, UUIDs
-// and null. The object number 0 of an archive stands for nil.
+// The classes decoded here are those of strings, numbers, dates, data, dictionaries, arrays, sets, URLs,
+// UUIDs and null. The object number 0 of an archive stands for nil.
 //
 // An unarchiver and its objects belong to one thread.
 #pragma once
@@ -46,9 +47,13 @@ class ArchivedObject {
 
     // Human-readable: the text of a text, the elements of a collection. Long collections end in an ellipsis.
     virtual std::string description() const = 0;
-    // The entry of a dictionary under a text key; nil when it has none. The first of several counts. Raises
-    // ArchiveError when the object is no dictionary; a class of one's own does it with KeyedUnarchiver::reject.
-    virtual std::shared_ptr<const ArchivedObject> objectForKey(std::string_view key) const = 0;
+    // The entry of a dictionary under a text key; nil when it has none. The first of several counts. An
+    // object that is no dictionary, as any is that doesn't say otherwise, raises ArchiveError.
+    virtual std::shared_ptr<const ArchivedObject> objectForKey(std::string_view key) const;
+
+  private:
+    friend class KeyedUnarchiver;
+    mutable KeyedUnarchiver* unarchiver_ = nullptr;  // the one that decoded the object
 };
 using ArchivedObjectRef = std::shared_ptr<const ArchivedObject>;
 
@@ -63,7 +68,8 @@ class KeyedUnarchiverDelegate {
     // unarchiver:cannotDecodeObjectOfClassName:originalClasses:
     // `originalClasses` is the archived class's list of itself and its ancestors. Nil makes decoding raise
     // ArchiveError, as having no delegate does.
-    virtual ArchivedClass cannotDecodeObjectOfClassName(KeyedUnarchiver& unarchiver, std::string_view className,
+    virtual ArchivedClass cannotDecodeObjectOfClassName(KeyedUnarchiver& unarchiver,
+                                                        std::string_view className,
                                                         const std::vector<std::string>& originalClasses) = 0;
 };
 

@@ -9,9 +9,11 @@
 // may not be assigned while another thread reads it.
 #pragma once
 
+#include <algorithm>
 #include <atomic>
 #include <cstddef>
 #include <initializer_list>
+#include <iterator>
 #include <memory>
 #include <utility>
 #include <vector>
@@ -43,6 +45,11 @@ class SnapshotList {
     const T& back() const { return (*this)[count_ - 1]; }
     const_iterator begin() const { return buffer_ ? buffer_->slots.get() : nullptr; }
     const_iterator end() const { return begin() + count_; }
+
+    void swap(SnapshotList& other) noexcept {
+        buffer_.swap(other.buffer_);
+        std::swap(count_, other.count_);
+    }
 
     SnapshotList appending(T element) const {
         SnapshotList longer = withRoomForOneMore();

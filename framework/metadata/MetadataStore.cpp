@@ -162,7 +162,7 @@ VXMetadataPropertiesRef MetadataStore::propertiesForFile(const std::string& path
     return std::make_shared<FileMetadata>(cache_, path);
 }
 
-bool MetadataStore::supportedMovieFile(const std::string& path) {
+bool MetadataStore::supportedMovieFile(const std::string& path) const {
     if (!typeOfFile(platform::path::lastComponent(path)).isMovie)
         return false;
     const auto status = statusOf(path);

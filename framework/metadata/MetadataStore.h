@@ -12,6 +12,7 @@
 #include <optional>
 #include <string>
 
+#include "framework/MetadataProvider.h"
 #include "framework/metadata/MediaReader.h"
 #include "host/VXMetadata.h"
 
@@ -19,20 +20,20 @@ namespace vexo {
 
 class MetadataCache;
 
-class MetadataStore {
+class MetadataStore final : public MetadataProvider {
   public:
     // `indexPath`: where the index lies, MetadataIndex::defaultPath() as a rule; nil for one in memory.
     MetadataStore(const std::optional<std::string>& indexPath, std::shared_ptr<MediaReader> reader);
-    ~MetadataStore();
+    ~MetadataStore() override;
     MetadataStore(const MetadataStore&) = delete;
     MetadataStore& operator=(const MetadataStore&) = delete;
 
     // Never nil. Paths under /Volumes are understood, wherever the platform's services are in place.
-    VXMetadataPropertiesRef propertiesForFile(const std::string& path) const;
+    VXMetadataPropertiesRef propertiesForFile(const std::string& path) const override;
 
     // Whether the file is of a movie type by its extension, and a plain file; links are followed. Does not
     // open it.
-    static bool supportedMovieFile(const std::string& path);
+    bool supportedMovieFile(const std::string& path) const override;
 
     // The index's file; empty while it lives in memory.
     std::string indexPath() const;

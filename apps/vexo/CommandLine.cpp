@@ -1,0 +1,158 @@
+#include "apps/vexo/CommandLine.h"
+
+#include <CLI/CLI.hpp>
+#include <filesystem>
+#include <iostream>
+
+#include "apps/vexo/Commands.h"
+#include "apps/vexo/Progress.h"
+#include "apps/vexo/Terminal.h"
+
+namespace vexo {
+namespace {
+
+constexpr int statusDone = 0;
+constexpr int statusFailed = 1;
+constexpr int statusWrongLine = 2;
+
+struct Arguments {
+    std::vector<std::string> plugins;
+    std::optional<std::string> home;
+    bool quiet = false;
+    bool verbose = false;
+    bool json = false;
+    TreeOptions tree;
+    std::string demoFolder;
+};
+
+// The commands that need a host are kept apart from those that don't.
+using HostCommand = std::function<Problem(Host&)>;
+
+struct Parser {
+    explicit Parser(Arguments& arguments);
+
+    CLI::App app;
+    HostCommand hostCommand;                // the command that was named, if it needs a host
+    std::function<Problem()> plainCommand;  // else
+
+  private:
+    CLI::App* addCommand(const std::string& name, const std::string& summary);
+};
+
+OutputFormat format(const Arguments& arguments) {
+    return arguments.json ? OutputFormat::json : OutputFormat::text;
+}
+
+Parser::Parser(Arguments& arguments)
+    : app("Browses the libraries of the video editor Reelix without the editor.", "vexo") {
+    app.require_subcommand(1);
+    app.fallthrough();
+    app.set_version_flag("--version", "vexo " VEXO_VERSION);
+    app.footer("Run 'vexo COMMAND --help' for the options of a command, 'man vexo' for the whole story.");
+    app.add_option("--plugin", arguments.plugins,
+                   "Load this plug-in bundle instead of those found; may be repeated")
+        ->option_text("BUNDLE");
+    app.add_option("--home", arguments.home, "Browse this home folder")->option_text("DIR");
+    auto* quiet = app.add_flag("--quiet", arguments.quiet, "Print nothing but errors on standard error");
+    app.add_flag("--verbose", arguments.verbose, "Print the host's log on standard error")->excludes(quiet);
+
+    CLI::App* tree = addCommand("tree", "Print the tree of projects and events");
+    tree->add_flag("--json", arguments.json, "Print JSON");
+    tree->add_flag("--metadata", arguments.tree.withMetadata,
+                   "Read every movie's duration, size and properties");
+    tree->add_option("--depth", arguments.tree.depth, "Levels below the root; 0 is the root alone")
+        ->option_text("N")
+        ->check(CLI::NonNegativeNumber);
+    tree->callback([this, &arguments] {
+        arguments.tree.format = format(arguments);
+        hostCommand = [&arguments](Host& host) { return runTree(host, arguments.tree, std::cout); };
+    });
+
+    CLI::App* info = addCommand("info", "Print the plug-ins found and what they say of themselves");
+    info->add_flag("--json", arguments.json, "Print JSON");
+    info->callback([this, &arguments] {
+        hostCommand = [&arguments](Host& host) { return runInfo(host, format(arguments), std::cout); };
+    });
+
+    CLI::App* locations = addCommand("locations", "Print every folder that is looked at for libraries");
+    locations->add_flag("--json", arguments.json, "Print JSON");
+    locations->callback([this, &arguments] {
+        hostCommand = [&arguments](Host& host) { return runLocations(host, format(arguments), std::cout); };
+    });
+
+    CLI::App* demo = addCommand("demo", "Make a small, complete sample home with real movies");
+    demo->add_option("DIR", arguments.demoFolder, "The folder to make; must not exist or be empty")
+        ->required();
+    demo->callback([this, &arguments] {
+        plainCommand = [&arguments] { return runDemo(arguments.demoFolder, std::cout); };
+    });
+}
+
+CLI::App* Parser::addCommand(const std::string& name, const std::string& summary) {
+    return app.add_subcommand(name, summary)->fallthrough();
+}
+
+// One line of a text that may have several.
+std::string firstLine(const std::string& text) {
+    return text.substr(0, text.find('\n'));
+}
+
+int report(const std::string& problem, int status) {
+    std::cerr << "vexo: " << printable(firstLine(problem)) << std::endl;
+    return status;
+}
+
+Problem checkHome(Arguments& arguments) {
+    if (!arguments.home)
+        return std::nullopt;
+    std::error_code error;
+    const std::filesystem::path home = std::filesystem::absolute(*arguments.home, error).lexically_normal();
+    if (!std::filesystem::is_directory(home, error))
+        return "there is no home folder '" + *arguments.home + "'; give an existing folder to --home";
+    arguments.home = home.string();
+    while (arguments.home->size() > 1 && arguments.home->back() == '/')
+        arguments.home->pop_back();
+    return std::nullopt;
+}
+
+Problem runWithHost(const HostCommand& command, Arguments& arguments) {
+    if (const Problem problem = checkHome(arguments))
+        return problem;
+    HostOptions options;
+    options.homeDirectory = arguments.home;
+    options.pluginBundles = arguments.plugins;
+    options.verbosity = arguments.verbose ? Verbosity::verbose : Verbosity::normal;
+    Host host(options);
+    // A verbose host's log shows warnings already.
+    if (!arguments.quiet && !arguments.verbose)
+        host.diagnostics().setWarningHandler([](const std::string& warning) { showWarning(warning); });
+    if (const Problem problem = host.loadPlugins())
+        return problem;
+    if (host.plugins().empty())
+        return "no plug-in was found; name one with --plugin BUNDLE, or its folder in VEXO_PLUGIN_PATH";
+    return command(host);
+}
+
+}  // namespace
+
+int runCommandLine(int argc, char** argv) {
+    Arguments arguments;
+    Parser parser(arguments);
+    try {
+        parser.app.parse(argc, argv);
+    } catch (const CLI::Success& answer) {  // --help and --version
+        return parser.app.exit(answer);
+    } catch (const CLI::ParseError& error) {
+        return report(std::string(error.what()) + "; try 'vexo --help'", statusWrongLine);
+    }
+
+    const Problem problem =
+        parser.hostCommand ? runWithHost(parser.hostCommand, arguments) : parser.plainCommand();
+    if (problem)
+        return report(*problem, statusFailed);
+    if (!std::cout.flush())
+        return report("the answer cannot be written to standard output", statusFailed);
+    return statusDone;
+}
+
+}  // namespace vexo

@@ -1,0 +1,63 @@
+#include "apps/vexo/Commands.h"
+#include "apps/vexo/Json.h"
+#include "apps/vexo/Progress.h"
+#include "apps/vexo/Terminal.h"
+#include "apps/vexo/TextTree.h"
+
+namespace vexo {
+namespace {
+
+Json jsonPlugin(const LoadedPlugin& plugin, const TreeOptions& options) {
+    VXMediaManager& manager = *plugin.manager;
+    JsonTreeWriter writer(manager, options.withMetadata ? MetadataOutput::include : MetadataOutput::leaveOut);
+    const VXMediaGroupRef root = manager.rootMediaGroup();
+    Json json{{"title", jsonText(manager.rootMediaGroupTitle())},
+              {"uniqueID", jsonText(manager.uniqueID())},
+              {"mediaTypesSupported", manager.mediaTypesSupported()},
+              {"managedMediaSource", plugin.principalClass->isManagedMediaSource()},
+              {"version", plugin.principalClass->versionNumber},
+              {"canLoadData", manager.canLoadData()},
+              {"appInstalled", manager.appInstalled()},
+              {"defaultNoDataMessage", jsonText(noDataMessage(manager, root))},
+              {"root", root ? writer.group(root, options.depth) : Json()}};
+    Json& mediaGroups = json["mediaGroups"] = Json::array();
+    for (const VXMediaGroupRef& group : manager.mediaGroups())
+        mediaGroups.push_back(writer.groupAlone(group));
+    return json;
+}
+
+void printJson(Host& host, const TreeOptions& options, std::ostream& out) {
+    Json plugins = Json::array();
+    for (const LoadedPlugin& plugin : host.plugins())
+        plugins.push_back(jsonPlugin(plugin, options));
+    Json warnings = Json::array();
+    for (const std::string& warning : host.diagnostics().warnings())
+        warnings.push_back(jsonText(warning));
+    out << Json{{"plugins", plugins}, {"warnings", warnings}}.dump(2) << "\n";
+}
+
+void printText(Host& host, const TreeOptions& options, std::ostream& out) {
+    const OutputStyle style = OutputStyle::ofStandardOutput();
+    for (const LoadedPlugin& plugin : host.plugins()) {
+        const VXMediaGroupRef root = plugin.manager->rootMediaGroup();
+        if (!root)
+            continue;
+        const TextTree tree(root, {options.depth, options.withMetadata});
+        tree.print(out, style);
+        if (const auto message = noDataMessage(*plugin.manager, root))
+            out << printable(*message) << "\nRun 'vexo locations' to see where libraries are looked for.\n";
+    }
+}
+
+}  // namespace
+
+Problem runTree(Host& host, const TreeOptions& options, std::ostream& out) {
+    loadWithProgress(host);
+    if (options.format == OutputFormat::json)
+        printJson(host, options, out);
+    else
+        printText(host, options, out);
+    return std::nullopt;
+}
+
+}  // namespace vexo

@@ -1,0 +1,15 @@
+#include <clocale>
+#include <exception>
+#include <iostream>
+
+#include "apps/vexo/CommandLine.h"
+
+int main(int argc, char** argv) {
+    std::setlocale(LC_ALL, "");
+    try {
+        return vexo::runCommandLine(argc, argv);
+    } catch (const std::exception& error) {
+        std::cerr << "vexo: " << error.what() << "\n";
+        return 1;
+    }
+}

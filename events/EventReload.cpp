@@ -1,0 +1,172 @@
+// Which folders are event libraries, and rebuilding the event branch of the tree from them.
+#include "core/ProcessCaches.h"
+#include "core/ReelixConstants.h"
+#include "core/StableSort.h"
+#include "core/VXReelixPlugin.h"
+#include "core/VolumeFolders.h"
+#include "events/EventOrder.h"
+#include "platform/Path.h"
+
+namespace reelix {
+
+using platform::Locked;
+using vexo::VXMediaGroupList;
+using vexo::VXPathWatcher;
+
+namespace {
+
+using Comparison = platform::ComparisonResult (*)(const vexo::VXMediaGroupRef&, const vexo::VXMediaGroupRef&);
+
+VXMediaGroupList sorted(const VXMediaGroupList& groups, Comparison comparison) {
+    return VXMediaGroupList(stableSorted(groups, comparison));
+}
+
+std::optional<platform::Value> yearOf(const vexo::VXMediaGroup& group) {
+    const auto attributes = group.attributes();
+    const platform::Value* year = platform::find(*attributes, VXReelixEventCreationYear);
+    return year ? std::optional(*year) : std::nullopt;
+}
+
+}  // namespace
+
+// Duplicates stay, and so do folders that do not exist.
+void VXReelixPlugin::_prepareReelixEventsSearchPaths() {
+    auto paths = std::make_shared<vexo::VXPathList>();
+    for (const auto& folder : {_ReelixDefaultEventsFolderPath(), _ReelixDefaultEventsFolderPath2()}) {
+        if (folder)
+            paths->append(*folder);
+    }
+    for (std::string& folder : foldersOnVolumes(ReelixEventsFolderName))
+        paths->append(std::move(folder));
+    _ReelixEventsSearchPaths = std::move(paths);
+}
+
+VXReelixPlugin::Group VXReelixPlugin::_reloadReelixEvents() {
+    const Group root = rootMediaGroup();
+    return _reloadReelixEvents(root ? root->ID() : std::nullopt, /*updateRootMediaGroup=*/true);
+}
+
+VXReelixPlugin::Group VXReelixPlugin::_reloadReelixEvents(const std::optional<std::string>& parentID,
+                                                          bool updateRootMediaGroup) {
+    _poolingEventsReload = false;  // before all else: a change from now on needs a reload of its own
+    const Group holder = newMediaGroupWithTypeIdentifier(vexo::VXReelixRootGroupTypeIdentifier, std::nullopt);
+    {
+        Locked monitor(_monitor);
+        scanEventLibraries(holder);
+    }
+    if (isCancelLoadRequestPending())
+        return nullptr;
+
+    const Comparison comparison = _mostRecentEventFirst ? &ReelixSupport::_eventComparisonByYearNewestFirst
+                                                        : &ReelixSupport::_eventComparisonByYearOldestFirst;
+    const Group eventLibrary = newEventLibraryGroup(parentID);
+    YearGroups years;
+    for (const Group& event : sorted(holder->childGroups(), comparison)) {
+        if (isCancelLoadRequestPending())
+            break;
+        fileEventUnderItsYear(event, eventLibrary, years);
+    }
+    for (const Group& year : eventLibrary->childGroups()) {
+        if (isCancelLoadRequestPending())
+            break;
+        year->setChildGroups(sorted(year->childGroups(), comparison));
+    }
+
+    if (updateRootMediaGroup && !isCancelLoadRequestPending()) {
+        finishReloadReelixEvents(eventLibrary);
+        if (const Group root = rootMediaGroup()) {
+            _setMediaObjectsForRootMediaGroup(root);
+            setRootMediaGroup(root);
+        }
+    }
+    return eventLibrary->childGroups().empty() ? nullptr : eventLibrary;
+}
+
+void VXReelixPlugin::scanEventLibraries(const Group& holder) {
+    _flatEventGroupsList = std::make_unique<Groups>();
+    if (!_ReelixEventsSearchPaths)
+        return;
+    VXPathWatcher& watcher = VXPathWatcher::sharedPathWatcher();
+    for (const std::string& folder : _ReelixEventsSearchPaths->snapshot()) {
+        if (isCancelLoadRequestPending())
+            return;
+        if (const Group library = _createReelixEventsFolderForPath(folder)) {
+            library->setParentID(std::string(vexo::VXReelix));
+            holder->addChildGroups(library->childGroups());
+        }
+        if (watcher.watchPathIsUnique(platform::path::withoutLastComponent(folder), self()))
+            _watchPath(folder);
+    }
+}
+
+VXReelixPlugin::Group VXReelixPlugin::newEventLibraryGroup(const std::optional<std::string>& parentID) {
+    const auto title = localizedString("ReelixEventLibrary");
+    const Group eventLibrary =
+        newMediaGroupWithTypeIdentifier(vexo::VXReelixEventLibraryGroupTypeIdentifier, title);
+    eventLibrary->setName(title);
+    eventLibrary->setParentID(parentID);
+    eventLibrary->setIcon(iconCache().eventIcon.get());
+    return eventLibrary;
+}
+
+// An event without a year matches no year group, so each such event gets one of its own.
+void VXReelixPlugin::fileEventUnderItsYear(const Group& event, const Group& eventLibrary, YearGroups& years) {
+    const std::optional<platform::Value> year = yearOf(*event);
+    const std::optional<double> number = year ? year->doubleValue() : std::nullopt;
+    const auto known = number ? years.find(*number) : years.end();
+    if (known != years.end()) {
+        known->second->addChildGroup(event);
+        return;
+    }
+    const Group yearGroup = newYearGroup(year);
+    yearGroup->addChildGroup(event);
+    eventLibrary->addChildGroup(yearGroup);
+    if (number)
+        years.emplace(*number, yearGroup);
+}
+
+VXReelixPlugin::Group VXReelixPlugin::newYearGroup(const std::optional<platform::Value>& year) {
+    const std::string title = std::to_string(year && year->integer() ? *year->integer() : 0);
+    const Group yearGroup =
+        newMediaGroupWithTypeIdentifier(vexo::VXReelixEventCalendarGroupTypeIdentifier, title);
+    yearGroup->setName(title);
+    // The root group, not the event library: the host looks years up from the top.
+    yearGroup->setParentID(std::string(vexo::VXReelix));
+    yearGroup->setIcon(iconCache().calendarIcon.get());
+    if (year) {
+        platform::Dictionary attributes = *yearGroup->attributes();
+        attributes.insert_or_assign(std::string(VXReelixEventCreationYear), *year);
+        yearGroup->setAttributes(std::move(attributes));
+    }
+    return yearGroup;
+}
+
+// The new library takes the old one's place, or the end; one without clips only removes the old one.
+void VXReelixPlugin::finishReloadReelixEvents(const Group& eventLibrary) {
+    const Group root = rootMediaGroup();
+    if (!root)
+        return;
+    const bool hasClips = eventLibrary && !eventLibrary->mediaObjects().empty();
+    bool placed = false;
+    Groups children;
+    const VXMediaGroupList current = root->childGroups();
+    for (std::size_t index = 0; index < current.size(); ++index) {
+        if (current[index]->typeIdentifier() != vexo::VXReelixEventLibraryGroupTypeIdentifier) {
+            children.push_back(current[index]);
+        } else if (hasClips) {
+            if (children.size() > index)
+                children[index] = eventLibrary;
+            else
+                children.push_back(eventLibrary);
+            placed = true;
+        }
+    }
+    if (!placed && hasClips)
+        children.push_back(eventLibrary);
+
+    const Groups inOrder = stableSorted(children, ReelixSupport::_ReelixRootGroupComparison);
+    if (!isCancelLoadRequestPending())
+        root->setChildGroups(VXMediaGroupList(inOrder));
+}
+
+}  // namespace reelix

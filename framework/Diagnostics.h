@@ -1,0 +1,42 @@
+// What the host has to say to people: warnings about things they may want to mend, and a trace for those who
+// ask for it. Thread-safe.
+#pragma once
+
+#include <functional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "platform/SystemLog.h"
+#include "platform/ThreadSafety.h"
+
+namespace vexo {
+
+enum class Verbosity { normal, verbose };
+
+class Diagnostics {
+  public:
+    using WarningHandler = std::function<void(const std::string& warning)>;
+
+    // `log` is not owned and outlives the object.
+    Diagnostics(platform::SystemLog& log, Verbosity verbosity) : log_(log), verbosity_(verbosity) {}
+
+    // Keeps a warning, logs it and tells the handler. One that is known already is not repeated.
+    void warn(const std::string& warning) VX_EXCLUDES(mutex_);
+    std::vector<std::string> warnings() const VX_EXCLUDES(mutex_);
+    // Called for each new warning, on the thread that warns, outside the lock.
+    void setWarningHandler(WarningHandler handler) VX_EXCLUDES(mutex_);
+
+    void log(std::string_view line) { log_.log(line); }
+    // Like `log`, in a verbose host only.
+    void trace(std::string_view line);
+
+  private:
+    platform::SystemLog& log_;
+    const Verbosity verbosity_;
+    mutable platform::Mutex mutex_;
+    std::vector<std::string> warnings_ VX_GUARDED_BY(mutex_);
+    WarningHandler handler_ VX_GUARDED_BY(mutex_);
+};
+
+}  // namespace vexo

@@ -1,0 +1,171 @@
+#include "framework/Host.h"
+
+#include <algorithm>
+
+#include "framework/GuardedWork.h"
+#include "framework/HostServices.h"
+#include "framework/ImageManager.h"
+#include "framework/PathWatcher.h"
+#include "framework/PluginSearch.h"
+#include "framework/metadata/FileTypes.h"
+#include "framework/metadata/MediaReader.h"
+#include "framework/metadata/MetadataIndex.h"
+#include "framework/metadata/MetadataStore.h"
+#include "host/VXConstants.h"
+#include "platform/Notification.h"
+#include "platform/Path.h"
+#include "platform/Services.h"
+#include "platform/linux/LinuxDispatcher.h"
+#include "platform/linux/LinuxFileManager.h"
+#include "platform/linux/LinuxSystemLog.h"
+#include "platform/linux/LinuxUserDefaults.h"
+#include "platform/linux/LinuxWorkspace.h"
+#include "platform/linux/MountTable.h"
+
+namespace vexo {
+namespace {
+
+constexpr const char* processDefaultsDomain = "com.vexo.browser";
+
+std::optional<std::string> chosenHome(const HostOptions& options) {
+    return options.homeDirectory ? options.homeDirectory : platform::LinuxFileManager::userHomeDirectory();
+}
+
+// The folder of the suite's preference file, in the home that is browsed.
+std::string preferencesFolder(const std::optional<std::string>& home) {
+    const std::string file(VXSuitePrefsPath.substr(1));  // without its "~"
+    return platform::path::withoutLastComponent(home.value_or("") + file);
+}
+
+}  // namespace
+
+// In order of construction. The dispatcher is taken down first of all, by the host, while everything that its
+// work uses is still there.
+struct Host::State {
+    explicit State(const HostOptions& options)
+        : pluginBundles(options.pluginBundles),
+          home(chosenHome(options)),
+          log("vexo", options.verbosity == Verbosity::verbose
+                          ? platform::LinuxSystemLog::StandardError::copies
+                          : platform::LinuxSystemLog::StandardError::silent),
+          files(home, mounts, log, isPackageExtension),
+          workspace(mounts),
+          userDefaults(preferencesFolder(home), processDefaultsDomain, &log),
+          diagnostics(log, options.verbosity),
+          metadata(MetadataIndex::defaultPath(),
+                   std::make_shared<ProcessMediaReader>(ProcessMediaReader::Settings{mediaReaderProgram()})),
+          images([this](const std::string& path) { return metadata.supportedMovieFile(path); }),
+          dispatcher(std::make_unique<platform::LinuxDispatcher>(log)),
+          platformScope({files, workspace, userDefaults, *dispatcher, notifications, log}),
+          hostScope({pathWatcher, images, metadata, diagnostics}) {
+        dispatcher->setFailureHandler([](const platform::Dispatcher::Block& block,
+                                         std::exception_ptr failure) { recoverFrom(failure, block); });
+    }
+
+    const std::vector<std::string> pluginBundles;
+    const std::optional<std::string> home;
+    platform::LinuxSystemLog log;
+    platform::SystemMountTable mounts;
+    platform::LinuxFileManager files;
+    platform::LinuxWorkspace workspace;
+    platform::LinuxUserDefaults userDefaults;
+    platform::NotificationCenter notifications;
+    Diagnostics diagnostics;
+    PathWatcher pathWatcher;
+    MetadataStore metadata;
+    ImageManager images;
+    std::unique_ptr<platform::LinuxDispatcher> dispatcher;
+    platform::ServicesScope platformScope;
+    HostServicesScope hostScope;
+    std::vector<LoadedPlugin> plugins;
+};
+
+Host::Host(const HostOptions& options) : state_(std::make_unique<State>(options)) {}
+
+Host::~Host() {
+    for (const LoadedPlugin& plugin : state_->plugins)
+        plugin.manager->close();
+    for (const LoadedPlugin& plugin : state_->plugins)
+        plugin.manager->waitUntilLoaded();
+    state_->dispatcher.reset();
+}
+
+std::optional<std::string> Host::loadPlugins() {
+    const bool named = !state_->pluginBundles.empty();
+    for (const std::string& bundlePath : pluginBundles(state_->pluginBundles)) {
+        const std::optional<std::string> problem = loadPlugin(bundlePath);
+        if (problem && named)
+            return problem;
+        if (problem)
+            state_->diagnostics.warn(*problem);
+    }
+    return std::nullopt;
+}
+
+// The first bundle with an identifier is taken, those found after it are left alone.
+std::optional<std::string> Host::loadPlugin(const std::string& bundlePath) {
+    BundleResult opened = Bundle::open(bundlePath);
+    if (!opened.bundle)
+        return opened.error;
+    const bool known =
+        std::any_of(state_->plugins.begin(), state_->plugins.end(), [&](const LoadedPlugin& plugin) {
+            return plugin.bundle->identifier() == opened.bundle->identifier();
+        });
+    if (known)
+        return std::nullopt;
+
+    std::string error;
+    const VXPrincipalClass* principalClass = opened.bundle->principalClass(error);
+    if (!principalClass)
+        return error;
+    std::shared_ptr<VXMediaManager> manager;
+    runGuarded([&] { manager = principalClass->newObject(opened.bundle); });
+    if (!manager)
+        return "the plug-in '" + bundlePath + "' could not be initialised";
+    state_->plugins.push_back({std::move(opened.bundle), principalClass, std::move(manager)});
+    return std::nullopt;
+}
+
+const std::vector<LoadedPlugin>& Host::plugins() const {
+    return state_->plugins;
+}
+
+void Host::startLoading() {
+    for (const LoadedPlugin& plugin : state_->plugins)
+        runGuarded([&] { plugin.manager->loadData(); });
+}
+
+bool Host::waitUntilLoaded(std::chrono::nanoseconds atMost) const {
+    const auto deadline = std::chrono::steady_clock::now() + atMost;
+    return std::all_of(
+        state_->plugins.begin(), state_->plugins.end(), [deadline](const LoadedPlugin& plugin) {
+            return plugin.manager->waitUntilLoaded(deadline - std::chrono::steady_clock::now());
+        });
+}
+
+void Host::cancelLoading() {
+    for (const LoadedPlugin& plugin : state_->plugins)
+        plugin.manager->cancelLoad();
+}
+
+Diagnostics& Host::diagnostics() {
+    return state_->diagnostics;
+}
+
+const PathWatcher& Host::pathWatcher() const {
+    return state_->pathWatcher;
+}
+
+std::string Host::suitePreferencesPath() const {
+    return platform::path::expandingTilde(VXSuitePrefsPath);
+}
+
+std::string Host::userDefaultsPath() const {
+    return state_->userDefaults.pathForDomain(processDefaultsDomain);
+}
+
+std::string Host::metadataIndexPath() const {
+    return state_->metadata.indexPath();
+}
+
+}  // namespace vexo

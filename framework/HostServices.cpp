@@ -1,0 +1,43 @@
+#include "framework/HostServices.h"
+
+#include <atomic>
+#include <stdexcept>
+
+#include "framework/MetadataProvider.h"
+#include "host/VXMediaBrowserImageManager.h"
+#include "host/VXMediaBrowserUtilities.h"
+#include "host/VXPathWatcher.h"
+
+namespace vexo {
+namespace {
+
+std::atomic<const HostServices*> currentServices = nullptr;
+
+}  // namespace
+
+const HostServices& hostServices() {
+    if (const HostServices* services = currentServices.load(std::memory_order_acquire))
+        return *services;
+    throw std::logic_error("the host's services are used before a host exists");
+}
+
+HostServicesScope::HostServicesScope(const HostServices& services)
+    : services_(services), previous_(currentServices.exchange(&services_)) {}
+
+HostServicesScope::~HostServicesScope() {
+    currentServices.store(previous_);
+}
+
+VXPathWatcher& VXPathWatcher::sharedPathWatcher() {
+    return hostServices().pathWatcher;
+}
+
+VXMediaBrowserImageManager& VXMediaBrowserImageManager::sharedInstance() {
+    return hostServices().imageManager;
+}
+
+bool VXMediaBrowserUtilities::supportedMovieFile(const std::string& path) {
+    return hostServices().metadata.supportedMovieFile(path);
+}
+
+}  // namespace vexo

@@ -1,0 +1,20 @@
+// Knows files by type and by content. Callable from any thread.
+#pragma once
+
+#include <string>
+
+#include "host/VXMetadata.h"
+
+namespace vexo {
+
+class MetadataProvider {
+  public:
+    virtual ~MetadataProvider() = default;
+
+    // Never nil; nothing is read before a property is asked for.
+    virtual VXMetadataPropertiesRef propertiesForFile(const std::string& path) const = 0;
+    // Whether the file is a movie by its type. Does not read it.
+    virtual bool supportedMovieFile(const std::string& path) const = 0;
+};
+
+}  // namespace vexo

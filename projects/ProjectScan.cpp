@@ -1,0 +1,124 @@
+// Turns one folder of projects into a tree of groups.
+#include "core/ProcessCaches.h"
+#include "core/ReelixConstants.h"
+#include "core/VXReelixPlugin.h"
+#include "host/VXMediaBrowserImageManager.h"
+#include "platform/FileManager.h"
+#include "platform/Path.h"
+#include "platform/Services.h"
+
+namespace reelix {
+namespace {
+
+namespace path = platform::path;
+
+constexpr std::string_view projectExtension = "qnproject";
+
+struct FolderListing {
+    std::string folder;  // the folder that was listed
+    std::vector<std::string> names;
+};
+
+// A folder whose localized form can't be listed is read by its plain name. An unlistable one has no entries.
+FolderListing listFolder(const std::string& folder) {
+    const platform::FileManager& files = platform::services().fileManager;
+    if (auto names = files.contentsOfDirectoryAtPath(folder))
+        return {folder, std::move(*names)};
+    if (path::extension(folder) != ReelixLocalizedExtension)
+        return {folder, {}};
+    std::string plain = path::withoutExtension(folder);
+    auto names = files.contentsOfDirectoryAtPath(plain);
+    return {std::move(plain), names.value_or(std::vector<std::string>{})};
+}
+
+void setFileFields(const vexo::VXMediaGroupRef& group, const std::string& file) {
+    group->setName(path::lastComponent(file));
+    group->setModificationDate(vexo::VXMediaGroup::modDateForFile(file));
+    group->setPath(file);
+}
+
+// A project without movies never shares its icon object with a finished one.
+platform::ImageRef projectIcon(bool hasMovies, bool isTrailer) {
+    const IconCache& icons = iconCache();
+    if (hasMovies)
+        return (isTrailer ? icons.trailerIcon : icons.projectIcon).get();
+    return (isTrailer ? icons.spareTrailerIcon : icons.spareProjectIcon).get();
+}
+
+}  // namespace
+
+VXReelixPlugin::Group VXReelixPlugin::_createReelixProjectsFolderForPath(
+    const std::optional<std::string>& path) {
+    if (!path)
+        return nullptr;
+    const Group folderGroup = newMediaGroupWithTypeIdentifier(vexo::VXReelixFolderGroupTypeIdentifier, *path);
+    setFileFields(folderGroup, *path);
+    folderGroup->setParentID(path::withoutLastComponent(*path));
+    folderGroup->setIcon(vexo::VXMediaBrowserImageManager::sharedInstance().iconForFile(*path));
+
+    const FolderListing listing = listFolder(*path);
+    for (const std::string& name : listing.names) {
+        if (name.empty() || name.front() == '.')
+            continue;
+        const std::string entry = path::appending(listing.folder, name);
+        // An item whose flags can't be had is skipped.
+        const std::uint32_t flags = platform::services().fileManager.itemFlagsAtPath(entry).value_or(0);
+        if (flags & platform::itemIsInvisible)
+            continue;
+        if (flags & platform::itemIsPackage) {
+            if (path::extension(entry) == projectExtension)
+                folderGroup->addChildGroup(projectGroupForPackage(entry, listing.folder));
+        } else if (flags & platform::itemIsContainer) {
+            const Group subfolder = _createReelixProjectsFolderForPath(entry);
+            subfolder->setParentID(folderGroup->ID());
+            folderGroup->addChildGroup(subfolder);
+        }
+    }
+
+    if (folderGroup->childGroups().empty())
+        _flatProjectGroupsList->push_back(placeholderGroupForFolder(listing.folder));
+    _createReelixProjectsFolderMediaObjects(folderGroup);
+    return folderGroup;
+}
+
+VXReelixPlugin::Group VXReelixPlugin::projectGroupForPackage(const std::string& package,
+                                                             const std::string& folder) {
+    const Group project = newMediaGroupWithTypeIdentifier(vexo::VXReelixProjectGroupTypeIdentifier, package);
+    setFileFields(project, package);
+    project->setName(path::withoutExtension(path::lastComponent(package)));
+    project->setParentID(folder);
+    _flatProjectGroupsList->push_back(project);
+
+    const std::vector<std::string> movies = _renderedMoviesPathsForProjectPath(package);
+    for (const std::string& movie : movies)
+        project->setMediaObjects(project->mediaObjects().appending(renderedMovieObject(movie, package)));
+    project->setIcon(projectIcon(/*hasMovies=*/!movies.empty(), _isTrailer(package)));
+    return project;
+}
+
+// Makes an empty library known through the flat list; it is attached to nothing in the tree.
+VXReelixPlugin::Group VXReelixPlugin::placeholderGroupForFolder(const std::string& folder) {
+    const bool isDefault = folder == _ReelixDefaultPath() || folder == _ReelixDefaultPath2();
+    const Group placeholder = newMediaGroupWithTypeIdentifier(
+        isDefault ? vexo::VXReelixProjectLibraryGroupTypeIdentifier : vexo::VXReelixFolderGroupTypeIdentifier,
+        folder);
+    setFileFields(placeholder, folder);
+    placeholder->setParentID(folder);
+    placeholder->setIcon(vexo::VXMediaBrowserImageManager::sharedInstance().iconForFile(folder));
+    return placeholder;
+}
+
+VXReelixPlugin::Object VXReelixPlugin::renderedMovieObject(const std::string& movie,
+                                                           const std::string& package) {
+    const Object object = newMediaObjectWithType(vexo::VXMediaTypeMovie,
+                                                 path::withoutExtension(path::lastComponent(movie)), movie);
+    object->setMediaSourceType(vexo::VXMediaSourceTypeFile);
+    object->setPath(movie);
+    object->setSpotlightProperties(vexo::VXMediaObject::spotlightProperties(movie));
+    object->setAttribute(package, vexo::VXReelixProjectPathKey);
+    object->setAttribute(ReelixProjectFormatVersion, vexo::VXReelixProjectFormatVersion);
+    object->setIcon(iconCache().smallApplicationIcon.get());
+    return object;
+}
+
+}  // namespace reelix
