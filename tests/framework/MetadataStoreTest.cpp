@@ -235,15 +235,16 @@ TEST_F(MetadataOfFiles, AreThoseOfTheRealMovie) {
 }
 
 TEST(SupportedMovieFile, IsAPlainFileOfAMovieType) {
+    const MetadataStore store(std::nullopt, nullptr);
     const TemporaryFolder folder;
-    EXPECT_TRUE(MetadataStore::supportedMovieFile(folder.writeFile("a.mov")));
-    EXPECT_TRUE(MetadataStore::supportedMovieFile(folder.writeFile("A.M4V", "no movie at all")));
-    EXPECT_TRUE(MetadataStore::supportedMovieFile(folder.makeLink("link.mp4", folder.path("a.mov"))));
-    EXPECT_FALSE(MetadataStore::supportedMovieFile(folder.path("missing.mov")));
-    EXPECT_FALSE(MetadataStore::supportedMovieFile(folder.makeFolder("folder.mov")));
-    EXPECT_FALSE(MetadataStore::supportedMovieFile(folder.makeFifo("fifo.mov")));
-    EXPECT_FALSE(MetadataStore::supportedMovieFile(folder.writeFile("sound.m4a")));
-    EXPECT_FALSE(MetadataStore::supportedMovieFile(folder.writeFile("picture.jpg")));
-    EXPECT_FALSE(MetadataStore::supportedMovieFile(folder.writeFile("mov")));
-    EXPECT_FALSE(MetadataStore::supportedMovieFile(folder.writeFile(".mov")));
+    EXPECT_TRUE(store.supportedMovieFile(folder.writeFile("a.mov")));
+    EXPECT_TRUE(store.supportedMovieFile(folder.writeFile("A.M4V", "no movie at all")));
+    EXPECT_TRUE(store.supportedMovieFile(folder.makeLink("link.mp4", folder.path("a.mov"))));
+    EXPECT_FALSE(store.supportedMovieFile(folder.path("missing.mov")));
+    EXPECT_FALSE(store.supportedMovieFile(folder.makeFolder("folder.mov")));
+    EXPECT_FALSE(store.supportedMovieFile(folder.makeFifo("fifo.mov")));
+    EXPECT_FALSE(store.supportedMovieFile(folder.writeFile("sound.m4a")));
+    EXPECT_FALSE(store.supportedMovieFile(folder.writeFile("picture.jpg")));
+    EXPECT_FALSE(store.supportedMovieFile(folder.writeFile("mov")));
+    EXPECT_FALSE(store.supportedMovieFile(folder.writeFile(".mov")));
 }
