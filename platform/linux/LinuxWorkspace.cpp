@@ -4,6 +4,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <utility>
 
 #include "platform/linux/IconLookup.h"
 
@@ -75,10 +76,10 @@ ImageRef LinuxWorkspace::iconForApplication(const ApplicationReference& applicat
 }
 
 void LinuxWorkspace::mountsChanged() {
-    auto volumes = mountedLocalVolumePaths();
-    volumes.swap(knownVolumes_);
-    for (const auto& path : std::vector(knownVolumes_))
-        if (std::find(volumes.begin(), volumes.end(), path) == volumes.end())
+    const auto before = std::exchange(knownVolumes_, mountedLocalVolumePaths());
+    const auto now = knownVolumes_;  // an observer may run the main loop, and with it this
+    for (const auto& path : now)
+        if (std::find(before.begin(), before.end(), path) == before.end())
             notificationCenter().post(
                 {std::string(NSWorkspaceDidMountNotification), this, {{"NSDevicePath", path}}});
 }
