@@ -1,6 +1,7 @@
 #include "apps/vexo/CommandLine.h"
 
 #include <CLI/CLI.hpp>
+#include <charconv>
 #include <filesystem>
 #include <iostream>
 
@@ -43,9 +44,17 @@ OutputFormat format(const Arguments& arguments) {
     return arguments.json ? OutputFormat::json : OutputFormat::text;
 }
 
+// Empty for a number of levels, else what is wrong with the text.
+std::string wholeNumber(const std::string& text) {
+    int number = 0;
+    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
+    const bool isWhole = error == std::errc() && end == text.data() + text.size() && number >= 0;
+    return isWhole ? "" : "'" + text + "' is no whole number from 0 up";
+}
+
 Parser::Parser(Arguments& arguments)
     : app("Browses the libraries of the video editor Reelix without the editor.", "vexo") {
-    app.require_subcommand(1);
+    app.require_subcommand(0, 1);
     app.fallthrough();
     app.set_version_flag("--version", "vexo " VEXO_VERSION);
     app.footer("Run 'vexo COMMAND --help' for the options of a command, 'man vexo' for the whole story.");
@@ -62,7 +71,7 @@ Parser::Parser(Arguments& arguments)
                    "Read every movie's duration, size and properties");
     tree->add_option("--depth", arguments.tree.depth, "Levels below the root; 0 is the root alone")
         ->option_text("N")
-        ->check(CLI::NonNegativeNumber);
+        ->check(wholeNumber);
     tree->callback([this, &arguments] {
         arguments.tree.format = format(arguments);
         hostCommand = [&arguments](Host& host) { return runTree(host, arguments.tree, std::cout); };
@@ -92,13 +101,8 @@ CLI::App* Parser::addCommand(const std::string& name, const std::string& summary
     return app.add_subcommand(name, summary)->fallthrough();
 }
 
-// One line of a text that may have several.
-std::string firstLine(const std::string& text) {
-    return text.substr(0, text.find('\n'));
-}
-
 int report(const std::string& problem, int status) {
-    std::cerr << "vexo: " << printable(firstLine(problem)) << std::endl;
+    std::cerr << "vexo: " << printable(problem) << std::endl;
     return status;
 }
 
@@ -142,10 +146,17 @@ int runCommandLine(int argc, char** argv) {
         parser.app.parse(argc, argv);
     } catch (const CLI::Success& answer) {  // --help and --version
         return parser.app.exit(answer);
+    } catch (const CLI::ExtrasError&) {
+        const std::vector<std::string> unknown = parser.app.remaining(/*recurse=*/true);
+        return report(
+            "'" + unknown.front() + "' is no option or command that belongs here; try 'vexo --help'",
+            statusWrongLine);
     } catch (const CLI::ParseError& error) {
         return report(std::string(error.what()) + "; try 'vexo --help'", statusWrongLine);
     }
 
+    if (!parser.hostCommand && !parser.plainCommand)
+        return report("no command was given; try 'vexo --help'", statusWrongLine);
     const Problem problem =
         parser.hostCommand ? runWithHost(parser.hostCommand, arguments) : parser.plainCommand();
     if (problem)

@@ -14,6 +14,12 @@ Json jsonURL(const std::optional<platform::URL>& url) {
     return url ? Json(url->absoluteString()) : Json();
 }
 
+// Points are whole numbers as a rule, and are written so.
+Json jsonPoints(double points) {
+    const auto whole = static_cast<std::int64_t>(points);
+    return static_cast<double>(whole) == points ? Json(whole) : Json(points);
+}
+
 // Data has no form in JSON; its size tells it from none.
 Json jsonData(const platform::Data& data) {
     return Json{{"bytes", data.size()}};
@@ -108,8 +114,8 @@ Json JsonTreeWriter::image(const platform::ImageRef& image) {
     if (!image)
         return {};
     return {{"name", image->name().empty() ? Json() : jsonText(image->name())},
-            {"width", image->size().width},
-            {"height", image->size().height},
+            {"width", jsonPoints(image->size().width)},
+            {"height", jsonPoints(image->size().height)},
             {"image", imageNumbers_.of(image)}};
 }
 

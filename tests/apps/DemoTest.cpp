@@ -1,10 +1,7 @@
 // The demo command, run as people run it: the real program in a process of its own.
-#include <fcntl.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
-#include <spawn.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
 #include <sys/xattr.h>
 #include <unistd.h>
 
@@ -23,6 +20,7 @@
 #include <string>
 #include <vector>
 
+#include "tests/support/Program.h"
 #include "tests/support/TemporaryFolder.h"
 
 namespace {
@@ -33,6 +31,8 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::MatchesRegex;
 using testing::StartsWith;
+using testing_support::Outcome;
+using testing_support::runProgram;
 using testing_support::ScopedEnvironment;
 using testing_support::TemporaryFolder;
 
@@ -49,41 +49,6 @@ std::string contentOf(const std::string& path) {
     std::stringstream content;
     content << file.rdbuf();
     return content.str();
-}
-
-struct Outcome {
-    int status = -1;  // -1 for a program that a signal ended or that did not start
-    std::string output;
-    std::string errors;
-};
-
-// Runs a program to its end, in an environment that keeps the user's own files out of it.
-Outcome run(const std::string& program, std::vector<std::string> arguments) {
-    const TemporaryFolder files;
-    const ScopedEnvironment cache("XDG_CACHE_HOME", files.makeFolder("cache").c_str());
-    const ScopedEnvironment home("HOME", files.makeFolder("home").c_str());
-
-    posix_spawn_file_actions_t actions;
-    posix_spawn_file_actions_init(&actions);
-    const int creating = O_WRONLY | O_CREAT | O_TRUNC;
-    posix_spawn_file_actions_addopen(&actions, STDOUT_FILENO, files.path("out").c_str(), creating, 0600);
-    posix_spawn_file_actions_addopen(&actions, STDERR_FILENO, files.path("err").c_str(), creating, 0600);
-    arguments.insert(arguments.begin(), program);
-    std::vector<char*> pointers;
-    for (std::string& argument : arguments)
-        pointers.push_back(argument.data());
-    pointers.push_back(nullptr);
-    pid_t child = 0;
-    const int error = posix_spawnp(&child, program.c_str(), &actions, nullptr, pointers.data(), environ);
-    posix_spawn_file_actions_destroy(&actions);
-    if (error != 0)
-        return {};
-
-    int status = 0;
-    while (waitpid(child, &status, 0) < 0 && errno == EINTR) {
-    }
-    return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, contentOf(files.path("out")),
-            contentOf(files.path("err"))};
 }
 
 const std::string realProgram = std::string(VEXO_BIN_DIR) + "/vexo";
@@ -104,7 +69,7 @@ class DemoHomeTest : public testing::Test {
   protected:
     static void SetUpTestSuite() {
         temporary_ = std::make_unique<TemporaryFolder>();
-        made_ = run(realProgram, {"demo", home()});
+        made_ = runProgram(realProgram, {"demo", home()});
     }
     static void TearDownTestSuite() { temporary_.reset(); }
     void SetUp() override { ASSERT_EQ(made_.status, 0) << made_.errors; }
@@ -122,7 +87,7 @@ class DemoHomeTest : public testing::Test {
     static Json tree(const std::vector<std::string>& options = {}) {
         std::vector<std::string> arguments{"--home", home(), "tree", "--json"};
         arguments.insert(arguments.end(), options.begin(), options.end());
-        const Outcome outcome = run(realProgram, arguments);
+        const Outcome outcome = runProgram(realProgram, arguments);
         EXPECT_EQ(outcome.status, 0) << outcome.errors;
         return Json::parse(outcome.output, nullptr, /*allow_exceptions=*/false);
     }
@@ -232,7 +197,7 @@ print('trailer' if 'trailer' in info else 'project', ' '.join(sorted(c for c in 
 )";
 
 TEST_F(DemoHomeTest, OtherReadersOfPropertyListsUnderstandItsDocuments) {
-    if (run("python3", {"-c", "import plistlib"}).status != 0)
+    if (runProgram("python3", {"-c", "import plistlib"}).status != 0)
         GTEST_SKIP() << "needs python3";
     const std::string ofProject = "project QNClip QNTimeline QNTitle QNTitleStyle\n";
     const std::string ofTrailer = "trailer QNClip QNStoryboard QNTimeline QNTitle QNTitleStyle\n";
@@ -246,7 +211,7 @@ TEST_F(DemoHomeTest, OtherReadersOfPropertyListsUnderstandItsDocuments) {
                                                       {"Summer Blockbuster", ofTrailer},
                                                       {longName, ofProject}};
     for (const auto& [name, content] : expected) {
-        const Outcome read = run("python3", {"-c", archiveReader, project(name) + "/Project"});
+        const Outcome read = runProgram("python3", {"-c", archiveReader, project(name) + "/Project"});
         EXPECT_EQ(read.output, content) << name << "\n" << read.errors;
     }
 }
@@ -422,7 +387,7 @@ const auto oneLine = MatchesRegex("vexo: [^\n]+\n");
 
 TEST_F(DemoObstacleTest, AFolderThatIsNotEmptyIsRefusedAndLeftAlone) {
     place_.writeFile("home/.hidden", "mine");
-    const Outcome outcome = run(programWithHelper(makesMovies), {"demo", place_.path("home")});
+    const Outcome outcome = runProgram(programWithHelper(makesMovies), {"demo", place_.path("home")});
     EXPECT_EQ(outcome.status, 1);
     EXPECT_EQ(outcome.output, "");
     EXPECT_THAT(outcome.errors, oneLine);
@@ -432,21 +397,21 @@ TEST_F(DemoObstacleTest, AFolderThatIsNotEmptyIsRefusedAndLeftAlone) {
 
 TEST_F(DemoObstacleTest, AFileIsRefusedAndLeftAlone) {
     const std::string file = place_.writeFile("home", "mine");
-    const Outcome outcome = run(programWithHelper(makesMovies), {"demo", file});
+    const Outcome outcome = runProgram(programWithHelper(makesMovies), {"demo", file});
     EXPECT_EQ(outcome.status, 1);
     EXPECT_THAT(outcome.errors, oneLine);
     EXPECT_EQ(contentOf(file), "mine");
 }
 
 TEST_F(DemoObstacleTest, AFolderInsideNoFolderIsRefused) {
-    const Outcome outcome = run(programWithHelper(makesMovies), {"demo", place_.path("missing/home")});
+    const Outcome outcome = runProgram(programWithHelper(makesMovies), {"demo", place_.path("missing/home")});
     EXPECT_EQ(outcome.status, 1);
     EXPECT_THAT(outcome.errors, oneLine);
     EXPECT_THAT(listing(place_.path()), ElementsAre());
 }
 
 TEST_F(DemoObstacleTest, AFolderWithoutANameIsRefused) {
-    const Outcome outcome = run(programWithHelper(makesMovies), {"demo", ""});
+    const Outcome outcome = runProgram(programWithHelper(makesMovies), {"demo", ""});
     EXPECT_NE(outcome.status, 0);
     EXPECT_THAT(outcome.errors, oneLine);
 }
@@ -454,7 +419,7 @@ TEST_F(DemoObstacleTest, AFolderWithoutANameIsRefused) {
 TEST_F(DemoObstacleTest, TheMessageStaysOneLineWhateverTheFolderIsCalled) {
     const std::string folder = place_.makeFolder("two\nlines");
     place_.writeFile("two\nlines/file");
-    const Outcome outcome = run(programWithHelper(makesMovies), {"demo", folder});
+    const Outcome outcome = runProgram(programWithHelper(makesMovies), {"demo", folder});
     EXPECT_EQ(outcome.status, 1);
     EXPECT_THAT(outcome.errors, oneLine);
     EXPECT_THAT(outcome.errors, HasSubstr("is not empty"));
@@ -464,7 +429,7 @@ TEST_F(DemoObstacleTest, AnEmptyFolderIsFilledAndNotReplaced) {
     const std::string home = place_.makeFolder("home");
     struct stat before;
     ASSERT_EQ(stat(home.c_str(), &before), 0);
-    const Outcome outcome = run(programWithHelper(makesMovies), {"demo", home + "/"});
+    const Outcome outcome = runProgram(programWithHelper(makesMovies), {"demo", home + "/"});
     ASSERT_EQ(outcome.status, 0) << outcome.errors;
     struct stat after;
     ASSERT_EQ(stat(home.c_str(), &after), 0);
@@ -476,7 +441,8 @@ TEST_F(DemoObstacleTest, AnEmptyFolderIsFilledAndNotReplaced) {
 // Mounts in a namespace of its own, which is gone with the program.
 Outcome runOnFileSystemWithoutAttributes(const std::string& program, const std::string& mountPoint) {
     const std::string script = "mount -t ramfs none \"$1\" || exit 77; exec \"$0\" demo \"$1/home\"";
-    return run("unshare", {"--user", "--map-root-user", "--mount", "sh", "-c", script, program, mountPoint});
+    return runProgram("unshare",
+                      {"--user", "--map-root-user", "--mount", "sh", "-c", script, program, mountPoint});
 }
 
 TEST_F(DemoObstacleTest, TheAnswerTellsThatTheFileSystemKeepsNoAttributes) {
@@ -492,7 +458,7 @@ TEST_F(DemoObstacleTest, NothingIsLeftWhenAMovieFails) {
     const std::string failsAtTheEnd =
         "case \"$*\" in *Birthday.mp4) echo 'vexo-sample-movie: out of ink' >&2; exit 1;; esac\n";
     const Outcome outcome =
-        run(programWithHelper(failsAtTheEnd + makesMovies), {"demo", place_.path("home")});
+        runProgram(programWithHelper(failsAtTheEnd + makesMovies), {"demo", place_.path("home")});
     EXPECT_EQ(outcome.status, 1);
     EXPECT_EQ(outcome.output, "");
     EXPECT_EQ(outcome.errors, "vexo: no movie could be made: out of ink\n");
@@ -501,14 +467,14 @@ TEST_F(DemoObstacleTest, NothingIsLeftWhenAMovieFails) {
 
 TEST_F(DemoObstacleTest, AnEmptyFolderIsEmptyAgainWhenAMovieFails) {
     const std::string home = place_.makeFolder("home");
-    const Outcome outcome = run(programWithHelper("exit 3\n"), {"demo", home});
+    const Outcome outcome = runProgram(programWithHelper("exit 3\n"), {"demo", home});
     EXPECT_EQ(outcome.status, 1);
     EXPECT_THAT(outcome.errors, oneLine);
     EXPECT_THAT(listing(place_.path()), ElementsAre("home"));
 }
 
 TEST_F(DemoObstacleTest, NothingIsLeftWhenTheHelperWritesNoFile) {
-    const Outcome outcome = run(programWithHelper("exit 0\n"), {"demo", place_.path("home")});
+    const Outcome outcome = runProgram(programWithHelper("exit 0\n"), {"demo", place_.path("home")});
     EXPECT_EQ(outcome.status, 1);
     EXPECT_THAT(outcome.errors, oneLine);
     EXPECT_THAT(listing(place_.path()), ElementsAre());
@@ -517,14 +483,14 @@ TEST_F(DemoObstacleTest, NothingIsLeftWhenTheHelperWritesNoFile) {
 TEST_F(DemoObstacleTest, NothingIsLeftWhenTheProgramIsAskedToEnd) {
     const std::string endsItsParent = "kill -TERM $PPID\n";
     const Outcome outcome =
-        run(programWithHelper(endsItsParent + makesMovies), {"demo", place_.path("home")});
+        runProgram(programWithHelper(endsItsParent + makesMovies), {"demo", place_.path("home")});
     EXPECT_EQ(outcome.status, 1);
     EXPECT_EQ(outcome.errors, "vexo: interrupted; nothing was made\n");
     EXPECT_THAT(listing(place_.path()), ElementsAre());
 }
 
 TEST_F(DemoObstacleTest, AMissingHelperIsNamed) {
-    const Outcome outcome = run(programWithoutHelper(), {"demo", place_.path("home")});
+    const Outcome outcome = runProgram(programWithoutHelper(), {"demo", place_.path("home")});
     EXPECT_EQ(outcome.status, 1);
     EXPECT_THAT(outcome.errors, oneLine);
     EXPECT_THAT(outcome.errors, HasSubstr(bin_.path("vexo-sample-movie")));
