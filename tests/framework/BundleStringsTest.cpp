@@ -3,9 +3,11 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <filesystem>
 #include <thread>
 
 #include "framework/FrameworkResources.h"
+#include "tests/support/HostEnvironment.h"
 #include "tests/support/TemporaryFolder.h"
 
 namespace vexo {
@@ -133,6 +135,27 @@ TEST_F(BundleStringsTest, ADamagedTextIsMissingAndWarnedOfAndTheOthersStay) {
     EXPECT_EQ(strings.stringForKey("Escape"), std::nullopt);
     EXPECT_THAT(strings.stringForKey("Good"), Optional(std::string("fine")));
     EXPECT_EQ(strings.warning(), "sample.ini: the text of Bad is damaged");
+}
+
+TEST_F(BundleStringsTest, AreReadFromAFile) {
+    const testing_support::HostEnvironment host;
+    const testing_support::TemporaryFolder& folder = host.home;
+    const auto strings = BundleStrings::withContentsOfFile(folder.writeFile("Strings.ini", sample));
+    EXPECT_THAT(strings.stringForKey("Greeting"), Optional(std::string("Hello")));
+    EXPECT_THAT(strings.warning(), IsEmpty());
+}
+
+TEST_F(BundleStringsTest, AFileThatCannotBeReadHasNoTextAndAWarning) {
+    const testing_support::HostEnvironment host;
+    const testing_support::TemporaryFolder& folder = host.home;
+    const std::string huge = folder.writeFile("huge.ini", sample);
+    std::filesystem::resize_file(huge, 1024 * 1024 + 1);
+    for (const std::string& path :
+         {folder.path("missing.ini"), folder.makeFolder("folder.ini"), folder.makeFifo("pipe.ini"), huge}) {
+        const BundleStrings strings = BundleStrings::withContentsOfFile(path);
+        EXPECT_EQ(strings.stringForKey("Greeting"), std::nullopt) << path;
+        EXPECT_THAT(strings.warning(), HasSubstr(path));
+    }
 }
 
 TEST_F(BundleStringsTest, AreReadOnManyThreadsAtOnce) {

@@ -3,8 +3,10 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <filesystem>
 #include <thread>
 
+#include "tests/support/HostEnvironment.h"
 #include "tests/support/TemporaryFolder.h"
 
 namespace platform {
@@ -232,6 +234,45 @@ TEST(Picture, DrawsOnManyThreadsAtOnce) {
         for (auto& thread : threads)
             thread.join();
     }
+}
+
+class PictureFileTest : public testing::Test {
+  protected:
+    const testing_support::HostEnvironment host_;
+    const TemporaryFolder& folder_ = host_.home;
+};
+
+TEST_F(PictureFileTest, IsReadAtOnce) {
+    const std::string path = folder_.writeFile("icon.svg", twoColours());
+    const auto picture = pictureWithContentsOfFile(path);
+    folder_.remove("icon.svg");
+    ASSERT_TRUE(picture);
+    EXPECT_TRUE(picture->isDrawable());
+    EXPECT_TRUE(picture->draw(4, 2));
+}
+
+TEST_F(PictureFileTest, IsToldByItsContentNotItsName) {
+    EXPECT_TRUE(pictureWithContentsOfFile(folder_.writeFile("icon.png", twoColours()))->isDrawable());
+}
+
+TEST_F(PictureFileTest, ThatIsDamagedGivesAPictureThatIsNotDrawable) {
+    const auto picture = pictureWithContentsOfFile(folder_.writeFile("icon.svg", "<svg"));
+    ASSERT_TRUE(picture);
+    EXPECT_FALSE(picture->isDrawable());
+}
+
+TEST_F(PictureFileTest, WhatIsNoPlainFileGivesNoPicture) {
+    EXPECT_EQ(pictureWithContentsOfFile(folder_.path("missing.svg")), nullptr);
+    EXPECT_EQ(pictureWithContentsOfFile(folder_.makeFolder("folder.svg")), nullptr);
+    EXPECT_EQ(pictureWithContentsOfFile(folder_.makeFifo("pipe.svg")), nullptr);
+    EXPECT_EQ(pictureWithContentsOfFile(folder_.makeLink("loop.svg", folder_.path("loop.svg"))), nullptr);
+    EXPECT_EQ(pictureWithContentsOfFile(""), nullptr);
+}
+
+TEST_F(PictureFileTest, IsNotReadWhenItIsHuge) {
+    const std::string path = folder_.writeFile("icon.svg", twoColours());
+    std::filesystem::resize_file(path, 1ull << 40);
+    EXPECT_EQ(pictureWithContentsOfFile(path), nullptr);
 }
 
 TEST(PNGData, IsEmptyForABitmapThatIsNotWhole) {
