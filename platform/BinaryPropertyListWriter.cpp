@@ -1,5 +1,6 @@
 #include <unicode/unistr.h>
 
+#include <algorithm>
 #include <bit>
 #include <limits>
 #include <map>

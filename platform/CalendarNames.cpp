@@ -7,6 +7,8 @@
 #include <unicode/utf8.h>
 
 #include <array>
+#include <limits>
+#include <vector>
 
 #include "platform/CalendarDate.h"
 #include "platform/Date.h"

@@ -1,5 +1,6 @@
 #include "platform/CalendarParser.h"
 
+#include <algorithm>
 #include <charconv>
 
 namespace platform {

@@ -1,5 +1,6 @@
 #include "platform/CivilTime.h"
 
+#include <algorithm>
 #include <cmath>
 
 namespace platform {

@@ -1,5 +1,7 @@
 #include "platform/Pasteboard.h"
 
+#include <algorithm>
+
 namespace platform {
 
 void Pasteboard::addTypes(const std::vector<std::string>& types, const void* /*owner*/) {

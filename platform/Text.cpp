@@ -1,5 +1,7 @@
 #include "platform/Text.h"
 
+#include <algorithm>
+
 #include <unicode/unistr.h>
 #include <unicode/unorm.h>
 #include <unicode/utf8.h>

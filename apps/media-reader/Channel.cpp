@@ -23,14 +23,14 @@ void endWhenHostIsGone(int) {
     errno = interrupted;
 }
 
-vexo::FileDescriptor descriptorIn(msghdr& header) {
+platform::FileDescriptor descriptorIn(msghdr& header) {
     const cmsghdr* control = CMSG_FIRSTHDR(&header);
     if (!control || control->cmsg_level != SOL_SOCKET || control->cmsg_type != SCM_RIGHTS ||
         control->cmsg_len != CMSG_LEN(sizeof(int)))
         return {};
     int number;
     std::memcpy(&number, CMSG_DATA(control), sizeof number);
-    return vexo::FileDescriptor(number);
+    return platform::FileDescriptor(number);
 }
 
 ssize_t retried(auto call) {
@@ -72,7 +72,7 @@ std::optional<Job> Channel::receive() {
     const ssize_t size = retried([&] { return recvmsg(channel, &header, MSG_CMSG_CLOEXEC); });
     if (size <= 0)
         return std::nullopt;
-    vexo::FileDescriptor file = descriptorIn(header);
+    platform::FileDescriptor file = descriptorIn(header);
     message.resize(static_cast<std::size_t>(size));
     const auto request = vexo::decodeRequest(message);
     if (!request)

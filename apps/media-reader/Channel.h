@@ -4,15 +4,15 @@
 #include <optional>
 #include <string>
 
-#include "framework/metadata/FileDescriptor.h"
 #include "framework/metadata/ReaderMessage.h"
+#include "platform/linux/FileDescriptor.h"
 
 namespace reader {
 
 // A request with the file that it is about; without one when the host sent none.
 struct Job {
     vexo::ReaderRequest request;
-    vexo::FileDescriptor file;
+    platform::FileDescriptor file;
 };
 
 class Channel {

@@ -3,7 +3,7 @@
 #include <fcntl.h>
 #include <sys/stat.h>
 
-#include "framework/metadata/FileDescriptor.h"
+#include "platform/linux/FileDescriptor.h"
 
 namespace vexo {
 
@@ -51,7 +51,7 @@ MediaReaderAnswer MetadataCache::answerForFile(const std::string& path) {
 
     // What lies at the path now may be another thing than what was just looked at: the flags keep a FIFO or a
     // terminal from doing harm, and the key is taken anew.
-    const FileDescriptor file(open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
+    const platform::FileDescriptor file(open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
     const auto key = file ? keyOfFile(file) : std::nullopt;
     if (!key)
         return notReadable;

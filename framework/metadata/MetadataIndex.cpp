@@ -8,9 +8,9 @@
 #include <cstdlib>
 #include <filesystem>
 
-#include "framework/metadata/FileDescriptor.h"
 #include "framework/metadata/ReaderMessage.h"
 #include "platform/Path.h"
+#include "platform/linux/FileDescriptor.h"
 
 namespace vexo {
 
@@ -34,15 +34,16 @@ void setAside(const std::string& path) {
 }
 
 // The right to replace the database; at most one process has it. Does not wait.
-FileDescriptor lockForReplacing(const std::string& path) {
-    FileDescriptor lock(open((path + ".lock").c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600));
+platform::FileDescriptor lockForReplacing(const std::string& path) {
+    platform::FileDescriptor lock(
+        open((path + ".lock").c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600));
     if (lock && flock(lock.number(), LOCK_EX | LOCK_NB) != 0)
         return {};
     return lock;
 }
 
 bool setAsideUnderLock(const std::string& path) {
-    const FileDescriptor lock = lockForReplacing(path);
+    const platform::FileDescriptor lock = lockForReplacing(path);
     if (lock)
         setAside(path);
     return static_cast<bool>(lock);
@@ -89,7 +90,7 @@ void MetadataIndex::openMemory() {
 }
 
 Outcome MetadataIndex::replaceFile() {
-    const FileDescriptor lock = lockForReplacing(path_);
+    const platform::FileDescriptor lock = lockForReplacing(path_);
     if (!lock)
         return Outcome::unavailable;
     // Another process may have replaced it since.

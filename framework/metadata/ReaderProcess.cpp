@@ -112,15 +112,15 @@ std::unique_ptr<ReaderProcess> ReaderProcess::start(const std::string& program) 
     int ends[2];
     if (socketpair(AF_UNIX, SOCK_SEQPACKET | SOCK_CLOEXEC, 0, ends) != 0)
         return nullptr;
-    FileDescriptor ours(ends[0]);
-    const FileDescriptor theirs(ends[1]);
+    platform::FileDescriptor ours(ends[0]);
+    const platform::FileDescriptor theirs(ends[1]);
     pid_t process;
     if (!SpawnSettings(theirs.number()).spawn(process, program))
         return nullptr;
     return std::unique_ptr<ReaderProcess>(new ReaderProcess(process, std::move(ours)));
 }
 
-ReaderProcess::ReaderProcess(pid_t process, FileDescriptor channel)
+ReaderProcess::ReaderProcess(pid_t process, platform::FileDescriptor channel)
     : process_(process), channel_(std::move(channel)), processDescriptor_(pidfd_open(process, 0)) {}
 
 ReaderProcess::~ReaderProcess() {

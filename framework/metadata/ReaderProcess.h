@@ -8,7 +8,7 @@
 #include <string>
 #include <string_view>
 
-#include "framework/metadata/FileDescriptor.h"
+#include "platform/linux/FileDescriptor.h"
 
 namespace vexo {
 
@@ -30,13 +30,13 @@ class ReaderProcess {
     [[nodiscard]] Reception receive(std::string& message, Deadline deadline);
 
   private:
-    ReaderProcess(pid_t process, FileDescriptor channel);
+    ReaderProcess(pid_t process, platform::FileDescriptor channel);
 
     void reap();
 
     const pid_t process_;
-    FileDescriptor channel_;
-    FileDescriptor processDescriptor_;  // becomes readable when the process has ended
+    platform::FileDescriptor channel_;
+    platform::FileDescriptor processDescriptor_;  // becomes readable when the process has ended
 };
 
 }  // namespace vexo

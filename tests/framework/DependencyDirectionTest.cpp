@@ -57,7 +57,7 @@ const std::map<std::string, std::set<std::string>> allowed{
     {"events", plugin},
     {"watching", plugin},
     {"browser", plugin},
-    {"apps", {"apps", "framework", "host", "platform"}},
+    {"apps", {"apps", "framework", "host", "platform", "platform/linux"}},
 };
 
 // Headers of the C++ standard library and of C; no other library may appear where only these are allowed.

@@ -17,8 +17,8 @@
 #include <nlohmann/json.hpp>
 #include <thread>
 
-#include "framework/metadata/FileDescriptor.h"
 #include "framework/metadata/ReaderMessage.h"
+#include "platform/linux/FileDescriptor.h"
 #include "tests/support/SampleMovie.h"
 #include "tests/support/TemporaryFolder.h"
 
@@ -38,7 +38,7 @@ std::string contentOf(const std::string& path) {
 }
 
 MediaReaderAnswer answerFor(MediaReader& reader, const std::string& path) {
-    const FileDescriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
+    const platform::FileDescriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
     return reader.read(file.number());
 }
 
@@ -188,7 +188,7 @@ TEST_F(RealMediaReader, AMovieCutBeforeItsIndexFails) {
 TEST_F(RealMediaReader, TheCallersDescriptorStaysWhereItIs) {
     const std::string path = folder_.path("clip.mov");
     makeSampleMovie(path);
-    const FileDescriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
+    const platform::FileDescriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
     ASSERT_EQ(lseek(file.number(), 77, SEEK_SET), 77);
     EXPECT_TRUE(std::holds_alternative<MediaProperties>(reader_.read(file.number())));
     EXPECT_EQ(lseek(file.number(), 0, SEEK_CUR), 77);
@@ -220,8 +220,8 @@ class RunningProgram {
         int ends[2];
         if (socketpair(AF_UNIX, SOCK_SEQPACKET | SOCK_CLOEXEC, 0, ends) != 0)
             throw std::runtime_error("no socket");
-        channel_ = FileDescriptor(ends[0]);
-        const FileDescriptor theirs(ends[1]);
+        channel_ = platform::FileDescriptor(ends[0]);
+        const platform::FileDescriptor theirs(ends[1]);
         posix_spawn_file_actions_t actions;
         posix_spawn_file_actions_init(&actions);
         posix_spawn_file_actions_adddup2(&actions, theirs.number(), readerChannelDescriptor);
@@ -246,7 +246,7 @@ class RunningProgram {
     void send(std::string_view message) const {
         ::send(channel_.number(), message.data(), message.size(), MSG_NOSIGNAL);
     }
-    void closeChannel() { channel_ = FileDescriptor(); }
+    void closeChannel() { channel_ = platform::FileDescriptor(); }
     int exitStatus() {
         int status = -1;
         waitpid(std::exchange(process_, -1), &status, 0);
@@ -258,7 +258,7 @@ class RunningProgram {
 
   private:
     pid_t process_ = -1;
-    FileDescriptor channel_;
+    platform::FileDescriptor channel_;
 };
 
 }  // namespace
@@ -404,7 +404,7 @@ TEST_F(MisbehavingMediaReader, AReaderThatLeftBetweenFilesIsReplaced) {
 }
 
 TEST_F(MisbehavingMediaReader, GetsNoDescriptorOfTheHostButTheFile) {
-    const FileDescriptor inheritable(open("/dev/null", O_RDONLY));
+    const platform::FileDescriptor inheritable(open("/dev/null", O_RDONLY));
     // The file, and the folder that the script lists.
     EXPECT_THAT(propertiesFor(reader_, fileSaying("descriptors")).codecs,
                 ElementsAre("0", "1", "2", "3", "4", "5"));
