@@ -1,4 +1,5 @@
 // The movies rendered from a project, and which of them is the best.
+#include <algorithm>
 #include <array>
 
 #include "core/VXReelixPlugin.h"
@@ -28,11 +29,13 @@ std::string moviesFolderOf(const std::string& projectPath) {
     return path::appending(projectPath, "Movies");
 }
 
+// A folder has no file size, whatever its name.
 std::optional<std::uint64_t> fileSizeOf(const vexo::VXMediaObject& mediaObject) {
+    const platform::FileManager& files = platform::services().fileManager;
     const auto url = mediaObject.URL();
-    if (!url)
+    if (!url || files.kindOfItemAtPath(url->path()) != platform::FileKind::file)
         return std::nullopt;
-    const auto attributes = platform::services().fileManager.attributesOfItemAtPath(url->path());
+    const auto attributes = files.attributesOfItemAtPath(url->path());
     return attributes ? std::optional(attributes->size) : std::nullopt;
 }
 

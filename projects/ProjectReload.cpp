@@ -79,7 +79,7 @@ void VXReelixPlugin::scanProjectLibraries(Groups& libraries) {
         const std::string folder = (*_ReelixSearchPaths)[i];
         const Group library = _createReelixProjectsFolderForPath(folder);
         library->setName(localizedString("ReelixProjectLibrary"));
-        // The project type, not the folder type it was scanned with: receivers of the library rely on it.
+        // Deliberately the project type and not the folder type that the scan gave it.
         library->setTypeIdentifier(vexo::VXReelixProjectGroupTypeIdentifier);
         library->setParentID(std::string(vexo::VXReelix));
         library->setIcon(iconCache().smallApplicationIcon.get());

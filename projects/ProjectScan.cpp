@@ -27,8 +27,8 @@ FolderListing listFolder(const std::string& folder) {
     if (path::extension(folder) != ReelixLocalizedExtension)
         return {folder, {}};
     std::string plain = path::withoutExtension(folder);
-    auto names = files.contentsOfDirectoryAtPath(plain);
-    return {std::move(plain), names.value_or(std::vector<std::string>{})};
+    auto names = files.contentsOfDirectoryAtPath(plain).value_or(std::vector<std::string>{});
+    return {std::move(plain), std::move(names)};
 }
 
 void setFileFields(const vexo::VXMediaGroupRef& group, const std::string& file) {

@@ -31,7 +31,7 @@ std::optional<FileKey> keyOfFile(const std::string& path) {
     return stat(path.c_str(), &status) == 0 ? keyOfMedia(status) : std::nullopt;
 }
 
-std::optional<FileKey> keyOfFile(const FileDescriptor& file) {
+std::optional<FileKey> keyOfFile(const platform::FileDescriptor& file) {
     struct stat status;
     return fstat(file.number(), &status) == 0 ? keyOfMedia(status) : std::nullopt;
 }
