@@ -7,6 +7,10 @@ target_compile_options(vexo_settings INTERFACE -Wall -Wextra -Wpedantic -Wshadow
 if(CMAKE_CXX_COMPILER_ID STREQUAL "Clang")
     target_compile_options(vexo_settings INTERFACE -Wno-reserved-identifier -Wthread-safety)
 endif()
+# GCC 12 reports members of a std::variant as uninitialized that are not the one it holds.
+if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
+    target_compile_options(vexo_settings INTERFACE -Wno-maybe-uninitialized)
+endif()
 if(VEXO_WARNINGS_AS_ERRORS)
     target_compile_options(vexo_settings INTERFACE -Werror)
 endif()
