@@ -216,6 +216,39 @@ TEST_F(ProjectDocument, ADocumentCutAnywhereIsRejected) {
         EXPECT_THAT(errorOf(sound.substr(0, length)), HasSubstr(document)) << length;
 }
 
+TEST_F(ProjectDocument, ADocumentThatShrinksWhileItIsReadIsRejected) {
+    write(trailerDocument());
+    plugin();
+    files.afterOpening = [](const std::string& file) { std::filesystem::resize_file(file, 16); };
+    EXPECT_THROW(plugin()._isTrailer(package), ArchiveError);
+}
+
+TEST_F(ProjectDocument, OfALargeDocumentOnlyAFewEntriesAreDecoded) {
+    platform::Array objects{archivedDictionary({uid(4)}, {uid(5)}), "editInfo",
+                            archivedDictionary({uid(6)}, {uid(7)}), "trailer", "Adventure"};
+    for (int i = 0; i < 20000; ++i)
+        objects.push_back(archivedUnknown());
+    int asked = 0;
+    class Counting : public ExposedPlugin {
+      public:
+        Counting(vexo::VXBundleRef bundle, int& count) : ExposedPlugin(std::move(bundle)), count_(count) {}
+        platform::ArchivedClass cannotDecodeObjectOfClassName(
+            platform::KeyedUnarchiver& unarchiver, std::string_view className,
+            const std::vector<std::string>& originalClasses) override {
+            ++count_;
+            return ExposedPlugin::cannotDecodeObjectOfClassName(unarchiver, className, originalClasses);
+        }
+
+      private:
+        int& count_;
+    };
+    const auto counting = std::make_shared<Counting>(environment.bundle, asked);
+    counting->init();
+    write(archiveOf(objects));
+    EXPECT_TRUE(counting->_isTrailer(package));
+    EXPECT_EQ(asked, 0);
+}
+
 // --- At the host's boundary --------------------------------------------------------------------------------
 
 class BrokenDocument : public ProjectsTest {

@@ -26,6 +26,7 @@ class ScriptedFiles final : public platform::FileManager {
     std::map<std::string, std::uint32_t> flags;
     std::map<std::string, std::string> displayNames;
     std::function<void(const std::string& folder)> beforeListing;
+    std::function<void(const std::string& file)> afterOpening;
 
     mutable std::vector<std::string> listed;
     mutable std::vector<std::string> opened;
@@ -70,7 +71,10 @@ class ScriptedFiles final : public platform::FileManager {
     }
     std::unique_ptr<platform::ByteSource> openFileAtPath(const std::string& path) const override {
         opened.push_back(path);
-        return real().openFileAtPath(path);
+        auto file = real().openFileAtPath(path);
+        if (file && afterOpening)
+            afterOpening(path);
+        return file;
     }
     std::optional<std::string> resolvedPath(const std::string& path) const override {
         return real().resolvedPath(path);
