@@ -130,7 +130,7 @@ VXReelixPlugin::Group VXReelixPlugin::newYearGroup(const std::optional<platform:
     const Group yearGroup =
         newMediaGroupWithTypeIdentifier(vexo::VXReelixEventCalendarGroupTypeIdentifier, title);
     yearGroup->setName(title);
-    // The root group, not the event library: the host looks years up from the top.
+    // Deliberately the root group and not the event library that holds the year.
     yearGroup->setParentID(std::string(vexo::VXReelix));
     yearGroup->setIcon(iconCache().calendarIcon.get());
     if (year) {
@@ -141,7 +141,8 @@ VXReelixPlugin::Group VXReelixPlugin::newYearGroup(const std::optional<platform:
     return yearGroup;
 }
 
-// The new library takes the old one's place, or the end; one without clips only removes the old one.
+// The new library takes the old one's place, or the end; one without clips only removes the old one. Several
+// old ones are each replaced by it.
 void VXReelixPlugin::finishReloadReelixEvents(const Group& eventLibrary) {
     const Group root = rootMediaGroup();
     if (!root)
@@ -149,15 +150,11 @@ void VXReelixPlugin::finishReloadReelixEvents(const Group& eventLibrary) {
     const bool hasClips = eventLibrary && !eventLibrary->mediaObjects().empty();
     bool placed = false;
     Groups children;
-    const VXMediaGroupList current = root->childGroups();
-    for (std::size_t index = 0; index < current.size(); ++index) {
-        if (current[index]->typeIdentifier() != vexo::VXReelixEventLibraryGroupTypeIdentifier) {
-            children.push_back(current[index]);
+    for (const Group& child : root->childGroups()) {
+        if (child->typeIdentifier() != vexo::VXReelixEventLibraryGroupTypeIdentifier) {
+            children.push_back(child);
         } else if (hasClips) {
-            if (children.size() > index)
-                children[index] = eventLibrary;
-            else
-                children.push_back(eventLibrary);
+            children.push_back(eventLibrary);
             placed = true;
         }
     }
