@@ -24,6 +24,7 @@ class ForwardingFiles final : public platform::FileManager {
     std::map<std::string, std::optional<platform::FileAttributes>> attributes;
     std::map<std::string, std::optional<std::uint32_t>> flags;
     std::map<std::string, std::optional<std::string>> displayNames;
+    std::map<std::string, std::string> fileSystemTypes;
     // Called first by each operation of the name.
     std::function<void(const std::string& path)> beforeListing;
     std::function<void(const std::string& path)> beforeKind;
@@ -68,7 +69,8 @@ class ForwardingFiles final : public platform::FileManager {
         return real().extendedAttribute(path, name, buffer);
     }
     std::optional<std::string> fileSystemTypeNameAtPath(const std::string& path) const override {
-        return real().fileSystemTypeNameAtPath(path);
+        const auto scripted = fileSystemTypes.find(path);
+        return scripted != fileSystemTypes.end() ? scripted->second : real().fileSystemTypeNameAtPath(path);
     }
     std::unique_ptr<platform::ByteSource> openFileAtPath(const std::string& path) const override {
         return real().openFileAtPath(path);
