@@ -1,3 +1,5 @@
+#include <thread>
+
 #include "tests/projects/ProjectsTest.h"
 
 using namespace testing_support;
@@ -325,6 +327,36 @@ TEST_F(ProjectReload, PutsTheProjectsIntoTheRootSortedByNameWithTheEventsLast) {
                             "/clip.mov"));
     EXPECT_THAT(published, ElementsAre(root));
     EXPECT_EQ(plugin().rootMediaGroup(), root);
+}
+
+TEST_F(ProjectReload, PublishesTheRootWithTheMonitorFree) {
+    makeProject("one/a.qnproject");
+    setSearchPaths({home().path("one")});
+    installRoot({});
+    std::size_t groups = 0;
+    // With the monitor held, the other thread would wait for ever.
+    plugin().addTreeObserver(environment.bundle, [&](const Group&) {
+        std::thread([&] { groups = plugin().mediaGroups().size(); }).join();
+    });
+    plugin()._reloadReelixProjects();
+    EXPECT_EQ(groups, 1u);
+}
+
+TEST_F(ProjectReload, ReadersOfTheFlatListWaitForTheEndOfAScan) {
+    makeProject("one/a.qnproject");
+    makeProject("one/b.qnproject");
+    makeProject("two/c.qnproject");
+    setSearchPaths({home().path("one"), home().path("two")});
+    plugin();
+    std::thread reader;
+    std::size_t groups = 0;
+    files.beforeListing = [&](const std::string&) {
+        if (!reader.joinable())
+            reader = std::thread([&] { groups = plugin().mediaGroups().size(); });
+    };
+    plugin()._reloadReelixProjects(false);
+    reader.join();
+    EXPECT_EQ(groups, 3u);
 }
 
 TEST_F(ProjectReload, OfTheSameLibraryGivesTheSameTreeOfNewGroups) {
