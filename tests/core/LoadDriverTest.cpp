@@ -1,7 +1,9 @@
 // Loading: what is watched, the root group with its branches and items, and what is said while there is
 // nothing to show.
+#include <atomic>
 #include <fstream>
 #include <sstream>
+#include <thread>
 
 #include "framework/HostServices.h"
 #include "tests/core/SmallLibrary.h"
@@ -47,12 +49,15 @@ class RecordingWatcher final : public vexo::VXPathWatcher {
                     vexo::VXPathListRef queryScope, unsigned queryRunMode) override {
         calls.push_back("query " + query);
         queries.push_back({query, observer, queryScope, queryScope->snapshot(), queryRunMode});
+        if (onQuery)
+            onQuery();
         watcher_.watchQuery(query, observer, std::move(queryScope), queryRunMode);
     }
 
     std::vector<std::string> calls;
     std::vector<Query> queries;
     std::function<void()> onWatch;
+    std::function<void()> onQuery;
 
   private:
     vexo::VXPathWatcher& watcher_;
@@ -268,6 +273,27 @@ TEST_F(LoadDriverTest, ALoadWhoseCancelIsPendingStillAnswersARoot) {
     const VXMediaGroupRef root = plugin().performLoadData();
     ASSERT_NE(root, nullptr);
     EXPECT_TRUE(root->childGroups().empty());
+}
+
+TEST_F(LoadDriverTest, AWholeLoadExcludesReadersOfTheLists) {
+    makeProject("Trip");
+    makeEvent("Beach", 2008);
+    ExposedPlugin& reelix = plugin();
+    std::atomic<bool> hasRead = false;
+    std::size_t groups = 0;
+    std::thread reader;
+    watcher->onQuery = [&] {
+        if (reader.joinable())
+            return;
+        reader = std::thread([&] {
+            groups = reelix.mediaGroups().size();
+            hasRead = true;
+        });
+        EXPECT_FALSE(testing_support::happensSoon([&] { return hasRead.load(); }));
+    };
+    reelix.performLoadData();
+    reader.join();
+    EXPECT_EQ(groups, 4u);  // the event, the project and the two empty libraries of the start-up volume
 }
 
 TEST_F(LoadDriverTest, TheSearchPathsAreMadeByTheFirstLoadAndKept) {

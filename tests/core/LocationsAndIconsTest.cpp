@@ -134,15 +134,29 @@ class AskedBundle final : public vexo::VXBundle {
         return bundle_->localizedString(key);
     }
     ImageRef iconNamed(std::string_view name) const override {
-        asked.emplace_back(name);
-        return asked.size() == 1 && firstIsMissing ? nullptr : bundle_->iconNamed(name);
+        const std::size_t question = noteQuestion(name);
+        if (onQuestion)
+            onQuestion();
+        return question == 1 && firstIsMissing ? nullptr : bundle_->iconNamed(name);
+    }
+    std::vector<std::string> asked() const {
+        platform::Locked lock(mutex_);
+        return asked_;
     }
 
-    mutable std::vector<std::string> asked;
     bool firstIsMissing = false;
+    std::function<void()> onQuestion;
 
   private:
+    std::size_t noteQuestion(std::string_view name) const {
+        platform::Locked lock(mutex_);
+        asked_.emplace_back(name);
+        return asked_.size();
+    }
+
     const vexo::VXBundleRef bundle_;
+    mutable platform::Mutex mutex_;
+    mutable std::vector<std::string> asked_ VX_GUARDED_BY(mutex_);
 };
 
 class IconsTest : public testing_support::SmallLibraryTest {
@@ -178,7 +192,7 @@ TEST_F(IconsTest, AreAskedForInOrderAndOnceEach) {
     const auto bundle = std::make_shared<AskedBundle>(environment.bundle);
     const auto made = std::make_shared<ExposedPlugin>(bundle);
     made->init();
-    EXPECT_THAT(bundle->asked,
+    EXPECT_THAT(bundle->asked(),
                 ElementsAre("MBReelixAppIconSmall", "Reelix-icon-calendar", "Reelix-icon-event",
                             "Reelix-icon-project", "Reelix-icon-trailer", "MBReelixIcon"));
 }
@@ -382,18 +396,25 @@ TEST_F(IconsTest, EachObjectHasARootIconOfItsOwn) {
     EXPECT_NE(plugin().rootMediaGroupIcon(), newPlugin()->rootMediaGroupIcon());
 }
 
-TEST_F(IconsTest, ManyThreadsGetOneRootIcon) {
-    environment.bundle->replacedIcons["MBReelixAppIconSmall"] = nullptr;  // making the object finds none
-    ExposedPlugin& reelix = plugin();
-    environment.bundle->replacedIcons.clear();
+TEST_F(IconsTest, ManyThreadsGetOneRootIconThatIsLookedForOnce) {
+    const auto bundle = std::make_shared<AskedBundle>(environment.bundle);
+    bundle->firstIsMissing = true;  // so that making the object finds none
+    const auto made = std::make_shared<ExposedPlugin>(bundle);
+    made->init();
+    const std::size_t before = bundle->asked().size();
+    bundle->onQuestion = [&] {
+        testing_support::happensSoon([&] { return bundle->asked().size() > before + 1; });
+    };
+
     std::array<ImageRef, 4> found;
     std::vector<std::thread> threads;
     for (ImageRef& icon : found)
-        threads.emplace_back([&reelix, &icon] { icon = reelix.rootMediaGroupIcon(); });
+        threads.emplace_back([&made, &icon] { icon = made->rootMediaGroupIcon(); });
     for (std::thread& thread : threads)
         thread.join();
     EXPECT_NE(found[0], nullptr);
     EXPECT_THAT(found, testing::Each(found[0]));
+    EXPECT_EQ(bundle->asked().size(), before + 1);
 }
 
 }  // namespace

@@ -1,6 +1,9 @@
 // The order of events in the suite's preferences, and the reload that a change of it leads to.
+#include <atomic>
 #include <thread>
 
+#include "platform/Services.h"
+#include "platform/UserDefaults.h"
 #include "tests/core/SmallLibrary.h"
 
 namespace reelix {
@@ -206,17 +209,46 @@ TEST_F(PreferencesTest, AnUnchangedOrderSchedulesNoSecondReload) {
     EXPECT_EQ(environment.dispatcher.pendingCount(), 0u);
 }
 
-TEST_F(PreferencesTest, ChecksOnManyThreadsScheduleOneReload) {
+// Preferences that tell whether two threads ever read them at once.
+class CrowdedDefaults final : public platform::UserDefaults {
+  public:
+    explicit CrowdedDefaults(platform::UserDefaults& defaults) : defaults_(defaults) {}
+    void synchronize() override {
+        ++readers_;
+        if (testing_support::happensSoon([this] { return readers_ > 1; }))
+            wasCrowded = true;
+        defaults_.synchronize();
+    }
+    std::optional<platform::Dictionary> persistentDomainForName(std::string_view name) override {
+        auto domain = defaults_.persistentDomainForName(name);
+        --readers_;
+        return domain;
+    }
+    std::optional<platform::Value> objectForKey(std::string_view key) override {
+        return defaults_.objectForKey(key);
+    }
+
+    std::atomic<bool> wasCrowded = false;
+
+  private:
+    platform::UserDefaults& defaults_;
+    std::atomic<int> readers_ = 0;
+};
+
+TEST_F(PreferencesTest, ChecksOnManyThreadsComeOneAfterAnotherAndScheduleOneReload) {
     ExposedPlugin& reelix = plugin();
     storeEventOrder(false);
+    CrowdedDefaults defaults(environment.userDefaults);
+    const platform::Services& services = platform::services();
+    const platform::ServicesScope scope(platform::Services{services.fileManager, services.workspace, defaults,
+                                                           services.dispatcher, services.notificationCenter,
+                                                           services.systemLog});
     std::vector<std::thread> threads;
     for (int i = 0; i < 4; ++i)
-        threads.emplace_back([&reelix] {
-            for (int check = 0; check < 20; ++check)
-                reelix._checkReelixPreferences();
-        });
+        threads.emplace_back([&reelix] { reelix._checkReelixPreferences(); });
     for (std::thread& thread : threads)
         thread.join();
+    EXPECT_FALSE(defaults.wasCrowded);
     EXPECT_THAT(environment.dispatcher.requests(),
                 ElementsAre(Request{.place = Place::background, .delay = seconds(5)}));
 }

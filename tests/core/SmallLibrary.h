@@ -1,7 +1,9 @@
 // A home with a few projects and events, made by the tests of the plug-in's core.
 #pragma once
 
+#include <functional>
 #include <string>
+#include <thread>
 
 #include "host/VXConstants.h"
 #include "tests/support/PluginTest.h"
@@ -48,6 +50,13 @@ class SmallLibraryTest : public PluginTest {
         environment.workspace.setApplicationForCreator("rlxm", {"com.norvale.ReelixApp", url, "reelix"});
     }
 };
+
+// Lets other threads run until something has happened, but not for long: what a lock prevents never happens.
+inline bool happensSoon(const std::function<bool()>& something) {
+    for (int turn = 0; turn < 20'000 && !something(); ++turn)
+        std::this_thread::yield();
+    return something();
+}
 
 // A picture of a size that was made up, drawable or not.
 class PlainPicture final : public platform::Picture {
