@@ -282,6 +282,33 @@ TEST_F(EventReloadTest, YearsMinusOneAndZeroHaveGroupsOfTheirOwnWhenTheOldestCom
     EXPECT_EQ(library->childGroups()[1]->attributes()->at("ReelixEventCreationYear"), platform::Value(0));
 }
 
+// An event without a year stands for no year at all, not for the year 0 that its group is named after.
+TEST_F(EventReloadTest, EventOfTheYearZeroIsNotFiledWithAnEventWithoutAYear) {
+    sortOldestFirst();
+    addClip("A/a.mov", "9999-08-04 18;30;05");
+    addClip("B/a.mov", "0000-08-04 18;30;05");
+    searchPaths();
+    const auto library = reload();
+    EXPECT_THAT(names(library->childGroups()), ElementsAre("0", "0"));
+    EXPECT_THAT(names(library->childGroups()[0]->childGroups()), ElementsAre("A"));
+    EXPECT_THAT(names(library->childGroups()[1]->childGroups()), ElementsAre("B"));
+}
+
+// Sorted with the events of other years between them, events that miss a date can keep others apart.
+TEST_F(EventReloadTest, EventsOfAYearAreSortedOnceMoreAmongThemselves) {
+    sortOldestFirst();
+    for (const char* clip : {"Late/a.mov", "Undated/a.mov", "Early/a.mov"})
+        addClipMadeAt(clip, "");
+    addClip("Late/b.mov", "2003-08-04 18;30;05");
+    addClip("Early/b.mov", "2001-08-04 18;30;05");
+    addClip("Other year/a.mov", "2000-08-04 18;30;05");
+    files.listings[library()] = {"Late", "Other year", "Undated", "Early"};
+    searchPaths();
+    const auto branch = reload();
+    EXPECT_THAT(names(branch->childGroups()), ElementsAre("-1", "2000"));
+    EXPECT_THAT(names(branch->childGroups().front()->childGroups()), ElementsAre("Early", "Late", "Undated"));
+}
+
 TEST_F(EventReloadTest, EventsOfAllLibrariesShareTheYears) {
     home().writeFile("One/A/clip-2008-07-04 18;30;05.mov");
     home().writeFile("Two/B/clip-2008-08-04 18;30;05.mov");

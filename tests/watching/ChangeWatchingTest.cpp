@@ -73,7 +73,7 @@ TEST_F(ChangeWatchingTest, FileBeforeTheFirstLoadDoesNothing) {
     EXPECT_EQ(environment.dispatcher.pendingCount(), 0u);
 }
 
-TEST_F(ChangeWatchingTest, FileOfAnItemGetsItsOwnThumbnailAgain) {
+TEST_F(ChangeWatchingTest, FileOfAnItemKeepsItsThumbnailAndSchedulesNothing) {
     const std::string clip = home().writeFile("Movies/Reelix Events/Trip/a.mov");
     const auto root = load();
     ASSERT_EQ(root->mediaObjects().size(), 1u);
