@@ -1,3 +1,4 @@
+#include <barrier>
 #include <thread>
 
 #include "tests/support/LoopImage.h"
@@ -218,20 +219,26 @@ TEST_F(VolumeMountsTest, WhatIsNoExceptionOfTheStandardKindIsNotCaught) {
         int);
 }
 
-TEST_F(VolumeMountsTest, MountsOnManyThreadsAddEachVolumeOnce) {
-    for (int i = 0; i < 4; ++i)
-        files.displayNames["/media/" + std::to_string(i)] = "Disk " + std::to_string(i);
+TEST_F(VolumeMountsTest, NotificationsOfOneVolumeAtTheSameTimeAddItOnce) {
+    constexpr int rounds = 300;
+    constexpr int threadsPerRound = 4;
+    for (int round = 0; round < rounds; ++round)
+        files.displayNames["/media/" + std::to_string(round)] = "Disk " + std::to_string(round);
     loadFirst();
+    std::barrier together(threadsPerRound);  // right before the list is looked at
+    files.beforeDisplayName = [&](const std::string&) { together.arrive_and_wait(); };
     std::vector<std::thread> threads;
-    for (int i = 0; i < 16; ++i)
-        threads.emplace_back([&, i] {
-            plugin()._fileSystemMountedThreaded(
-                {"", nullptr, {{"NSDevicePath", "/media/" + std::to_string(i % 4)}}});
+    for (int i = 0; i < threadsPerRound; ++i)
+        threads.emplace_back([&] {
+            for (int round = 0; round < rounds; ++round)
+                plugin()._fileSystemMountedThreaded(
+                    {"", nullptr, {{"NSDevicePath", "/media/" + std::to_string(round)}}});
         });
     for (std::thread& thread : threads)
         thread.join();
-    EXPECT_EQ(addedPaths().size(), 8u);
+    EXPECT_EQ(addedPaths().size(), 2u * rounds);
     EXPECT_EQ(pending(), "events");
+    EXPECT_EQ(scheduled(), 1u);
 }
 
 TEST_F(VolumeMountsTest, StartUpVolumeHasAValidFormatAndAMissingPathHasNone) {
