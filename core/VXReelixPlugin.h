@@ -173,6 +173,10 @@ class VXReelixPlugin : public vexo::VXMediaManager,
 
     platform::RecursiveMutex _monitor;
 
+    // Held while a reload puts its branch among the root's children and gathers the root's items anew: two
+    // reloads that end together would else undo one another.
+    platform::Mutex _rootUpdateLock;
+
     std::unique_ptr<platform::RecursiveMutex> _appIconLock;
     platform::ImageRef _appIcon VX_GUARDED_BY(*_appIconLock);
 

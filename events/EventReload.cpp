@@ -73,11 +73,15 @@ VXReelixPlugin::Group VXReelixPlugin::_reloadReelixEvents(const std::optional<st
     }
 
     if (updateRootMediaGroup && !isCancelLoadRequestPending()) {
-        finishReloadReelixEvents(eventLibrary);
-        if (const Group root = rootMediaGroup()) {
+        Group root;
+        {
+            Locked rootUpdate(_rootUpdateLock);
+            root = rootMediaGroup();
+            finishReloadReelixEvents(eventLibrary);
             _setMediaObjectsForRootMediaGroup(root);
-            setRootMediaGroup(root);
         }
+        if (root)
+            setRootMediaGroup(root);
     }
     return eventLibrary->childGroups().empty() ? nullptr : eventLibrary;
 }

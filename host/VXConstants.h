@@ -46,7 +46,7 @@ extern const VXGroupTypeIdentifier VXReelixEventGroupTypeIdentifier;
 inline constexpr std::string_view VXReelix = "VXReelix";
 
 // Item attributes.
-inline constexpr std::string_view VXMediaObjectDurationKey = "VXMediaObjectDurationKey";  // real, seconds
+inline constexpr std::string_view VXMediaObjectDurationKey = "VXMediaObjectDurationKey";      // real, seconds
 inline constexpr std::string_view VXMediaObjectResolutionKey = "VXMediaObjectResolutionKey";  // size, pixels
 inline constexpr std::string_view VXMediaObjectResolutionStringKey =  // text, "{1920, 1080}"
     "VXMediaObjectResolutionStringKey";

@@ -20,7 +20,8 @@ class VXPathObserver {
     // watchedPathChanged:fileChangedEventFlags:
     virtual void watchedPathChanged(const std::string& path, std::uint64_t fileChangedEventFlags) = 0;
     // watchedQueryChanged:queryScope:
-    virtual void watchedQueryChanged(const platform::Notification& notification, const VXPathListRef& queryScope) = 0;
+    virtual void watchedQueryChanged(const platform::Notification& notification,
+                                     const VXPathListRef& queryScope) = 0;
 };
 using VXPathObserverRef = std::shared_ptr<VXPathObserver>;
 
@@ -39,8 +40,8 @@ class VXPathWatcher {
     // shared: folders added to it later count. A repeated registration of the same query and observer is
     // one; the newest scope counts. Run mode 4 means: gather once in silence, then report each change of the
     // result as kMDQueryDidUpdateNotification.
-    virtual void watchQuery(const std::string& query, const VXPathObserverRef& observer, VXPathListRef queryScope,
-                            unsigned queryRunMode) = 0;
+    virtual void watchQuery(const std::string& query, const VXPathObserverRef& observer,
+                            VXPathListRef queryScope, unsigned queryRunMode) = 0;
 };
 
 }  // namespace vexo

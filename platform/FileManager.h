@@ -46,7 +46,8 @@ class FileManager {
 
     // contentsOfDirectoryAtPath:error:; the names as the file system lists them, without "." and "..".
     // nil when the folder can't be listed; the reason goes to the system log.
-    virtual std::optional<std::vector<std::string>> contentsOfDirectoryAtPath(const std::string& path) const = 0;
+    virtual std::optional<std::vector<std::string>> contentsOfDirectoryAtPath(
+        const std::string& path) const = 0;
 
     // attributesOfItemAtPath:error:; links are followed. nil when they can't be read.
     virtual std::optional<FileAttributes> attributesOfItemAtPath(const std::string& path) const = 0;

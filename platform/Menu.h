@@ -10,10 +10,10 @@ namespace platform {
 
 struct MenuItem {
     std::string title;
-    std::string action;                             // the name of the operation, "contextMenuOpen:"
-    std::string keyEquivalent;                      // empty for none
+    std::string action;         // the name of the operation, "contextMenuOpen:"
+    std::string keyEquivalent;  // empty for none
     bool enabled = true;
-    std::shared_ptr<const void> representedObject;  // what the menu was asked for
+    std::shared_ptr<const void> representedObject;        // what the menu was asked for
     std::function<void(const MenuItem& sender)> perform;  // sends the action to its target
 };
 

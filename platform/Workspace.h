@@ -14,9 +14,9 @@ namespace platform {
 
 // An application that the desktop has an entry for. It may have been removed since.
 struct ApplicationReference {
-    std::string identifier;   // "com.norvale.ReelixApp"
-    std::optional<URL> url;   // of its executable; nil when the entry names none
-    std::string icon;         // icon name or path as the entry has it; may be empty
+    std::string identifier;  // "com.norvale.ReelixApp"
+    std::optional<URL> url;  // of its executable; nil when the entry names none
+    std::string icon;        // icon name or path as the entry has it; may be empty
 };
 
 class Workspace {

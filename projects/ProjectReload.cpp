@@ -57,11 +57,15 @@ VXMediaGroupList VXReelixPlugin::_reloadReelixProjects(bool updateRoot) {
         const Group& merged = libraries.front();
         for (std::size_t i = 1; i < libraries.size(); ++i)
             merged->addChildGroups(libraries[i]->childGroups());
-        finishReloadReelixProjects(merged);
-        if (const Group root = rootMediaGroup()) {
+        Group root;
+        {
+            Locked rootUpdate(_rootUpdateLock);
+            root = rootMediaGroup();
+            finishReloadReelixProjects(merged);
             _setMediaObjectsForRootMediaGroup(root);
-            setRootMediaGroup(root);
         }
+        if (root)
+            setRootMediaGroup(root);
     }
 
     VXMediaGroupList groups;

@@ -167,9 +167,12 @@ LinuxFileManager::LinuxFileManager(std::optional<std::string> homeDirectory, con
 
 std::optional<std::string> LinuxFileManager::userHomeDirectory() {
     const char* const home = std::getenv("HOME");
-    if (home && *home == '/')
-        return home;
-    return homeDirectoryInPasswordDatabase();
+    if (!home || *home != '/')
+        return homeDirectoryInPasswordDatabase();
+    std::string path = home;
+    while (path.size() > 1 && path.back() == '/')
+        path.pop_back();
+    return path;
 }
 
 std::optional<FileKind> LinuxFileManager::kindOfItemAtPath(const std::string& path) const {

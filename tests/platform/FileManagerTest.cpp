@@ -431,6 +431,11 @@ TEST(UserHome, IsTheEnvironmentsWhereThatIsAnAbsolutePath) {
     EXPECT_THAT(LinuxFileManager::userHomeDirectory(), Optional(Eq("/home/somebody")));
 }
 
+TEST(UserHome, LosesTheSlashesAtItsEnd) {
+    const ScopedEnvironment home("HOME", "/home/somebody//");
+    EXPECT_EQ(LinuxFileManager::userHomeDirectory(), "/home/somebody");
+}
+
 TEST(UserHome, IsThePasswordDatabasesOtherwise) {
     const passwd* const user = getpwuid(getuid());
     if (!user || user->pw_dir[0] != '/')
