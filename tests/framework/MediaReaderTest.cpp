@@ -210,7 +210,6 @@ TEST_F(RealMediaReader, ThreadsTakeTurns) {
 }
 
 // --- The program without a MediaReader around it
-// ---------------------------------------------------------------
 
 namespace {
 
@@ -306,7 +305,6 @@ TEST(MediaReaderProgram, IsFoundBesideTheProgramUnlessAnotherIsNamed) {
 }
 
 // --- A reader that does as the file says
-// ---------------------------------------------------------------------
 
 namespace {
 
@@ -442,7 +440,6 @@ TEST_F(MisbehavingMediaReader, AfterAFailedStartThereIsAPause) {
 }
 
 // --- The messages
-// --------------------------------------------------------------------------------------------
 
 TEST(ReaderMessage, AReplyReadsAsItWasWritten) {
     const ReaderReply movie{7, MediaProperties{{"Video", "Sound"}, 1920, 1080, 12.48, {"h264", "aac"}, -1.5}};

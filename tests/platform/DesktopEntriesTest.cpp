@@ -120,7 +120,6 @@ TEST_F(DesktopEntriesTest, MissingFoldersAreEmpty) {
 }
 
 // --- Programs
-// -------------------------------------------------------------------------------------------------
 
 TEST(DesktopEntryProgram, IsWhatTheEntryTries) {
     EXPECT_THAT((DesktopEntry{"", "/bin/other", "/opt/viewer", "", ""}.programPath()),
@@ -144,7 +143,6 @@ TEST(DesktopEntryProgram, IsLookedForInThePath) {
 }
 
 // --- Folders
-// --------------------------------------------------------------------------------------------------
 
 TEST(DesktopDataFolders, AreThoseOfTheEnvironment) {
     const ScopedEnvironment home("XDG_DATA_HOME", "/home/me/data");

@@ -247,7 +247,6 @@ TEST_P(DispatcherContract, TheLongestDelayIsNotDueAtOnce) {
 }
 
 // --- The tests' own dispatcher
-// --------------------------------------------------------------------------------
 
 TEST(VirtualDispatcher, RunsNothingBeforeItsTime) {
     VirtualDispatcher dispatcher;
@@ -298,7 +297,6 @@ TEST(VirtualDispatcher, CountsFailuresThatNobodyTook) {
 }
 
 // --- The machine's
-// --------------------------------------------------------------------------------------------
 
 TEST(LinuxDispatcher, TwoBackgroundBlocksRunAtTheSameTime) {
     CollectedLog log;

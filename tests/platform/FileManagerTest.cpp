@@ -50,7 +50,6 @@ constexpr std::uint32_t package = itemIsPackage, container = itemIsContainer, in
 }  // namespace
 
 // --- Kinds, attributes, names
-// ---------------------------------------------------------------------------------
 
 TEST_F(LinuxFileManagerTest, KindsFollowLinks) {
     folder_.makeFolder("folder");
@@ -151,7 +150,6 @@ TEST_F(LinuxFileManagerTest, TheDisplayNameOfAMountPointIsItsVolumes) {
 }
 
 // --- Item flags
-// -----------------------------------------------------------------------------------------------
 
 TEST_F(LinuxFileManagerTest, FoldersAreContainersAndSomeArePackages) {
     folder_.makeFolder("Event");
@@ -243,7 +241,6 @@ TEST(HiddenNames, AnOldListIsReadAgainWhenTheFileIsReplaced) {
 }
 
 // --- Extended attributes
-// --------------------------------------------------------------------------------------
 
 TEST_F(LinuxFileManagerTest, TheAttributeOfTheUserIsFound) {
     folder_.writeFile("clip.mov");
@@ -271,7 +268,6 @@ TEST_F(LinuxFileManagerTest, ASidecarCountsOnlyWhereTheFileSystemKeepsNoAttribut
 }
 
 // --- Opening
-// --------------------------------------------------------------------------------------------------
 
 TEST_F(LinuxFileManagerTest, AnOpenFileReadsAnyPart) {
     folder_.writeFile("document", "0123456789");
@@ -330,7 +326,6 @@ TEST_F(LinuxFileManagerTest, EveryOpenFileIsClosedWithItsSource) {
 }
 
 // --- Volumes
-// --------------------------------------------------------------------------------------------------
 
 TEST_F(LinuxFileManagerTest, EveryOperationUnderstandsTheNameOfAVolume) {
     folder_.writeFile("disk/Events/clip.mov", "12345");
@@ -395,7 +390,6 @@ TEST_F(LinuxFileManagerTest, OtherPathsStayAsTheyAreAndAskNobody) {
 }
 
 // --- Types of file systems
-// ------------------------------------------------------------------------------------
 
 TEST_F(LinuxFileManagerTest, KernelFileSystemsHaveTheirOwnNames) {
     EXPECT_THAT(files_.fileSystemTypeNameAtPath("/proc/self"), Optional(Eq("proc")));
@@ -424,7 +418,6 @@ TEST(FileSystemTypes, AreNamedByTheMountTable) {
 }
 
 // --- The user's home
-// ------------------------------------------------------------------------------------------
 
 TEST(UserHome, IsTheEnvironmentsWhereThatIsAnAbsolutePath) {
     const ScopedEnvironment home("HOME", "/home/somebody");

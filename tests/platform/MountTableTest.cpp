@@ -160,7 +160,6 @@ TEST(MountRules, TheFirstMountOfADiskStandsForIt) {
 }
 
 // --- Names
-// ----------------------------------------------------------------------------------------------------
 
 TEST(VolumeProperties, AVolumeWithoutALabelIsNamedAfterItsMountPoint) {
     EXPECT_EQ(displayNameOfVolume({{"/media/me/CARD", "/dev/absent", "vfat", "/"}, false, true}), "CARD");
@@ -192,7 +191,6 @@ TEST(VolumeProperties, WhatTheDesktopMountedIsRemovable) {
 }
 
 // --- The kernel's table
-// ---------------------------------------------------------------------------------------
 
 TEST(SystemMountTable, BeginsWithTheRoot) {
     const SystemMountTable table;

@@ -104,7 +104,6 @@ TEST_F(LinuxWorkspaceTest, TheIconIsThePictureThatTheEntryNames) {
 }
 
 // --- Where icons are
-// ------------------------------------------------------------------------------------------
 
 TEST(IconLookup, ScalablePicturesComeBeforeLargeOnesBeforeSmallOnes) {
     const TemporaryFolder folder;
@@ -141,7 +140,6 @@ TEST(IconLookup, AnExtensionInTheNameIsForgiven) {
 }
 
 // --- The tests' own workspace
-// ---------------------------------------------------------------------------------
 
 TEST(FakeWorkspace, AnswersWhatWasSetAndCountsTheQuestions) {
     FakeWorkspace workspace;
