@@ -49,12 +49,9 @@ bool writableByOthers(const std::string& file) {
 }
 
 platform::PropertyListResult readDescriptor(const std::string& file) {
-    const auto source = platform::services().fileManager.openFileAtPath(file);
-    if (!source)
-        return {std::nullopt, "its Contents/Info.plist cannot be read"};
-    const auto bytes = platform::readAll(*source, largestDescriptor);
+    const auto bytes = platform::services().fileManager.contentsAtPath(file, largestDescriptor);
     if (!bytes)
-        return {std::nullopt, "its Contents/Info.plist is too large or cannot be read"};
+        return {std::nullopt, "its Contents/Info.plist cannot be read, or is too large"};
     platform::PropertyListResult result = platform::propertyListWithData(*bytes);
     if (result.value && !result.value->dictionary())
         return {std::nullopt, "its Contents/Info.plist holds no dictionary"};

@@ -61,13 +61,4 @@ bool PageCache::load(Page& page, std::uint64_t number) {
     return isRead;
 }
 
-std::optional<std::vector<std::byte>> readAll(ByteSource& source, std::uint64_t limit) {
-    if (source.size() > limit)
-        return std::nullopt;
-    std::vector<std::byte> bytes(source.size());
-    if (!source.read(0, bytes))
-        return std::nullopt;
-    return bytes;
-}
-
 }  // namespace platform

@@ -7,7 +7,6 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
-#include <optional>
 #include <span>
 #include <string>
 #include <vector>
@@ -88,8 +87,5 @@ class PageCache {
     Page* latest_;
     std::uint64_t uses_ = 0;
 };
-
-// Everything that a source holds; nil when it holds more than `limit` bytes or can't be read.
-std::optional<std::vector<std::byte>> readAll(ByteSource& source, std::uint64_t limit);
 
 }  // namespace platform
