@@ -7,9 +7,11 @@ target_compile_options(vexo_settings INTERFACE -Wall -Wextra -Wpedantic -Wshadow
 if(CMAKE_CXX_COMPILER_ID STREQUAL "Clang")
     target_compile_options(vexo_settings INTERFACE -Wno-reserved-identifier -Wthread-safety)
 endif()
-# GCC 12 reports members of a std::variant as uninitialized that are not the one it holds.
+# GCC 12 reports members of a std::variant as uninitialized that are not the one it holds, and copies beyond the
+# end (or onto itself) in the strings that "literal" + std::string makes, both only when it optimizes.
 if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
-    target_compile_options(vexo_settings INTERFACE -Wno-maybe-uninitialized)
+    target_compile_options(vexo_settings INTERFACE -Wno-maybe-uninitialized -Wno-array-bounds -Wno-stringop-overflow
+                                                   -Wno-restrict)
 endif()
 if(VEXO_WARNINGS_AS_ERRORS)
     target_compile_options(vexo_settings INTERFACE -Werror)
