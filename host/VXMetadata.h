@@ -34,5 +34,15 @@ inline constexpr std::string_view kMDItemPixelHeight = "kMDItemPixelHeight";
 inline constexpr std::string_view kMDItemDurationSeconds = "kMDItemDurationSeconds";
 inline constexpr std::string_view kMDItemCodecs = "kMDItemCodecs";
 inline constexpr std::string_view kMDItemContentCreationDate = "kMDItemContentCreationDate";
+inline constexpr std::string_view kMDItemFSCreationDate = "kMDItemFSCreationDate";
+inline constexpr std::string_view kMDItemFSContentChangeDate = "kMDItemFSContentChangeDate";
+inline constexpr std::string_view kMDItemPath = "kMDItemPath";
+inline constexpr std::string_view kMDItemVideoFrameRate = "kMDItemVideoFrameRate";  // frames a second
+inline constexpr std::string_view kMDItemAudioChannelCount = "kMDItemAudioChannelCount";
+inline constexpr std::string_view kMDItemAudioSampleRate = "kMDItemAudioSampleRate";  // hertz
+inline constexpr std::string_view kMDItemTotalBitRate = "kMDItemTotalBitRate";        // bits a second
+inline constexpr std::string_view kMDItemTitle = "kMDItemTitle";
+inline constexpr std::string_view kMDItemAcquisitionMake = "kMDItemAcquisitionMake";
+inline constexpr std::string_view kMDItemAcquisitionModel = "kMDItemAcquisitionModel";
 
 }  // namespace vexo

@@ -6,6 +6,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <optional>
 #include <span>
@@ -23,10 +24,20 @@ struct Bitmap {
     std::vector<std::uint32_t> pixels;
 };
 
-// A picture that can be drawn at any size. Immutable and thread-safe.
+// A picture that can be drawn at any size. Thread-safe.
+//
+// Most pictures never change. One that shows something on a disk may be drawn as a stand-in first and tell
+// its observers when it has become what it is to show.
 class Picture {
   public:
     virtual ~Picture() = default;
+
+    // Told after each change, on any thread, outside every lock. An observer is forgotten when its owner
+    // goes.
+    using Observer = std::function<void()>;
+    virtual void addObserver(std::weak_ptr<const void> /*owner*/, Observer /*observer*/) const {}
+    // Has the picture look again at what it shows, where that may have changed; observers are then told.
+    virtual void refresh() const {}
 
     virtual Size naturalSize() const = 0;  // in points
     // False when the picture's data is damaged.
@@ -68,6 +79,9 @@ class Image {
 // so do pictures of more than 16384 points a side or 64 Mi points in all, and SVG that is compressed,
 // declares entities or tells no size. Nothing outside the bytes is loaded, whatever an SVG refers to.
 std::shared_ptr<const Picture> pictureWithData(std::span<const std::byte> data);
+
+// A picture of those pixels; one that is not drawable for a bitmap that lacks some or has too many.
+std::shared_ptr<const Picture> pictureWithBitmap(Bitmap bitmap);
 
 // The picture in an SVG or PNG file, read at once through the file manager; nil when there is no plain file
 // of at most 8 MiB that can be read.

@@ -27,6 +27,10 @@ MediaReaderAnswer ProcessMediaReader::read(int descriptor) {
     return MediaFailure{"the media reader ended over the file"};
 }
 
+MediaFrameAnswer ProcessMediaReader::frame(int, int) {
+    return MediaFailure{"frames cannot be read yet", FailureCause::elsewhere};
+}
+
 bool ProcessMediaReader::ensureStarted() {
     if (process_)
         return true;

@@ -24,6 +24,10 @@ class MediaReader {
     // What the file behind `descriptor` says. The descriptor stays the caller's; it is open for reading on a
     // plain file, and its position may be anywhere.
     virtual MediaReaderAnswer read(int descriptor) = 0;
+
+    // A representative picture of the movie behind `descriptor`, upright and in its shown proportions, scaled
+    // down to at most `longestSide` pixels a side. The descriptor is as above.
+    virtual MediaFrameAnswer frame(int descriptor, int longestSide) = 0;
 };
 
 // Starts the helper when a file is first to be read and keeps it for the next ones. It takes one file at a
@@ -47,6 +51,7 @@ class ProcessMediaReader final : public MediaReader {
 
     // Waits for the files that other threads have read before this one.
     MediaReaderAnswer read(int descriptor) override VX_EXCLUDES(mutex_);
+    MediaFrameAnswer frame(int descriptor, int longestSide) override VX_EXCLUDES(mutex_);
 
   private:
     using Clock = std::chrono::steady_clock;

@@ -19,8 +19,12 @@ namespace {
 using platform::Dictionary;
 using platform::Value;
 
-constexpr std::array mediaKeys{kMDItemMediaTypes,      kMDItemPixelWidth, kMDItemPixelHeight,
-                               kMDItemDurationSeconds, kMDItemCodecs,     kMDItemContentCreationDate};
+constexpr std::array mediaKeys{
+    kMDItemMediaTypes,       kMDItemPixelWidth,          kMDItemPixelHeight,    kMDItemDurationSeconds,
+    kMDItemCodecs,           kMDItemContentCreationDate, kMDItemVideoFrameRate, kMDItemAudioChannelCount,
+    kMDItemAudioSampleRate,  kMDItemTotalBitRate,        kMDItemTitle,          kMDItemAcquisitionMake,
+    kMDItemAcquisitionModel,
+};
 
 bool isMediaKey(std::string_view key) {
     return std::find(mediaKeys.begin(), mediaKeys.end(), key) != mediaKeys.end();
@@ -68,22 +72,39 @@ Dictionary fileValues(const std::string& path) {
     return values;
 }
 
+template <typename Content>
+void put(Dictionary& values, std::string_view key, const std::optional<Content>& content) {
+    if (content)
+        values.emplace(key, *content);
+}
+
+void put(Dictionary& values, std::string_view key, const std::vector<std::string>& texts) {
+    if (!texts.empty())
+        values.emplace(key, arrayOf(texts));
+}
+
+std::optional<platform::DateRef> dateOf(const std::optional<double>& secondsSince1970) {
+    if (!secondsSince1970)
+        return std::nullopt;
+    return platform::Date::since1970(*secondsSince1970);
+}
+
 // From the file's content.
 Dictionary mediaValues(const MediaProperties& properties) {
     Dictionary values;
-    if (!properties.mediaTypes.empty())
-        values.emplace(kMDItemMediaTypes, arrayOf(properties.mediaTypes));
-    if (!properties.codecs.empty())
-        values.emplace(kMDItemCodecs, arrayOf(properties.codecs));
-    if (properties.pixelWidth)
-        values.emplace(kMDItemPixelWidth, *properties.pixelWidth);
-    if (properties.pixelHeight)
-        values.emplace(kMDItemPixelHeight, *properties.pixelHeight);
-    if (properties.durationSeconds)
-        values.emplace(kMDItemDurationSeconds, *properties.durationSeconds);
-    if (properties.contentCreationDate)
-        values.emplace(kMDItemContentCreationDate,
-                       platform::Date::since1970(*properties.contentCreationDate));
+    put(values, kMDItemMediaTypes, properties.mediaTypes);
+    put(values, kMDItemCodecs, properties.codecs);
+    put(values, kMDItemPixelWidth, properties.pixelWidth);
+    put(values, kMDItemPixelHeight, properties.pixelHeight);
+    put(values, kMDItemDurationSeconds, properties.durationSeconds);
+    put(values, kMDItemContentCreationDate, dateOf(properties.contentCreationDate));
+    put(values, kMDItemVideoFrameRate, properties.frameRate);
+    put(values, kMDItemAudioChannelCount, properties.audioChannelCount);
+    put(values, kMDItemAudioSampleRate, properties.audioSampleRate);
+    put(values, kMDItemTotalBitRate, properties.totalBitRate);
+    put(values, kMDItemTitle, properties.title);
+    put(values, kMDItemAcquisitionMake, properties.acquisitionMake);
+    put(values, kMDItemAcquisitionModel, properties.acquisitionModel);
     return values;
 }
 

@@ -211,6 +211,12 @@ std::shared_ptr<const Picture> pictureWithData(std::span<const std::byte> data) 
     return std::make_shared<VectorPicture>(std::move(handle), size);
 }
 
+std::shared_ptr<const Picture> pictureWithBitmap(Bitmap bitmap) {
+    if (!isWhole(bitmap))
+        return std::make_shared<UndrawablePicture>();
+    return std::make_shared<BitmapPicture>(std::move(bitmap));
+}
+
 std::vector<std::byte> pngData(const Bitmap& bitmap) {
     std::vector<std::byte> bytes;
     if (!isWhole(bitmap))

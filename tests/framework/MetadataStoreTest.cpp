@@ -35,6 +35,8 @@ class ScriptedReader final : public MediaReader {
         return movie;
     }
 
+    MediaFrameAnswer frame(int, int) override { return MediaFailure{"no picture"}; }
+
     std::atomic<int> reads{0};
     FailureCause failureCause = FailureCause::file;
 };
