@@ -2,7 +2,10 @@
 #pragma once
 
 #include <optional>
+#include <string>
 #include <string_view>
+
+#include "platform/Image.h"
 
 namespace vexo {
 
@@ -10,6 +13,9 @@ class BundleStrings;
 
 // The bytes of the file of that name, "icons/folder.svg" say; nil when there is none.
 std::optional<std::string_view> frameworkResource(std::string_view name);
+
+// A new image of the framework's icon of that name, "folder" say. Requires: there is one.
+platform::ImageRef frameworkIcon(const std::string& name);
 
 // The framework's own texts ("DurationString").
 const BundleStrings& frameworkStrings();

@@ -11,6 +11,7 @@
 #include "framework/metadata/MediaReader.h"
 #include "framework/metadata/MetadataIndex.h"
 #include "framework/metadata/MetadataStore.h"
+#include "framework/thumbnails/Thumbnailer.h"
 #include "host/VXConstants.h"
 #include "platform/Notification.h"
 #include "platform/Path.h"
@@ -37,6 +38,10 @@ std::string preferencesFolder(const std::optional<std::string>& home) {
     return platform::path::withoutLastComponent(home.value_or("") + file);
 }
 
+std::shared_ptr<ProcessMediaReader> newMediaReader() {
+    return std::make_shared<ProcessMediaReader>(ProcessMediaReader::Settings{mediaReaderProgram()});
+}
+
 }  // namespace
 
 // In order of construction. The dispatcher is taken down first of all, by the host, while everything that its
@@ -52,12 +57,13 @@ struct Host::State {
           workspace(mounts),
           userDefaults(preferencesFolder(home), processDefaultsDomain, &log),
           diagnostics(log, options.verbosity),
-          metadata(MetadataIndex::defaultPath(),
-                   std::make_shared<ProcessMediaReader>(ProcessMediaReader::Settings{mediaReaderProgram()})),
+          metadata(MetadataIndex::defaultPath(), newMediaReader()),
+          backgroundReader(newMediaReader()),
+          thumbnails(ThumbnailMaker(ThumbnailCache(ThumbnailCache::defaultFolder()), backgroundReader)),
           images([this](const std::string& path) { return metadata.supportedMovieFile(path); }),
           dispatcher(std::make_unique<platform::LinuxDispatcher>(log)),
           platformScope({files, workspace, userDefaults, *dispatcher, notifications, log}),
-          hostScope({pathWatcher, images, metadata, diagnostics}) {
+          hostScope({pathWatcher, images, metadata, thumbnails, diagnostics}) {
         dispatcher->setFailureHandler([](const platform::Dispatcher::Block& block,
                                          std::exception_ptr failure) { recoverFrom(failure, block); });
     }
@@ -73,6 +79,9 @@ struct Host::State {
     Diagnostics diagnostics;
     PathWatcher pathWatcher;
     MetadataStore metadata;
+    // Nobody waits for what it reads, so a property that somebody waits for never stands behind that.
+    const std::shared_ptr<ProcessMediaReader> backgroundReader;
+    Thumbnailer thumbnails;
     ImageManager images;
     std::unique_ptr<platform::LinuxDispatcher> dispatcher;
     platform::ServicesScope platformScope;
@@ -85,6 +94,7 @@ Host::Host(const HostOptions& options) : state_(std::make_unique<State>(options)
 Host::~Host() {
     for (const LoadedPlugin& plugin : state_->plugins)
         plugin.manager->close();
+    state_->thumbnails.close();
     for (const LoadedPlugin& plugin : state_->plugins)
         plugin.manager->waitUntilLoaded();
     state_->dispatcher.reset();

@@ -6,6 +6,7 @@ namespace vexo {
 
 class Diagnostics;
 class MetadataProvider;
+class ThumbnailProvider;
 class VXMediaBrowserImageManager;
 class VXPathWatcher;
 
@@ -13,6 +14,7 @@ struct HostServices {
     VXPathWatcher& pathWatcher;
     VXMediaBrowserImageManager& imageManager;
     const MetadataProvider& metadata;
+    ThumbnailProvider& thumbnails;
     Diagnostics& diagnostics;
 };
 

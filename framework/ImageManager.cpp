@@ -1,7 +1,5 @@
 #include "framework/ImageManager.h"
 
-#include <span>
-
 #include "framework/FrameworkResources.h"
 #include "platform/FileManager.h"
 #include "platform/Services.h"
@@ -10,11 +8,6 @@
 namespace vexo {
 
 namespace {
-
-platform::ImageRef frameworkIcon(const std::string& name) {
-    const std::string_view svg = *frameworkResource("icons/" + name + ".svg");
-    return std::make_shared<platform::Image>(platform::pictureWithData(std::as_bytes(std::span(svg))), name);
-}
 
 bool isVolume(const std::string& path) {
     const auto mountPoint = platform::services().fileManager.resolvedPath(path);

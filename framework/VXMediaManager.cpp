@@ -9,6 +9,7 @@
 #include "framework/HostServices.h"
 #include "framework/MediaObjectRegistry.h"
 #include "platform/Dispatcher.h"
+#include "platform/ObserverList.h"
 #include "platform/Services.h"
 
 namespace vexo {
@@ -30,7 +31,8 @@ struct VXMediaManager::State {
     bool loadAgain VX_GUARDED_BY(mutex) = false;  // a request arrived during the load in progress
     bool closed VX_GUARDED_BY(mutex) = false;
     VXMediaGroupRef root VX_GUARDED_BY(mutex);
-    std::vector<std::pair<std::weak_ptr<const void>, TreeObserver>> observers VX_GUARDED_BY(mutex);
+
+    platform::ObserverList<VXMediaGroupRef> observers;
 };
 
 VXMediaManager::VXMediaManager(VXBundleRef bundle)
@@ -188,22 +190,16 @@ VXMediaGroupRef VXMediaManager::rootMediaGroup() const {
 void VXMediaManager::setRootMediaGroup(VXMediaGroupRef group) {
     if (group)
         state_->registry.registerTree(group);
-    std::vector<TreeObserver> handlers;
     VXMediaGroupRef previous = group;  // freed outside the lock: a tree may be large
     {
         Locked lock(state_->mutex);
         state_->root.swap(previous);
-        std::erase_if(state_->observers, [](const auto& observer) { return observer.first.expired(); });
-        for (const auto& [observer, handler] : state_->observers)
-            handlers.push_back(handler);
     }
-    for (const TreeObserver& handler : handlers)
-        handler(group);
+    state_->observers.notify(group);
 }
 
 void VXMediaManager::addTreeObserver(std::weak_ptr<const void> observer, TreeObserver handler) {
-    Locked lock(state_->mutex);
-    state_->observers.emplace_back(std::move(observer), std::move(handler));
+    state_->observers.add(std::move(observer), std::move(handler));
 }
 
 VXMediaGroupRef VXMediaManager::newMediaGroupWithTypeIdentifier(const VXGroupTypeIdentifier& typeIdentifier,

@@ -2,6 +2,7 @@
 
 #include "framework/HostServices.h"
 #include "framework/MetadataProvider.h"
+#include "framework/ThumbnailProvider.h"
 #include "host/VXConstants.h"
 #include "platform/FileManager.h"
 #include "platform/Services.h"
@@ -77,13 +78,29 @@ void VXMediaObject::setIcon(platform::ImageRef icon) {
 }
 
 platform::ImageRef VXMediaObject::thumbnailImage() const {
+    std::optional<std::string> file;
+    {
+        Locked lock(mutex_);
+        if (thumbnailImage_ || !path_)
+            return thumbnailImage_;
+        file = path_;
+    }
+    const platform::ImageRef image = hostServices().thumbnails.thumbnailOfFile(*file);
     Locked lock(mutex_);
+    if (!thumbnailImage_)  // else another thread was first
+        thumbnailImage_ = image;
     return thumbnailImage_;
 }
 
 void VXMediaObject::setThumbnailImage(platform::ImageRef image) {
-    Locked lock(mutex_);
-    thumbnailImage_.swap(image);
+    const platform::ImageRef shown = image;
+    {
+        Locked lock(mutex_);
+        thumbnailImage_.swap(image);
+    }
+    const bool isItsOwn = shown && shown == image;
+    if (isItsOwn && shown->picture())
+        shown->picture()->refresh();
 }
 
 std::optional<platform::Value> VXMediaObject::attributeForKey(std::string_view key) const {

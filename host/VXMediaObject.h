@@ -42,8 +42,11 @@ class VXMediaObject final {
 
     platform::ImageRef icon() const VX_EXCLUDES(mutex_);
     void setIcon(platform::ImageRef icon) VX_EXCLUDES(mutex_);
+    // What the movie shows, the same image each time; nil without a path. Answers at once: the image shows a
+    // stand-in until it is first drawn and its picture has been found or made, of which its observers are
+    // told.
     platform::ImageRef thumbnailImage() const VX_EXCLUDES(mutex_);
-    // Setting an item's own thumbnail again makes the host redraw it.
+    // Setting an item's own thumbnail again makes it look at the file anew, and the host redraw it.
     void setThumbnailImage(platform::ImageRef image) VX_EXCLUDES(mutex_);
 
     // attributeForKey:. What is not set falls back on the file's metadata properties for the duration, the
@@ -78,7 +81,7 @@ class VXMediaObject final {
     std::optional<std::string> path_ VX_GUARDED_BY(mutex_);
     platform::Dictionary attributes_ VX_GUARDED_BY(mutex_);
     platform::ImageRef icon_ VX_GUARDED_BY(mutex_);
-    platform::ImageRef thumbnailImage_ VX_GUARDED_BY(mutex_);
+    mutable platform::ImageRef thumbnailImage_ VX_GUARDED_BY(mutex_);  // made when first asked for
     VXMetadataPropertiesRef spotlightProperties_ VX_GUARDED_BY(mutex_);
     int mediaSourceType_ VX_GUARDED_BY(mutex_) = 0;
 };

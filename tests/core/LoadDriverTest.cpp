@@ -112,8 +112,8 @@ class LoadDriverTest : public testing_support::SmallLibraryTest {
     void useRecordingWatcher() {
         const vexo::HostServices& services = vexo::hostServices();
         watcher.emplace(environment.watcher);
-        watcherScope_.emplace(
-            vexo::HostServices{*watcher, services.imageManager, services.metadata, services.diagnostics});
+        watcherScope_.emplace(vexo::HostServices{*watcher, services.imageManager, services.metadata,
+                                                 services.thumbnails, services.diagnostics});
     }
 
     std::optional<vexo::HostServicesScope> watcherScope_;

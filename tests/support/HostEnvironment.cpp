@@ -103,6 +103,10 @@ int FakeMetadata::questions() const {
     return questions_;
 }
 
+platform::ImageRef FakeThumbnails::thumbnailOfFile(const std::string& path) {
+    return std::make_shared<platform::Image>(platform::pictureWithData({}), "thumbnail of " + path);
+}
+
 SourceBundle::SourceBundle()
     : path_(VEXO_SOURCE_DIR "/resources"),
       strings_(vexo::BundleStrings::withContentsOfFile(path_ + "/Resources/Strings.ini")) {}
@@ -135,7 +139,7 @@ void HostEnvironment::setHomeDirectory(std::optional<std::string> homeDirectory)
                                                           vexo::isPackageExtension);
     platformScope_.emplace(
         platform::Services{*files_, workspace, userDefaults, dispatcher, notifications, log});
-    hostScope_.emplace(vexo::HostServices{watcher, images_, metadata, diagnostics});
+    hostScope_.emplace(vexo::HostServices{watcher, images_, metadata, thumbnails, diagnostics});
 }
 
 }  // namespace testing_support

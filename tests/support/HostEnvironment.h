@@ -14,6 +14,7 @@
 #include "framework/ImageManager.h"
 #include "framework/MetadataProvider.h"
 #include "framework/PathWatcher.h"
+#include "framework/ThumbnailProvider.h"
 #include "host/VXPlugin.h"
 #include "platform/Notification.h"
 #include "platform/Services.h"
@@ -86,6 +87,12 @@ class FakeMetadata final : public vexo::MetadataProvider {
     mutable int questions_ VX_GUARDED_BY(mutex_) = 0;
 };
 
+// Thumbnails that are never made; each is named after its file.
+class FakeThumbnails final : public vexo::ThumbnailProvider {
+  public:
+    platform::ImageRef thumbnailOfFile(const std::string& path) override;
+};
+
 // The plug-in's resources as they lie in the source tree; texts and icons can be replaced or taken away.
 class SourceBundle final : public vexo::VXBundle {
   public:
@@ -121,6 +128,7 @@ class HostEnvironment {
     VirtualDispatcher dispatcher;
     platform::NotificationCenter notifications;
     FakeMetadata metadata;
+    FakeThumbnails thumbnails;
     vexo::Diagnostics diagnostics{log, vexo::Verbosity::verbose};
     vexo::PathWatcher watcher;
     std::shared_ptr<SourceBundle> bundle;
