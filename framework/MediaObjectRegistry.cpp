@@ -1,7 +1,8 @@
 #include "framework/MediaObjectRegistry.h"
 
 #include <functional>
-#include <vector>
+
+#include "framework/TreeWalk.h"
 
 namespace vexo {
 namespace {
@@ -15,19 +16,16 @@ std::size_t hashOf(const std::string& ID) {
 void MediaObjectRegistry::registerTree(const VXMediaGroupRef& root) {
     platform::Locked lock(mutex_);
     forgetVanished();
-    // A stack of our own: a tree may be as deep as a path can be long.
-    std::vector<VXMediaGroupRef> pending{root};
-    while (!pending.empty()) {
-        const VXMediaGroupRef group = std::move(pending.back());
-        pending.pop_back();
-        if (const auto mediaObjects = group->ownMediaObjects()) {
-            for (const VXMediaObjectRef& mediaObject : *mediaObjects)
-                registerObject(mediaObject);
-        }
-        const VXMediaGroupList childGroups = group->childGroups();
-        for (std::size_t i = childGroups.size(); i > 0; --i)
-            pending.push_back(childGroups[i - 1]);
-    }
+    visitGroups(root, [this](const VXMediaGroupRef& group) VX_REQUIRES(mutex_) {
+        registerObjectsOf(*group);
+        return true;
+    });
+}
+
+void MediaObjectRegistry::registerObjectsOf(const VXMediaGroup& group) {
+    if (const auto mediaObjects = group.ownMediaObjects())
+        for (const VXMediaObjectRef& mediaObject : *mediaObjects)
+            registerObject(mediaObject);
 }
 
 VXMediaObjectRef MediaObjectRegistry::objectForID(const std::string& ID) const {

@@ -20,6 +20,7 @@ class MediaObjectRegistry {
     VXMediaObjectRef objectForID(const std::string& ID) const VX_EXCLUDES(mutex_);
 
   private:
+    void registerObjectsOf(const VXMediaGroup& group) VX_REQUIRES(mutex_);
     void registerObject(const VXMediaObjectRef& mediaObject) VX_REQUIRES(mutex_);
     void forgetVanished() VX_REQUIRES(mutex_);
     VXMediaObjectRef find(const std::string& ID) const VX_REQUIRES(mutex_);
