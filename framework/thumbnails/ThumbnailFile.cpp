@@ -52,6 +52,13 @@ Pixbuf pixbufOf(const platform::Bitmap& picture) {
 
 // --- Decoding ----------------------------------------------------------------------------------------------
 
+// The loader takes one that breaks off, and shows what it has.
+bool isWhole(std::span<const std::byte> png) {
+    static constexpr std::string_view lastChunk{"\0\0\0\0IEND\xae\x42\x60\x82", 12};
+    const std::string_view text(reinterpret_cast<const char*>(png.data()), png.size());
+    return text.ends_with(lastChunk);
+}
+
 // The size in a header is known before anything is decoded to it.
 void refuseLargerOnes(GdkPixbufLoader* loader, int width, int height, gpointer longestSide) {
     if (std::max(width, height) > *static_cast<const int*>(longestSide))
@@ -125,7 +132,7 @@ std::vector<std::byte> encodedThumbnail(const ThumbnailSubject& subject, const p
 
 std::optional<platform::Bitmap> decodedThumbnail(std::span<const std::byte> png,
                                                  const ThumbnailSubject& subject, int longestSide) {
-    const Loader loader = loaded(png, longestSide);
+    const Loader loader = isWhole(png) ? loaded(png, longestSide) : nullptr;
     GdkPixbuf* pixbuf = loader ? gdk_pixbuf_loader_get_pixbuf(loader.get()) : nullptr;
     if (!pixbuf || !shows(pixbuf, subject))
         return std::nullopt;
