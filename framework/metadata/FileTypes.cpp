@@ -52,13 +52,16 @@ struct FileTypeTable::Section {
     std::string kind;
     std::vector<std::string> parents;
     std::vector<std::string> extensions;
+    std::vector<std::string> mimes;
 };
 
 FileTypeTable::FileTypeTable(std::string_view iniText) {
     const auto sections = sectionsOf(iniText);
     addTypes(sections);
-    for (const Section& section : sections)
+    for (const Section& section : sections) {
         addExtensions(section);
+        addMimes(section);
+    }
 }
 
 const FileTypeTable& FileTypeTable::shared() {
@@ -74,7 +77,7 @@ std::vector<FileTypeTable::Section> FileTypeTable::sectionsOf(std::string_view i
         if (line.empty() || line.front() == '#')
             continue;
         if (line.front() == '[' && line.back() == ']')
-            sections.push_back({std::string(line.substr(1, line.size() - 2)), {}, {}, {}});
+            sections.push_back({std::string(line.substr(1, line.size() - 2)), {}, {}, {}, {}});
         else if (sections.empty())
             problems_.push_back("before the first section: " + text);
         else
@@ -94,6 +97,8 @@ void FileTypeTable::readEntry(Section& section, std::string_view line) {
         section.parents = words(value);
     else if (key == "extensions")
         section.extensions = words(value);
+    else if (key == "mime")
+        section.mimes = words(value);
     else
         problems_.push_back(section.contentType + ": no meaning for: " + std::string(line));
 }
@@ -127,6 +132,13 @@ void FileTypeTable::addExtensions(const Section& section) {
             problems_.push_back(section.contentType + ": another type has the extension " + extension);
 }
 
+void FileTypeTable::addMimes(const Section& section) {
+    const FileType* type = typeNamed(section.contentType);
+    for (const std::string& mime : section.mimes)
+        if (!typesByMime_.emplace(mime, type).second)
+            problems_.push_back(section.contentType + ": another type has the MIME type " + mime);
+}
+
 const FileType* FileTypeTable::typeForExtension(std::string_view extension) const {
     const auto found = typesByExtension_.find(lowerCase(extension));
     return found == typesByExtension_.end() ? nullptr : found->second;
@@ -135,6 +147,11 @@ const FileType* FileTypeTable::typeForExtension(std::string_view extension) cons
 const FileType* FileTypeTable::typeNamed(std::string_view contentType) const {
     const auto found = types_.find(std::string(contentType));
     return found == types_.end() ? nullptr : &found->second;
+}
+
+const FileType* FileTypeTable::typeForMime(std::string_view mime) const {
+    const auto found = typesByMime_.find(std::string(mime));
+    return found == typesByMime_.end() ? nullptr : found->second;
 }
 
 const FileType* typeForExtension(std::string_view extension) {

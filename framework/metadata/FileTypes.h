@@ -1,4 +1,5 @@
-// What a file is, told by the extension of its name and by whether it is a folder. No file is looked at.
+// What a file is, told by the extension of its name and by whether it is a folder. No file is looked at: what
+// the content says is ContentType's.
 //
 // The table is the text of file-types.ini, built into the library. Immutable once made; callable from any
 // thread.
@@ -30,9 +31,10 @@ class FileTypeTable {
     // Each answers nil for what the table lacks. An extension has no dot and may be in any case.
     const FileType* typeForExtension(std::string_view extension) const;
     const FileType* typeNamed(std::string_view contentType) const;
+    const FileType* typeForMime(std::string_view mime) const;
 
-    // What is wrong with the text, one line each: unknown words and parents, extensions claimed twice. What
-    // is right of it counts nevertheless.
+    // What is wrong with the text, one line each: unknown words and parents, extensions and MIME types
+    // claimed twice. What is right of it counts nevertheless.
     const std::vector<std::string>& problems() const { return problems_; }
 
   private:
@@ -42,9 +44,11 @@ class FileTypeTable {
     void readEntry(Section& section, std::string_view line);
     void addTypes(const std::vector<Section>& sections);
     void addExtensions(const Section& section);
+    void addMimes(const Section& section);
 
     std::unordered_map<std::string, FileType> types_;                    // by content type
     std::unordered_map<std::string, const FileType*> typesByExtension_;  // in lower case
+    std::unordered_map<std::string, const FileType*> typesByMime_;
     std::vector<std::string> problems_;
 };
 

@@ -14,8 +14,10 @@ TEST(FileTypes, TheTableIsInOrder) {
 }
 
 TEST(FileTypes, MovieExtensionsMeanMovies) {
-    for (const char* extension : {"mov", "mp4", "m4v", "dv", "avi", "mts", "m2ts", "ts", "mpg", "mpeg", "3gp",
-                                  "3g2", "mkv", "webm", "mxf", "ogv", "flv", "wmv", "fcmov"}) {
+    for (const char* extension :
+         {"mov", "mp4", "m4v",  "dv",  "avi", "mts", "m2ts", "ts",    "mpg", "mpeg", "3gp",
+          "3g2", "mkv", "webm", "mxf", "ogv", "flv", "wmv",  "fcmov", "asf", "qt",   "m2t",
+          "tod", "mod", "vob",  "m1v", "m2v", "mpv", "divx", "ogm",   "rm"}) {
         const FileType* type = typeForExtension(extension);
         ASSERT_TRUE(type) << extension;
         EXPECT_TRUE(type->isMovie) << extension;
@@ -24,7 +26,7 @@ TEST(FileTypes, MovieExtensionsMeanMovies) {
 }
 
 TEST(FileTypes, SoundIsNoMovie) {
-    for (const char* extension : {"m4a", "mp3", "wav", "aiff", "flac", "ogg"}) {
+    for (const char* extension : {"m4a", "mp3", "wav", "aiff", "flac", "ogg", "mka", "weba", "au"}) {
         const FileType* type = typeForExtension(extension);
         ASSERT_TRUE(type) << extension;
         EXPECT_TRUE(type->isSound) << extension;
@@ -68,6 +70,25 @@ TEST(FileTypes, AFrameCastMovieIsAMovie) {
     EXPECT_TRUE(type->isMovie);
 }
 
+TEST(FileTypes, ProgramsPlugInsAndDocumentFoldersArePackages) {
+    for (const char* extension :
+         {"qnproject", "app", "bundle", "framework", "plugin", "vxplugin", "rtfd", "pkg", "pages"})
+        EXPECT_TRUE(isPackageExtension(extension)) << extension;
+    for (const char* extension : {"localized", "d", "mov", "zip"})
+        EXPECT_FALSE(isPackageExtension(extension)) << extension;
+}
+
+TEST(FileTypes, MimeTypesOfMoviesMeanMovies) {
+    for (const char* mime :
+         {"video/quicktime", "video/mp4", "video/x-msvideo", "video/vnd.avi", "video/mp2t"}) {
+        const FileType* type = FileTypeTable::shared().typeForMime(mime);
+        ASSERT_TRUE(type) << mime;
+        EXPECT_TRUE(type->isMovie) << mime;
+    }
+    EXPECT_FALSE(FileTypeTable::shared().typeForMime("application/octet-stream"));
+    EXPECT_FALSE(FileTypeTable::shared().typeForMime(""));
+}
+
 TEST(FileTypes, AProjectIsAPackageOnlyAsAFolder) {
     EXPECT_EQ(typeOfFolder("Trip.qnproject").kind, "Reelix Project");
     EXPECT_TRUE(typeOfFolder("Trip.qnproject").isPackage);
@@ -89,10 +110,11 @@ TEST(FileTypeTable, ATypeWithoutAKindTakesItsFirstParents) {
 TEST(FileTypeTable, MistakesAreNamedAndTheRestCounts) {
     const FileTypeTable table(
         "kind = lost\n[a]\nkind = Thing\nextensions = x\nnonsense\n[b]\nparents = c\nextensions = x "
-        "y\n[a]\n");
+        "y\nmime = m/m m/m\n[a]\n");
     EXPECT_THAT(table.problems(), ElementsAre(HasSubstr("before the first section"), HasSubstr("nonsense"),
                                               HasSubstr("unknown parent c"), HasSubstr("declared twice"),
-                                              HasSubstr("extension x")));
+                                              HasSubstr("extension x"), HasSubstr("MIME type m/m")));
+    EXPECT_EQ(table.typeForMime("m/m")->contentType, "b");
     EXPECT_EQ(table.typeForExtension("x")->contentType, "a");
     EXPECT_EQ(table.typeForExtension("y")->contentType, "b");
 }
