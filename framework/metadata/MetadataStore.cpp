@@ -1,11 +1,15 @@
 #include "framework/metadata/MetadataStore.h"
 
+#include <fcntl.h>
 #include <sys/stat.h>
 
 #include <algorithm>
 #include <array>
 #include <atomic>
+#include <cerrno>
+#include <system_error>
 
+#include "framework/metadata/ContentType.h"
 #include "framework/metadata/FileTypes.h"
 #include "framework/metadata/MetadataCache.h"
 #include "platform/FileManager.h"
@@ -30,45 +34,94 @@ bool isMediaKey(std::string_view key) {
     return std::find(mediaKeys.begin(), mediaKeys.end(), key) != mediaKeys.end();
 }
 
-// The path by which the system's calls know the file; nil where its volume is gone.
-std::optional<std::string> realPath(const std::string& path) {
+constexpr std::array typeKeys{kMDItemContentType, kMDItemContentTypeTree, kMDItemKind};
+
+bool isTypeKey(std::string_view key) {
+    return std::find(typeKeys.begin(), typeKeys.end(), key) != typeKeys.end();
+}
+
+// A file at the moment it was looked at.
+struct FoundFile {
+    std::string path;      // as it was asked for
+    std::string realPath;  // by which the system's calls know it
+    struct statx status;
+};
+
+std::optional<std::string> realPathOf(const std::string& path) {
     if (!path.starts_with("/Volumes/"))
         return path;
     return platform::services().fileManager.resolvedPath(path);
 }
 
-std::optional<struct stat> statusOf(const std::string& path) {
-    const auto real = realPath(path);
-    struct stat status;
-    if (!real || stat(real->c_str(), &status) != 0)
+// nil for what is not there or out of reach; `errno` then says why. Follows links.
+std::optional<FoundFile> foundFile(const std::string& path) {
+    auto real = realPathOf(path);
+    if (!real) {
+        errno = ENOENT;
         return std::nullopt;
-    return status;
+    }
+    FoundFile file{path, std::move(*real), {}};
+    if (statx(AT_FDCWD, file.realPath.c_str(), 0, STATX_BASIC_STATS | STATX_BTIME, &file.status) != 0)
+        return std::nullopt;
+    return file;
+}
+
+bool isFolder(const FoundFile& file) {
+    return S_ISDIR(file.status.stx_mode);
+}
+
+bool isPlainFile(const FoundFile& file) {
+    return S_ISREG(file.status.stx_mode);
+}
+
+// Opens the file only where its extension tells no type.
+const FileType& typeOf(const FoundFile& file) {
+    const std::string name = platform::path::lastComponent(file.path);
+    if (isFolder(file))
+        return typeOfFolder(name);
+    if (isPlainFile(file) && !typeForExtension(platform::path::extension(name)))
+        if (const FileType* type = typeOfContentOfFile(file.realPath))
+            return *type;
+    return typeOfFile(name);
+}
+
+// Of what has no type of its own the reader may know more than the table of types.
+bool mayBeMovie(const FileType& type) {
+    return type.isMovie || type.contentType == "public.data";
 }
 
 // What is known to be neither movie nor sound is not worth starting the reader for.
-bool mayBeMedia(const std::string& path) {
-    const FileType* type = typeForExtension(platform::path::extension(path));
-    return !type || type->isMovie || type->isSound || type->isPackage;
+bool mayBeMedia(const FileType& type) {
+    return mayBeMovie(type) || type.isSound;
 }
 
 Value arrayOf(const std::vector<std::string>& texts) {
     return platform::Array(texts.begin(), texts.end());
 }
 
+Value dateOf(const statx_timestamp& time) {
+    return platform::Date::since1970(static_cast<double>(time.tv_sec) + time.tv_nsec / 1e9);
+}
+
+Dictionary typeValues(const FoundFile& file) {
+    const FileType& type = typeOf(file);
+    return {
+        {std::string(kMDItemContentType), type.contentType},
+        {std::string(kMDItemContentTypeTree), arrayOf(type.contentTypeTree)},
+        {std::string(kMDItemKind), type.kind},
+    };
+}
+
 // From the file's name and status alone.
-Dictionary fileValues(const std::string& path) {
-    const auto status = statusOf(path);
-    if (!status)
-        return {};
+Dictionary statusValues(const FoundFile& file) {
     Dictionary values;
-    const std::string name = platform::path::lastComponent(path);
-    const FileType& type = S_ISDIR(status->st_mode) ? typeOfFolder(name) : typeOfFile(name);
-    values.emplace(kMDItemFSName, name);
-    values.emplace(kMDItemContentType, type.contentType);
-    values.emplace(kMDItemContentTypeTree, arrayOf(type.contentTypeTree));
-    values.emplace(kMDItemKind, type.kind);
-    if (S_ISREG(status->st_mode))
-        values.emplace(kMDItemFSSize, std::int64_t{status->st_size});
+    values.emplace(kMDItemPath, file.path);
+    values.emplace(kMDItemFSName, platform::path::lastComponent(file.path));
+    values.emplace(kMDItemFSContentChangeDate, dateOf(file.status.stx_mtime));
+    if (file.status.stx_mask & STATX_BTIME)
+        values.emplace(kMDItemFSCreationDate, dateOf(file.status.stx_btime));
+    if (isPlainFile(file))
+        values.emplace(kMDItemFSSize, static_cast<std::int64_t>(file.status.stx_size));
     return values;
 }
 
@@ -108,6 +161,18 @@ Dictionary mediaValues(const MediaProperties& properties) {
     return values;
 }
 
+constexpr const char* soundAlone = "sound without a picture, no movie";
+
+// nil for a movie.
+std::optional<std::string> problemWith(const MediaReaderAnswer& answer) {
+    if (const auto* failure = std::get_if<MediaFailure>(&answer))
+        return failure->reason;
+    const auto& types = std::get<MediaProperties>(answer).mediaTypes;
+    const bool isSoundAlone =
+        std::all_of(types.begin(), types.end(), [](const std::string& type) { return type == "Sound"; });
+    return isSoundAlone ? std::optional<std::string>(soundAlone) : std::nullopt;
+}
+
 const MediaProperties nothing;
 
 // One for each item of a tree, so it is small: the content's properties are held apart, once they are known.
@@ -120,18 +185,29 @@ class FileMetadata final : public VXMetadataProperties {
     FileMetadata& operator=(const FileMetadata&) = delete;
 
     std::optional<Value> valueForKey(std::string_view key) const override {
-        const Dictionary values = isMediaKey(key) ? mediaValues(media()) : fileValues(path_);
+        const Dictionary values = isMediaKey(key) ? mediaValues(media()) : fileValues(key);
         const auto found = values.find(key);
         return found == values.end() ? std::nullopt : std::optional(found->second);
     }
 
     Dictionary allValues() const override {
-        Dictionary values = fileValues(path_);
-        values.merge(mediaValues(media()));
+        Dictionary values = mediaValues(media());
+        if (const auto file = foundFile(path_)) {
+            values.merge(typeValues(*file));
+            values.merge(statusValues(*file));
+        }
         return values;
     }
 
   private:
+    // The values among which that for `key` would be.
+    Dictionary fileValues(std::string_view key) const {
+        const auto file = foundFile(path_);
+        if (!file)
+            return {};
+        return isTypeKey(key) ? typeValues(*file) : statusValues(*file);
+    }
+
     static void dispose(const MediaProperties* media) {
         if (media != &nothing)
             delete media;
@@ -148,10 +224,10 @@ class FileMetadata final : public VXMetadataProperties {
 
     // nil for nothing at all.
     std::unique_ptr<const MediaProperties> read(MetadataCache& cache) const {
-        const auto real = mayBeMedia(path_) ? realPath(path_) : std::nullopt;
-        if (!real)
+        const auto file = foundFile(path_);
+        if (!file || !mayBeMedia(typeOf(*file)))
             return nullptr;
-        const MediaReaderAnswer answer = cache.answerForFile(*real);
+        const MediaReaderAnswer answer = cache.answerForFile(file->realPath);
         const auto* properties = std::get_if<MediaProperties>(&answer);
         return properties ? std::make_unique<const MediaProperties>(*properties) : nullptr;
     }
@@ -184,10 +260,22 @@ VXMetadataPropertiesRef MetadataStore::propertiesForFile(const std::string& path
 }
 
 bool MetadataStore::supportedMovieFile(const std::string& path) const {
-    if (!typeOfFile(platform::path::lastComponent(path)).isMovie)
-        return false;
-    const auto status = statusOf(path);
-    return status && S_ISREG(status->st_mode);
+    const auto file = foundFile(path);
+    return file && isPlainFile(*file) && typeOf(*file).isMovie;
+}
+
+std::optional<std::string> MetadataStore::problemWithFile(const std::string& path) const {
+    const auto file = foundFile(path);
+    if (!file)
+        return std::generic_category().message(errno);
+    const FileType& type = typeOf(*file);
+    if (type.isPackage)
+        return "it is a package";
+    if (isPlainFile(*file) && type.isSound)
+        return soundAlone;
+    if (isPlainFile(*file) && !mayBeMovie(type))
+        return type.kind + ", no movie";
+    return problemWith(cache_->answerForFile(file->realPath));
 }
 
 std::string MetadataStore::indexPath() const {
