@@ -1,20 +1,41 @@
-// What the media reader sends is decoded as if the reader had been taken over.
+// What the media reader and its host send one another is decoded as if the other had been taken over. What
+// was understood survives being written and read again.
 #include <cstddef>
 #include <cstdint>
 #include <cstdlib>
 
 #include "framework/metadata/ReaderMessage.h"
 
+namespace {
+
+void expectThat(bool holds) {
+    if (!holds)
+        std::abort();
+}
+
+void readAsHost(std::string_view message) {
+    if (const auto confinement = vexo::decodeGreeting(message))
+        expectThat(vexo::decodeGreeting(vexo::encodeGreeting(*confinement)) == confinement);
+    if (const auto reply = vexo::decodeReply(message))
+        expectThat(vexo::decodeReply(vexo::encodeReply(*reply)) == reply);
+}
+
+void readAsReader(std::string_view message) {
+    if (const auto request = vexo::decodeRequest(message))
+        expectThat(vexo::decodeRequest(vexo::encodeRequest(*request)) == request);
+}
+
+void readAsIndex(std::string_view text) {
+    if (const auto answer = vexo::decodeAnswer(text))
+        expectThat(vexo::decodeAnswer(vexo::encodeAnswer(*answer)) == answer);
+}
+
+}  // namespace
+
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     const std::string_view message(reinterpret_cast<const char*>(data), size);
-    vexo::isGreeting(message);
-    vexo::decodeRequest(message);
-    // What was understood survives being written and read again.
-    if (const auto reply = vexo::decodeReply(message);
-        reply && vexo::decodeReply(vexo::encodeReply(*reply)) != reply)
-        std::abort();
-    if (const auto answer = vexo::decodeAnswer(message);
-        answer && vexo::decodeAnswer(vexo::encodeAnswer(*answer)) != answer)
-        std::abort();
+    readAsHost(message);
+    readAsReader(message);
+    readAsIndex(message);
     return 0;
 }

@@ -5,8 +5,9 @@
 #include <signal.h>
 #include <sys/socket.h>
 
+#include <algorithm>
+#include <array>
 #include <cerrno>
-#include <cstring>
 
 namespace reader {
 
@@ -23,14 +24,20 @@ void endWhenHostIsGone(int) {
     errno = interrupted;
 }
 
-platform::FileDescriptor descriptorIn(msghdr& header) {
+// The file and the memory.
+using Descriptors = std::array<platform::FileDescriptor, 2>;
+using ControlData = std::array<char, CMSG_SPACE(sizeof(int) * std::tuple_size_v<Descriptors>)>;
+
+Descriptors descriptorsIn(msghdr& header) {
+    Descriptors descriptors;
     const cmsghdr* control = CMSG_FIRSTHDR(&header);
-    if (!control || control->cmsg_level != SOL_SOCKET || control->cmsg_type != SCM_RIGHTS ||
-        control->cmsg_len != CMSG_LEN(sizeof(int)))
-        return {};
-    int number;
-    std::memcpy(&number, CMSG_DATA(control), sizeof number);
-    return platform::FileDescriptor(number);
+    if (!control || control->cmsg_level != SOL_SOCKET || control->cmsg_type != SCM_RIGHTS)
+        return descriptors;
+    const auto* numbers = reinterpret_cast<const int*>(CMSG_DATA(control));
+    const std::size_t count = (control->cmsg_len - CMSG_LEN(0)) / sizeof(int);
+    for (std::size_t i = 0; i < std::min(count, descriptors.size()); ++i)
+        descriptors[i] = platform::FileDescriptor(numbers[i]);
+    return descriptors;
 }
 
 ssize_t retried(auto call) {
@@ -63,21 +70,21 @@ void Channel::endWithHost() {
 std::optional<Job> Channel::receive() {
     std::string message(vexo::maximumMessageBytes, '\0');
     iovec content{message.data(), message.size()};
-    alignas(cmsghdr) char control[CMSG_SPACE(sizeof(int))];
+    alignas(cmsghdr) ControlData control;
     msghdr header{};
     header.msg_iov = &content;
     header.msg_iovlen = 1;
-    header.msg_control = control;
-    header.msg_controllen = sizeof control;
+    header.msg_control = control.data();
+    header.msg_controllen = control.size();
     const ssize_t size = retried([&] { return recvmsg(channel, &header, MSG_CMSG_CLOEXEC); });
     if (size <= 0)
         return std::nullopt;
-    platform::FileDescriptor file = descriptorIn(header);
+    Descriptors descriptors = descriptorsIn(header);
     message.resize(static_cast<std::size_t>(size));
     const auto request = vexo::decodeRequest(message);
     if (!request)
         return std::nullopt;
-    return Job{*request, std::move(file)};
+    return Job{*request, std::move(descriptors[0]), std::move(descriptors[1])};
 }
 
 bool Channel::send(const std::string& message) {

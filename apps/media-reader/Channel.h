@@ -9,10 +9,11 @@
 
 namespace reader {
 
-// A request with the file that it is about; without one when the host sent none.
+// A request with the file that it is about and the memory for a frame; without them when the host sent none.
 struct Job {
     vexo::ReaderRequest request;
     platform::FileDescriptor file;
+    platform::FileDescriptor memory;
 };
 
 class Channel {

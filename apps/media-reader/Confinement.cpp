@@ -10,8 +10,8 @@ namespace reader {
 
 namespace {
 
-// The standard three, the channel, and the one file that the host sends: FFmpeg can open nothing by itself.
-constexpr rlim_t openFiles = vexo::readerChannelDescriptor + 2;
+// The standard three, the channel, and the file and the memory that the host sends.
+constexpr rlim_t openFiles = vexo::readerChannelDescriptor + 3;
 constexpr rlim_t processorSecondsPerFile = 10;
 
 bool limit(int resource, rlim_t most) {

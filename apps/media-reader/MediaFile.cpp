@@ -1,6 +1,5 @@
 #include "apps/media-reader/MediaFile.h"
 
-#include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -20,13 +19,6 @@ constexpr int mostStreams = 64;
 constexpr const char* formats =
     "mov,matroska,avi,mpeg,mpegts,mpegvideo,dv,flv,live_flv,ogg,asf,mxf,gxf,rm,nut,"
     "mp3,aac,ac3,eac3,wav,w64,aiff,caf,flac,amr,au,ape,wv,tta";
-
-std::int64_t sizeOf(int descriptor) {
-    struct stat status;
-    if (fstat(descriptor, &status) != 0 || !S_ISREG(status.st_mode))
-        throw MediaError("no plain file");
-    return status.st_size;
-}
 
 void check(int result) {
     if (result >= 0)
@@ -52,8 +44,10 @@ void MediaFile::CloseFormat::operator()(AVFormatContext* format) const {
     avformat_close_input(&format);
 }
 
-MediaFile::MediaFile(int descriptor, std::uint64_t readLimit)
-    : descriptor_(descriptor), size_(sizeOf(descriptor)), allowance_(readLimit) {
+MediaFile::MediaFile(int descriptor, std::uint64_t size, std::uint64_t readLimit)
+    : descriptor_(descriptor), size_(static_cast<std::int64_t>(size)), allowance_(readLimit) {
+    if (size_ < 0)
+        throw MediaError("no plain file");
     makeContext();
     open();
 }

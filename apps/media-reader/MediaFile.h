@@ -20,11 +20,14 @@ class MediaFile {
   public:
     // Raises MediaError when the content is no movie or sound. The descriptor stays the caller's and must
     // stay open as long as the object lives. At most `readLimit` bytes are read.
-    MediaFile(int descriptor, std::uint64_t readLimit);
+    //
+    // The size is told by the caller, because looking at a file's status is more than the reader may do.
+    MediaFile(int descriptor, std::uint64_t size, std::uint64_t readLimit);
     MediaFile(const MediaFile&) = delete;
     MediaFile& operator=(const MediaFile&) = delete;
 
     const AVFormatContext& format() const { return *format_; }
+    AVFormatContext& format() { return *format_; }
 
   private:
     struct CloseIO {

@@ -1,13 +1,12 @@
 #include "apps/media-reader/MediaSummary.h"
 
 #include <algorithm>
-#include <cmath>
-#include <span>
 #include <string_view>
+
+#include "apps/media-reader/Tracks.h"
 
 extern "C" {
 #include <libavcodec/avcodec.h>
-#include <libavutil/display.h>
 #include <libavutil/parseutils.h>
 }
 
@@ -15,41 +14,14 @@ namespace reader {
 
 namespace {
 
-std::span<AVStream* const> streamsOf(const AVFormatContext& format) {
-    return {format.streams, format.nb_streams};
-}
-
-// A cover picture in a sound file is no video.
-bool isVideo(const AVStream& stream) {
-    return stream.codecpar->codec_type == AVMEDIA_TYPE_VIDEO &&
-           !(stream.disposition & (AV_DISPOSITION_ATTACHED_PIC | AV_DISPOSITION_TIMED_THUMBNAILS));
-}
-
-bool isSound(const AVStream& stream) {
-    return stream.codecpar->codec_type == AVMEDIA_TYPE_AUDIO;
-}
-
-const AVStream* firstVideo(const AVFormatContext& format) {
-    for (const AVStream* stream : streamsOf(format))
-        if (isVideo(*stream))
-            return stream;
-    return nullptr;
-}
-
-bool hasSound(const AVFormatContext& format) {
-    const auto streams = streamsOf(format);
-    return std::any_of(streams.begin(), streams.end(),
-                       [](const AVStream* stream) { return isSound(*stream); });
-}
-
 // The tracks of a program stream are woven into one another and count as one.
 bool isProgramStream(const AVFormatContext& format) {
     return format.iformat->name == std::string_view("mpeg");
 }
 
 std::vector<std::string> mediaTypesOf(const AVFormatContext& format) {
-    const bool video = firstVideo(format) != nullptr;
-    const bool sound = hasSound(format);
+    const bool video = firstTrack(format, isVideo) != nullptr;
+    const bool sound = firstTrack(format, isSound) != nullptr;
     if (!video && !sound)
         throw MediaError("neither picture nor sound in it");
     if (isProgramStream(format) && video)
@@ -64,7 +36,7 @@ std::vector<std::string> mediaTypesOf(const AVFormatContext& format) {
 
 std::vector<std::string> codecsOf(const AVFormatContext& format) {
     std::vector<std::string> codecs;
-    for (const AVStream* stream : streamsOf(format)) {
+    for (const AVStream* stream : tracksOf(format)) {
         if (!isVideo(*stream) && !isSound(*stream))
             continue;
         const std::string name = avcodec_get_name(stream->codecpar->codec_id);
@@ -74,22 +46,12 @@ std::vector<std::string> codecsOf(const AVFormatContext& format) {
     return codecs;
 }
 
-// Whether the picture is shown lying on its side.
-bool isTurned(const AVStream& stream) {
-    std::size_t size = 0;
-    const std::uint8_t* matrix = av_stream_get_side_data(&stream, AV_PKT_DATA_DISPLAYMATRIX, &size);
-    if (!matrix || size < 9 * sizeof(std::int32_t))
-        return false;
-    const double degrees = av_display_rotation_get(reinterpret_cast<const std::int32_t*>(matrix));
-    return std::isfinite(degrees) && std::lround(degrees / 90) % 2 != 0;
-}
-
 void setPixelSize(vexo::MediaProperties& properties, const AVStream& video) {
     int width = video.codecpar->width;
     int height = video.codecpar->height;
     if (width <= 0 || height <= 0)
         return;
-    if (isTurned(video))
+    if (quarterTurnsOf(video) % 2 != 0)
         std::swap(width, height);
     properties.pixelWidth = width;
     properties.pixelHeight = height;
@@ -118,7 +80,7 @@ vexo::MediaProperties summaryOf(const MediaFile& file) {
     properties.codecs = codecsOf(format);
     properties.durationSeconds = durationOf(format);
     properties.contentCreationDate = creationDateOf(format);
-    if (const AVStream* video = firstVideo(format))
+    if (const AVStream* video = firstTrack(format, isVideo))
         setPixelSize(properties, *video);
     return properties;
 }

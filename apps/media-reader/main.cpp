@@ -5,8 +5,10 @@
 
 #include "apps/media-reader/Channel.h"
 #include "apps/media-reader/Confinement.h"
+#include "apps/media-reader/FramePicture.h"
 #include "apps/media-reader/MediaFile.h"
 #include "apps/media-reader/MediaSummary.h"
+#include "apps/media-reader/SharedPixels.h"
 
 extern "C" {
 #include <libavutil/log.h>
@@ -17,10 +19,18 @@ namespace {
 
 constexpr std::size_t largestAllocation = 256u << 20;
 
-vexo::MediaReaderAnswer answerTo(const reader::Job& job) {
+vexo::FrameSize drawnFrame(const reader::Job& job, reader::MediaFile& file, int longestSide) {
+    const reader::SharedPixels memory(job.memory, longestSide);
+    return reader::drawFrame(reader::representativeFrame(file), longestSide, memory.pixels());
+}
+
+vexo::ReaderFindings findingsFor(const reader::Job& job) {
     reader::renewProcessorTime();
     try {
-        return reader::summaryOf(reader::MediaFile(job.file.number(), job.request.readLimit));
+        reader::MediaFile file(job.file.number(), job.request.fileSize, job.request.readLimit);
+        if (const auto longestSide = job.request.longestSide)
+            return drawnFrame(job, file, *longestSide);
+        return reader::summaryOf(file);
     } catch (const std::exception& error) {
         return vexo::MediaFailure{error.what()};
     }
@@ -30,7 +40,7 @@ vexo::MediaReaderAnswer answerTo(const reader::Job& job) {
 bool readNext() {
     std::string reply;
     if (const auto job = reader::Channel::receive())
-        reply = vexo::encodeReply({job->request.number, answerTo(*job)});
+        reply = vexo::encodeReply({job->request.number, findingsFor(*job)});
     return !reply.empty() && reader::Channel::send(reply);
 }
 
@@ -50,7 +60,7 @@ int main() {
     av_log_set_level(AV_LOG_QUIET);
     av_max_alloc(largestAllocation);
 
-    reader::Channel::send(vexo::encodeGreeting());
+    reader::Channel::send(vexo::encodeGreeting({"limits"}));
     while (readNext()) {
     }
     return 0;

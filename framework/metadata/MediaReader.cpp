@@ -1,6 +1,12 @@
 #include "framework/metadata/MediaReader.h"
 
-#include "framework/metadata/ReaderMessage.h"
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <array>
+
+#include "framework/metadata/FrameMemory.h"
+#include "framework/metadata/ReaderHelper.h"
 #include "framework/metadata/ReaderProcess.h"
 
 namespace vexo {
@@ -10,51 +16,93 @@ namespace {
 // Headers and indexes of even hours of film are far smaller.
 constexpr std::uint64_t readLimit = 256u << 20;
 
+// nil for what is no plain file.
+std::optional<ReaderRequest> requestAbout(int descriptor) {
+    struct stat status;
+    if (fstat(descriptor, &status) != 0 || !S_ISREG(status.st_mode))
+        return std::nullopt;
+    return ReaderRequest{.fileSize = static_cast<std::uint64_t>(status.st_size), .readLimit = readLimit};
+}
+
+MediaFailure noPlainFile() {
+    return {"it is no plain file", FailureCause::elsewhere};
+}
+
 }  // namespace
 
-ProcessMediaReader::ProcessMediaReader(Settings settings) : settings_(std::move(settings)) {}
-ProcessMediaReader::~ProcessMediaReader() = default;
+ProcessMediaReader::ProcessMediaReader(Settings settings)
+    : settings_(std::move(settings)), helper_(std::make_shared<ReaderHelper>(settings_)) {}
+
+ProcessMediaReader::~ProcessMediaReader() {
+    close();
+}
 
 MediaReaderAnswer ProcessMediaReader::read(int descriptor) {
-    platform::Locked lock(mutex_);
+    const auto request = requestAbout(descriptor);
+    if (!request)
+        return noPlainFile();
+    ReaderFindings findings = ask(*request, std::array{descriptor});
+    if (auto* properties = std::get_if<MediaProperties>(&findings))
+        return std::move(*properties);
+    return std::get<MediaFailure>(findings);
+}
+
+MediaFrameAnswer ProcessMediaReader::frame(int descriptor, int longestSide) {
+    auto request = requestAbout(descriptor);
+    if (!request)
+        return noPlainFile();
+    request->longestSide = std::clamp(longestSide, 1, largestFrameSide);
+    const FrameMemory memory(*request->longestSide);
+    if (!memory)
+        return MediaFailure{"there is no memory for a frame", FailureCause::elsewhere};
+    const ReaderFindings findings = ask(*request, std::array{descriptor, memory.descriptor()});
+    if (const auto* size = std::get_if<FrameSize>(&findings))
+        return memory.frame(*size);
+    return std::get<MediaFailure>(findings);
+}
+
+std::optional<std::vector<std::string>> ProcessMediaReader::confinement() {
+    platform::Locked lock(turn_);
+    if (!helper_->take())
+        return std::nullopt;
+    auto confinement = helper_->confinement();
+    helper_->putBack();
+    return confinement;
+}
+
+void ProcessMediaReader::close() {
+    helper_->close();
+}
+
+int ProcessMediaReader::startedHelpers() const {
+    return helper_->startedProcesses();
+}
+
+ReaderFindings ProcessMediaReader::ask(ReaderRequest request, std::span<const int> descriptors) {
+    platform::Locked lock(turn_);
     for (int attempt = 0; attempt < 2; ++attempt) {
-        if (!ensureStarted())
-            return MediaFailure{"cannot start " + settings_.program, FailureCause::elsewhere};
-        if (const auto answer = exchange(descriptor))
-            return *answer;
-        process_.reset();
+        const std::shared_ptr<ReaderProcess> process = helper_->take();
+        if (!process)
+            return notStarted();
+        request.number = ++lastRequest_;
+        if (auto findings = exchange(*process, request, descriptors)) {
+            helper_->putBack();
+            return std::move(*findings);
+        }
+        helper_->discard();
     }
+    if (helper_->isClosed())
+        return notStarted();
     return MediaFailure{"the media reader ended over the file"};
 }
 
-MediaFrameAnswer ProcessMediaReader::frame(int, int) {
-    return MediaFailure{"frames cannot be read yet", FailureCause::elsewhere};
-}
-
-bool ProcessMediaReader::ensureStarted() {
-    if (process_)
-        return true;
-    if (Clock::now() < earliestStart_)
-        return false;
-    process_ = ReaderProcess::start(settings_.program);
-    std::string greeting;
-    const bool greeted = process_ &&
-                         process_->receive(greeting, Clock::now() + settings_.startDeadline) ==
-                             ReaderProcess::Reception::message &&
-                         isGreeting(greeting);
-    if (greeted)
-        return true;
-    process_.reset();
-    earliestStart_ = Clock::now() + settings_.pauseAfterFailedStart;
-    return false;
-}
-
-std::optional<MediaReaderAnswer> ProcessMediaReader::exchange(int descriptor) {
-    const std::uint64_t number = ++lastRequest_;
-    if (!process_->send(encodeRequest({number, readLimit}), descriptor))
+std::optional<ReaderFindings> ProcessMediaReader::exchange(ReaderProcess& process,
+                                                           const ReaderRequest& request,
+                                                           std::span<const int> descriptors) {
+    if (!process.send(encodeRequest(request), descriptors))
         return std::nullopt;
     std::string message;
-    switch (process_->receive(message, Clock::now() + settings_.deadline)) {
+    switch (process.receive(message, std::chrono::steady_clock::now() + settings_.deadline)) {
         case ReaderProcess::Reception::ended:
             return std::nullopt;
         case ReaderProcess::Reception::late:
@@ -62,16 +110,20 @@ std::optional<MediaReaderAnswer> ProcessMediaReader::exchange(int descriptor) {
         case ReaderProcess::Reception::message:
             break;
     }
-    const auto reply = decodeReply(message);
-    if (!reply || reply->number != number)
+    auto reply = decodeReply(message);
+    if (!reply || !isReplyTo(request, *reply))
         return dismissed("the media reader's answer makes no sense");
-    return reply->answer;
+    return std::move(reply->findings);
 }
 
 // A reader that hangs or talks nonsense is not asked again.
-MediaReaderAnswer ProcessMediaReader::dismissed(std::string reason) {
-    process_.reset();
+ReaderFindings ProcessMediaReader::dismissed(std::string reason) {
+    helper_->discard();
     return MediaFailure{std::move(reason)};
+}
+
+MediaFailure ProcessMediaReader::notStarted() const {
+    return {helper_->isClosed() ? "stopped" : "cannot start " + settings_.program, FailureCause::elsewhere};
 }
 
 }  // namespace vexo

@@ -6,15 +6,20 @@
 
 #include <chrono>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <optional>
+#include <span>
 #include <string>
+#include <vector>
 
 #include "framework/metadata/MediaProperties.h"
+#include "framework/metadata/ReaderMessage.h"
 #include "platform/ThreadSafety.h"
 
 namespace vexo {
 
+class ReaderHelper;
 class ReaderProcess;
 
 class MediaReader {
@@ -25,8 +30,8 @@ class MediaReader {
     // plain file, and its position may be anywhere.
     virtual MediaReaderAnswer read(int descriptor) = 0;
 
-    // A representative picture of the movie behind `descriptor`, upright and in its shown proportions, scaled
-    // down to at most `longestSide` pixels a side. The descriptor is as above.
+    // A representative picture of the movie behind `descriptor`, upright and in its shown proportions,
+    // opaque, scaled down to at most `longestSide` pixels a side. The descriptor is as above.
     virtual MediaFrameAnswer frame(int descriptor, int longestSide) = 0;
 };
 
@@ -44,29 +49,44 @@ class ProcessMediaReader final : public MediaReader {
         // How long to do without after a helper could not be started, so that a broken installation does not
         // cost a start for each file.
         std::chrono::milliseconds pauseAfterFailedStart{10000};
+        // Runs a block once, on any thread, after the time for which an idle helper is kept; nil keeps it.
+        // The block may outlive the reader. Called by the threads that read and by such blocks, with at most
+        // one block waiting at a time; not for a reader that is closed.
+        std::function<void(std::function<void()>)> afterIdleTime = {};
     };
 
     explicit ProcessMediaReader(Settings settings);
     ~ProcessMediaReader() override;
 
     // Waits for the files that other threads have read before this one.
-    MediaReaderAnswer read(int descriptor) override VX_EXCLUDES(mutex_);
-    MediaFrameAnswer frame(int descriptor, int longestSide) override VX_EXCLUDES(mutex_);
+    MediaReaderAnswer read(int descriptor) override VX_EXCLUDES(turn_);
+    // A longest side beyond largestFrameSide counts as that.
+    MediaFrameAnswer frame(int descriptor, int longestSide) override VX_EXCLUDES(turn_);
+
+    // What the helper has given up so that a file that takes it over gains little, such as "seccomp"; starts
+    // a helper when none runs. nil when none can be started.
+    std::optional<std::vector<std::string>> confinement() VX_EXCLUDES(turn_);
+
+    // Ends the helper at once, for good; whoever is waiting for it, and whoever asks later, gets a failure
+    // that lies elsewhere.
+    void close();
+
+    // How many helpers were started so far.
+    int startedHelpers() const;
 
   private:
-    using Clock = std::chrono::steady_clock;
-
-    bool ensureStarted() VX_REQUIRES(mutex_);
+    ReaderFindings ask(ReaderRequest request, std::span<const int> descriptors) VX_EXCLUDES(turn_);
     // nil when the helper ended without an answer.
-    std::optional<MediaReaderAnswer> exchange(int descriptor) VX_REQUIRES(mutex_);
-    MediaReaderAnswer dismissed(std::string reason) VX_REQUIRES(mutex_);
+    std::optional<ReaderFindings> exchange(ReaderProcess& process, const ReaderRequest& request,
+                                           std::span<const int> descriptors) VX_REQUIRES(turn_);
+    ReaderFindings dismissed(std::string reason) VX_REQUIRES(turn_);
+    MediaFailure notStarted() const;
 
     const Settings settings_;
+    const std::shared_ptr<ReaderHelper> helper_;
 
-    platform::Mutex mutex_;
-    std::unique_ptr<ReaderProcess> process_ VX_GUARDED_BY(mutex_);
-    std::uint64_t lastRequest_ VX_GUARDED_BY(mutex_) = 0;
-    Clock::time_point earliestStart_ VX_GUARDED_BY(mutex_);
+    platform::Mutex turn_;  // held as long as the helper is at work, and while it is started
+    std::uint64_t lastRequest_ VX_GUARDED_BY(turn_) = 0;
 };
 
 // The helper's program: what VEXO_MEDIA_READER names, else "vexo-media-reader" beside the running program,

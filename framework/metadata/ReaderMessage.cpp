@@ -1,5 +1,6 @@
 #include "framework/metadata/ReaderMessage.h"
 
+#include <algorithm>
 #include <cmath>
 #include <nlohmann/json.hpp>
 
@@ -9,13 +10,26 @@ namespace {
 
 using Json = nlohmann::json;
 
-// So chosen that whatever is decoded fits into a message again.
+struct Range {
+    double least;
+    double greatest;
+
+    // False for what is no number.
+    bool contains(double number) const { return number >= least && number <= greatest; }
+};
+
+// So chosen that whatever is decoded fits into a message again, and any whole number into a double.
 constexpr std::size_t longestList = 16;
 constexpr std::size_t longestName = 48;
-constexpr std::size_t longestReason = 300;  // three times that once bad bytes have become U+FFFD
-constexpr int largestPixelCount = 1'000'000;
-constexpr double longestDuration = 1e9;  // some thirty years
-constexpr double farthestDate = 2.5e11;  // seconds to the year 9999, either way
+constexpr std::size_t longestText = 900;
+constexpr Range pixelCounts{1, 1e6};
+constexpr Range durations{0, 1e9};       // seconds, some thirty years
+constexpr Range dates{-2.5e11, 2.5e11};  // seconds to the year 9999, either way
+constexpr Range frameRates{1e-6, 1e6};   // a second
+constexpr Range channelCounts{1, 1024};
+constexpr Range sampleRates{1, 1e8};              // hertz
+constexpr Range bitRates{1, 1e15};                // bits a second
+constexpr Range frameSides{1, largestFrameSide};  // pixels
 
 // Raised and caught in this file.
 struct NotUnderstood {};
@@ -50,35 +64,99 @@ std::string printed(const Json& json) {
     return json.dump(-1, ' ', false, Json::error_handler_t::replace);
 }
 
+// --- Texts
+
+// Bytes that are no UTF-8 become U+FFFD.
+std::string wellFormed(const std::string& text) {
+    return Json::parse(printed(text)).get<std::string>();
+}
+
+bool isInsideCharacter(char byte) {
+    return (static_cast<unsigned char>(byte) & 0xC0) == 0x80;
+}
+
+std::string cutBetweenCharacters(std::string text, std::size_t longest) {
+    if (text.size() <= longest)
+        return text;
+    while (longest > 0 && isInsideCharacter(text[longest]))
+        --longest;
+    text.resize(longest);
+    return text;
+}
+
+std::string beginningOf(const std::string& text, std::size_t longest) {
+    // Bad bytes grow, so the rest of a very long text need not be looked at.
+    return cutBetweenCharacters(wellFormed(text.substr(0, longest + 4)), longest);
+}
+
+// The bytes of the control character that well-formed text has at `at`; 0 for any other.
+std::size_t controlCharacterAt(std::string_view text, std::size_t at) {
+    const auto byte = static_cast<unsigned char>(text[at]);
+    if (byte < 0x20 || byte == 0x7F)
+        return 1;
+    const bool isSecondSet = byte == 0xC2 && static_cast<unsigned char>(text[at + 1]) < 0xA0;
+    return isSecondSet ? 2 : 0;
+}
+
+bool hasControlCharacters(std::string_view text) {
+    for (std::size_t at = 0; at < text.size(); ++at)
+        if (controlCharacterAt(text, at) > 0)
+            return true;
+    return false;
+}
+
+std::string withoutControlCharacters(std::string_view text) {
+    std::string rest;
+    for (std::size_t at = 0; at < text.size();) {
+        const std::size_t size = controlCharacterAt(text, at);
+        if (size == 0)
+            rest += text[at];
+        at += std::max<std::size_t>(size, 1);
+    }
+    return rest;
+}
+
+// --- Decoding
+
 std::uint64_t naturalNumber(const Json& object, const char* key) {
     const auto found = object.find(key);
     require(found != object.end() && found->is_number_unsigned());
     return found->get<std::uint64_t>();
 }
 
-std::optional<double> real(const Json& object, const char* key, double least, double greatest) {
+std::optional<double> real(const Json& object, const char* key, const Range& range) {
     const auto found = object.find(key);
     if (found == object.end())
         return std::nullopt;
     require(found->is_number());
     const double number = found->get<double>();
-    require(std::isfinite(number) && number >= least && number <= greatest);
+    require(range.contains(number));
     return number;
 }
 
-std::optional<int> pixelCount(const Json& object, const char* key) {
+template <typename Number>
+std::optional<Number> whole(const Json& object, const char* key, const Range& range) {
     const auto found = object.find(key);
     if (found == object.end())
         return std::nullopt;
     require(found->is_number_unsigned());
-    const auto count = found->get<std::uint64_t>();
-    require(count >= 1 && count <= largestPixelCount);
-    return static_cast<int>(count);
+    const auto number = found->get<std::uint64_t>();
+    require(range.contains(static_cast<double>(number)));
+    return static_cast<Number>(number);
 }
 
 std::string text(const Json& json, std::size_t longest) {
     require(json.is_string() && json.get_ref<const std::string&>().size() <= longest);
     return json.get<std::string>();
+}
+
+std::optional<std::string> title(const Json& object, const char* key) {
+    const auto found = object.find(key);
+    if (found == object.end())
+        return std::nullopt;
+    std::string title = text(*found, longestText);
+    require(!title.empty() && !hasControlCharacters(title));
+    return title;
 }
 
 std::vector<std::string> names(const Json& object, const char* key) {
@@ -95,86 +173,145 @@ std::vector<std::string> names(const Json& object, const char* key) {
 MediaProperties propertiesIn(const Json& object) {
     MediaProperties properties;
     properties.mediaTypes = names(object, "mediaTypes");
-    properties.pixelWidth = pixelCount(object, "pixelWidth");
-    properties.pixelHeight = pixelCount(object, "pixelHeight");
-    properties.durationSeconds = real(object, "durationSeconds", 0, longestDuration);
+    properties.pixelWidth = whole<int>(object, "pixelWidth", pixelCounts);
+    properties.pixelHeight = whole<int>(object, "pixelHeight", pixelCounts);
+    properties.durationSeconds = real(object, "durationSeconds", durations);
     properties.codecs = names(object, "codecs");
-    properties.contentCreationDate = real(object, "contentCreationDate", -farthestDate, farthestDate);
+    properties.contentCreationDate = real(object, "contentCreationDate", dates);
+    properties.frameRate = real(object, "frameRate", frameRates);
+    properties.audioChannelCount = whole<int>(object, "audioChannelCount", channelCounts);
+    properties.audioSampleRate = whole<int>(object, "audioSampleRate", sampleRates);
+    properties.totalBitRate = whole<std::int64_t>(object, "totalBitRate", bitRates);
+    properties.title = title(object, "title");
+    properties.acquisitionMake = title(object, "acquisitionMake");
+    properties.acquisitionModel = title(object, "acquisitionModel");
     require(!properties.mediaTypes.empty());
     return properties;
+}
+
+FrameSize frameSizeIn(const Json& object) {
+    const auto width = whole<int>(object, "frameWidth", frameSides);
+    const auto height = whole<int>(object, "frameHeight", frameSides);
+    require(width && height);
+    return {*width, *height};
 }
 
 MediaReaderAnswer answerIn(const Json& object) {
     const auto failure = object.find("failure");
     if (failure == object.end())
         return propertiesIn(object);
-    return MediaFailure{text(*failure, 3 * longestReason), FailureCause::file};
+    return MediaFailure{text(*failure, longestText), FailureCause::file};
 }
 
+ReaderFindings findingsIn(const Json& object) {
+    if (object.contains("frameWidth"))
+        return frameSizeIn(object);
+    return std::visit([](auto&& either) -> ReaderFindings { return std::move(either); }, answerIn(object));
+}
+
+// --- Encoding
+
 template <typename Number>
-void put(Json& object, const char* key, const std::optional<Number>& number) {
-    if (number)
+void put(Json& object, const char* key, const std::optional<Number>& number, const Range& range) {
+    if (number && range.contains(static_cast<double>(*number)))
         object[key] = *number;
+}
+
+void put(Json& object, const char* key, const std::optional<std::string>& title) {
+    if (!title)
+        return;
+    const std::string clean = withoutControlCharacters(beginningOf(*title, longestText));
+    if (!clean.empty())
+        object[key] = clean;
 }
 
 Json beginningOf(const std::vector<std::string>& names) {
     Json list = Json::array();
     for (const std::string& name : names)
         if (list.size() < longestList)
-            list.push_back(name.substr(0, longestName));
+            list.push_back(beginningOf(name, longestName));
     return list;
 }
 
 Json objectOf(const MediaProperties& properties) {
     Json object{{"mediaTypes", beginningOf(properties.mediaTypes)},
                 {"codecs", beginningOf(properties.codecs)}};
-    put(object, "pixelWidth", properties.pixelWidth);
-    put(object, "pixelHeight", properties.pixelHeight);
-    put(object, "durationSeconds", properties.durationSeconds);
-    put(object, "contentCreationDate", properties.contentCreationDate);
+    put(object, "pixelWidth", properties.pixelWidth, pixelCounts);
+    put(object, "pixelHeight", properties.pixelHeight, pixelCounts);
+    put(object, "durationSeconds", properties.durationSeconds, durations);
+    put(object, "contentCreationDate", properties.contentCreationDate, dates);
+    put(object, "frameRate", properties.frameRate, frameRates);
+    put(object, "audioChannelCount", properties.audioChannelCount, channelCounts);
+    put(object, "audioSampleRate", properties.audioSampleRate, sampleRates);
+    put(object, "totalBitRate", properties.totalBitRate, bitRates);
+    put(object, "title", properties.title);
+    put(object, "acquisitionMake", properties.acquisitionMake);
+    put(object, "acquisitionModel", properties.acquisitionModel);
     return object;
 }
 
-Json objectOf(const MediaFailure& failure) {
-    return {{"failure", failure.reason.substr(0, longestReason)}};
+Json objectOf(const FrameSize& frame) {
+    return {{"frameWidth", frame.width}, {"frameHeight", frame.height}};
 }
 
-Json objectOf(const MediaReaderAnswer& answer) {
-    return std::visit([](const auto& either) { return objectOf(either); }, answer);
+Json objectOf(const MediaFailure& failure) {
+    return {{"failure", beginningOf(failure.reason, longestText)}};
+}
+
+template <typename... Kinds>
+Json objectOf(const std::variant<Kinds...>& either) {
+    return std::visit([](const auto& kind) { return objectOf(kind); }, either);
 }
 
 }  // namespace
 
-std::string encodeGreeting() {
-    return printed({{"mediaReader", readerProtocolVersion}});
+std::string encodeGreeting(const std::vector<std::string>& confinement) {
+    return printed({{"mediaReader", readerProtocolVersion}, {"confinement", beginningOf(confinement)}});
 }
 
-bool isGreeting(std::string_view message) {
-    const auto version =
-        decoded(message, [](const Json& object) { return naturalNumber(object, "mediaReader"); });
-    return version == readerProtocolVersion;
+std::optional<std::vector<std::string>> decodeGreeting(std::string_view message) {
+    return decoded(message, [](const Json& object) {
+        require(naturalNumber(object, "mediaReader") == readerProtocolVersion);
+        return names(object, "confinement");
+    });
 }
 
 std::string encodeRequest(const ReaderRequest& request) {
-    return printed({{"request", request.number}, {"readLimit", request.readLimit}});
+    Json object{
+        {"request", request.number}, {"fileSize", request.fileSize}, {"readLimit", request.readLimit}};
+    put(object, "longestSide", request.longestSide, frameSides);
+    return printed(object);
 }
 
 std::optional<ReaderRequest> decodeRequest(std::string_view message) {
     return decoded(message, [](const Json& object) {
-        return ReaderRequest{naturalNumber(object, "request"), naturalNumber(object, "readLimit")};
+        return ReaderRequest{naturalNumber(object, "request"), naturalNumber(object, "fileSize"),
+                             naturalNumber(object, "readLimit"),
+                             whole<int>(object, "longestSide", frameSides)};
     });
 }
 
 std::string encodeReply(const ReaderReply& reply) {
-    Json object = objectOf(reply.answer);
+    Json object = objectOf(reply.findings);
     object["request"] = reply.number;
     return printed(object);
 }
 
 std::optional<ReaderReply> decodeReply(std::string_view message) {
     return decoded(message, [](const Json& object) {
-        return ReaderReply{naturalNumber(object, "request"), answerIn(object)};
+        return ReaderReply{naturalNumber(object, "request"), findingsIn(object)};
     });
+}
+
+bool isReplyTo(const ReaderRequest& request, const ReaderReply& reply) {
+    if (reply.number != request.number)
+        return false;
+    if (std::holds_alternative<MediaFailure>(reply.findings))
+        return true;
+    const auto* frame = std::get_if<FrameSize>(&reply.findings);
+    if (!request.longestSide || !frame)
+        return !request.longestSide && !frame;
+    return std::max(frame->width, frame->height) <= *request.longestSide;
 }
 
 std::string encodeAnswer(const MediaReaderAnswer& answer) {

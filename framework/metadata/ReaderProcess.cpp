@@ -9,7 +9,6 @@
 
 #include <algorithm>
 #include <cerrno>
-#include <cstring>
 
 #include "framework/metadata/ReaderMessage.h"
 
@@ -82,20 +81,20 @@ bool waitUntilReadable(int descriptor, ReaderProcess::Deadline deadline) {
     return ready > 0;
 }
 
-// The control data that carries one descriptor.
+// A message with the control data that carries descriptors.
 class DescriptorMessage {
   public:
-    DescriptorMessage(std::string_view message, int descriptor)
+    DescriptorMessage(std::string_view message, ReaderProcess::Descriptors descriptors)
         : content_{const_cast<char*>(message.data()), message.size()} {
         header_.msg_iov = &content_;
         header_.msg_iovlen = 1;
         header_.msg_control = control_;
-        header_.msg_controllen = sizeof control_;
+        header_.msg_controllen = CMSG_SPACE(descriptors.size() * sizeof(int));
         cmsghdr* rights = CMSG_FIRSTHDR(&header_);
         rights->cmsg_level = SOL_SOCKET;
         rights->cmsg_type = SCM_RIGHTS;
-        rights->cmsg_len = CMSG_LEN(sizeof descriptor);
-        std::memcpy(CMSG_DATA(rights), &descriptor, sizeof descriptor);
+        rights->cmsg_len = CMSG_LEN(descriptors.size() * sizeof(int));
+        std::copy(descriptors.begin(), descriptors.end(), reinterpret_cast<int*>(CMSG_DATA(rights)));
     }
 
     const msghdr* header() const { return &header_; }
@@ -103,7 +102,7 @@ class DescriptorMessage {
   private:
     iovec content_;
     msghdr header_{};
-    alignas(cmsghdr) char control_[CMSG_SPACE(sizeof(int))] = {};
+    alignas(cmsghdr) char control_[CMSG_SPACE(ReaderProcess::mostDescriptors * sizeof(int))] = {};
 };
 
 }  // namespace
@@ -124,8 +123,12 @@ ReaderProcess::ReaderProcess(pid_t process, platform::FileDescriptor channel)
     : process_(process), channel_(std::move(channel)), processDescriptor_(pidfd_open(process, 0)) {}
 
 ReaderProcess::~ReaderProcess() {
-    kill(process_, SIGKILL);
+    end();
     reap();
+}
+
+void ReaderProcess::end() {
+    kill(process_, SIGKILL);
 }
 
 void ReaderProcess::reap() {
@@ -135,8 +138,8 @@ void ReaderProcess::reap() {
     waitpid(process_, nullptr, WNOHANG);
 }
 
-bool ReaderProcess::send(std::string_view message, int descriptor) {
-    const DescriptorMessage packet(message, descriptor);
+bool ReaderProcess::send(std::string_view message, Descriptors descriptors) {
+    const DescriptorMessage packet(message, descriptors.first(std::min(descriptors.size(), mostDescriptors)));
     ssize_t sent;
     do
         sent = sendmsg(channel_.number(), packet.header(), MSG_NOSIGNAL | MSG_DONTWAIT);

@@ -1,10 +1,11 @@
-// One running helper process and the channel to it. Belongs to one thread at a time.
+// One running helper process and the channel to it. Belongs to one thread at a time; any other may end it.
 #pragma once
 
 #include <sys/types.h>
 
 #include <chrono>
 #include <memory>
+#include <span>
 #include <string>
 #include <string_view>
 
@@ -16,6 +17,8 @@ class ReaderProcess {
   public:
     using Deadline = std::chrono::steady_clock::time_point;
     enum class Reception { message, ended, late };
+    using Descriptors = std::span<const int>;
+    static constexpr std::size_t mostDescriptors = 2;
 
     // nil when the program cannot be started.
     static std::unique_ptr<ReaderProcess> start(const std::string& program);
@@ -24,8 +27,12 @@ class ReaderProcess {
     ReaderProcess(const ReaderProcess&) = delete;
     ReaderProcess& operator=(const ReaderProcess&) = delete;
 
-    // False when the process is gone.
-    [[nodiscard]] bool send(std::string_view message, int descriptor);
+    // Kills the process and does not wait for it to go; whoever waits for a message hears that it ended.
+    // Callable from any thread.
+    void end();
+
+    // Sends at least one descriptor along with the message. False when the process is gone.
+    [[nodiscard]] bool send(std::string_view message, Descriptors descriptors);
     // Waits for one message, which is cut when it is longer than allowed.
     [[nodiscard]] Reception receive(std::string& message, Deadline deadline);
 

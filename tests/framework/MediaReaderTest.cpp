@@ -264,14 +264,14 @@ class RunningProgram {
 
 TEST(MediaReaderProgram, EndsWhenItsHostGoes) {
     RunningProgram program;
-    ASSERT_TRUE(isGreeting(program.receive()));
+    ASSERT_TRUE(decodeGreeting(program.receive()));
     program.closeChannel();
     EXPECT_EQ(program.exitStatus(), 0);
 }
 
 TEST(MediaReaderProgram, EndsWhenItsHostTalksNonsense) {
     RunningProgram program;
-    ASSERT_TRUE(isGreeting(program.receive()));
+    ASSERT_TRUE(decodeGreeting(program.receive()));
     program.send("nonsense");
     EXPECT_EQ(program.receive(), "");
     EXPECT_EQ(program.exitStatus(), 0);
@@ -279,20 +279,20 @@ TEST(MediaReaderProgram, EndsWhenItsHostTalksNonsense) {
 
 TEST(MediaReaderProgram, ARequestWithoutAFileFails) {
     const RunningProgram program;
-    ASSERT_TRUE(isGreeting(program.receive()));
-    program.send(encodeRequest({1, 1000}));
+    ASSERT_TRUE(decodeGreeting(program.receive()));
+    program.send(encodeRequest({1, 1000, 1000}));
     const auto reply = decodeReply(program.receive());
     ASSERT_TRUE(reply);
-    EXPECT_TRUE(std::holds_alternative<MediaFailure>(reply->answer));
+    EXPECT_TRUE(std::holds_alternative<MediaFailure>(reply->findings));
 }
 
 TEST(MediaReaderProgram, HasGivenUpWhatItDoesNotNeed) {
     const RunningProgram program;
-    ASSERT_TRUE(isGreeting(program.receive()));
+    ASSERT_TRUE(decodeGreeting(program.receive()));
     EXPECT_THAT(program.about("status"), testing::ContainsRegex("NoNewPrivs:\t1"));
     EXPECT_THAT(program.about("limits"), testing::ContainsRegex("Max core file size +0 +0 "));
     EXPECT_THAT(program.about("limits"), testing::ContainsRegex("Max file size +0 +0 "));
-    EXPECT_THAT(program.about("limits"), testing::ContainsRegex("Max open files +5 +5 "));
+    EXPECT_THAT(program.about("limits"), testing::ContainsRegex("Max open files +6 +6 "));
 }
 
 TEST(MediaReaderProgram, IsFoundBesideTheProgramUnlessAnotherIsNamed) {
@@ -313,7 +313,7 @@ constexpr const char* script = R"(#!/usr/bin/env python3
 import json, os, signal, socket
 open(__file__ + ".starts", "a").write("x")
 host = socket.socket(fileno=3)
-host.send(b'{"mediaReader": 1}')
+host.send(b'{"mediaReader": 2}')
 while True:
     message, files, _, _ = socket.recv_fds(host, 20000, 1)
     if not message:
@@ -446,8 +446,8 @@ TEST(ReaderMessage, AReplyReadsAsItWasWritten) {
     const ReaderReply failure{8, MediaFailure{"no movie"}};
     EXPECT_EQ(decodeReply(encodeReply(movie)), movie);
     EXPECT_EQ(decodeReply(encodeReply(failure)), failure);
-    EXPECT_EQ(decodeRequest(encodeRequest({9, 10})), (ReaderRequest{9, 10}));
-    EXPECT_TRUE(isGreeting(encodeGreeting()));
+    EXPECT_EQ(decodeRequest(encodeRequest({9, 10, 11})), (ReaderRequest{9, 10, 11}));
+    EXPECT_TRUE(decodeGreeting(encodeGreeting({})));
 }
 
 TEST(ReaderMessage, WhatIsLongIsCutAndStillUnderstood) {
@@ -471,5 +471,5 @@ TEST(ReaderMessage, NonsenseIsNotUnderstood) {
         EXPECT_FALSE(decodeReply(message)) << message;
     EXPECT_FALSE(decodeReply(std::string(maximumMessageBytes, '[')));
     EXPECT_FALSE(decodeReply(R"({"request":1,"failure":"x"})" + std::string(maximumMessageBytes, ' ')));
-    EXPECT_FALSE(isGreeting(R"({"mediaReader":2})"));
+    EXPECT_FALSE(decodeGreeting(R"({"mediaReader":1})"));
 }
