@@ -10,6 +10,7 @@
 #include "framework/metadata/FileTypes.h"
 #include "framework/metadata/MediaReader.h"
 #include "framework/metadata/MetadataIndex.h"
+#include "framework/metadata/MetadataPrefetcher.h"
 #include "framework/metadata/MetadataStore.h"
 #include "framework/thumbnails/Thumbnailer.h"
 #include "host/VXConstants.h"
@@ -27,6 +28,8 @@ namespace vexo {
 namespace {
 
 constexpr const char* processDefaultsDomain = "com.vexo.browser";
+// Starting a media reader takes longer than reading most movies, and an idle one holds some megabytes.
+constexpr std::chrono::seconds idleReaderTime{30};
 
 std::optional<std::string> chosenHome(const HostOptions& options) {
     return options.homeDirectory ? options.homeDirectory : platform::LinuxFileManager::userHomeDirectory();
@@ -39,7 +42,18 @@ std::string preferencesFolder(const std::optional<std::string>& home) {
 }
 
 std::shared_ptr<ProcessMediaReader> newMediaReader() {
-    return std::make_shared<ProcessMediaReader>(ProcessMediaReader::Settings{mediaReaderProgram()});
+    ProcessMediaReader::Settings settings{mediaReaderProgram()};
+    settings.afterIdleTime = [](std::function<void()> block) {
+        platform::services().dispatcher.afterInBackground(idleReaderTime, std::move(block));
+    };
+    return std::make_shared<ProcessMediaReader>(std::move(settings));
+}
+
+std::shared_ptr<MetadataPrefetcher> newPrefetcher(const std::shared_ptr<ProcessMediaReader>& reader) {
+    const auto metadata = std::make_shared<MetadataStore>(MetadataIndex::defaultPath(), reader);
+    return std::make_shared<MetadataPrefetcher>([metadata](const std::string& path) {
+        metadata->propertiesForFile(path)->valueForKey(kMDItemMediaTypes);
+    });
 }
 
 }  // namespace
@@ -47,8 +61,8 @@ std::shared_ptr<ProcessMediaReader> newMediaReader() {
 // In order of construction. The dispatcher is taken down first of all, by the host, while everything that its
 // work uses is still there.
 struct Host::State {
-    explicit State(const HostOptions& options)
-        : pluginBundles(options.pluginBundles),
+    explicit State(const HostOptions& hostOptions)
+        : options(hostOptions),
           home(chosenHome(options)),
           log("vexo", options.verbosity == Verbosity::verbose
                           ? platform::LinuxSystemLog::StandardError::copies
@@ -57,8 +71,10 @@ struct Host::State {
           workspace(mounts),
           userDefaults(preferencesFolder(home), processDefaultsDomain, &log),
           diagnostics(log, options.verbosity),
-          metadata(MetadataIndex::defaultPath(), newMediaReader()),
+          reader(newMediaReader()),
           backgroundReader(newMediaReader()),
+          metadata(MetadataIndex::defaultPath(), reader),
+          prefetcher(options.prefetchesMetadata ? newPrefetcher(backgroundReader) : nullptr),
           thumbnails(ThumbnailMaker(ThumbnailCache(ThumbnailCache::defaultFolder()), backgroundReader)),
           images([this](const std::string& path) { return metadata.supportedMovieFile(path); }),
           dispatcher(std::make_unique<platform::LinuxDispatcher>(log)),
@@ -68,7 +84,7 @@ struct Host::State {
                                          std::exception_ptr failure) { recoverFrom(failure, block); });
     }
 
-    const std::vector<std::string> pluginBundles;
+    const HostOptions options;
     const std::optional<std::string> home;
     platform::LinuxSystemLog log;
     platform::SystemMountTable mounts;
@@ -78,9 +94,11 @@ struct Host::State {
     platform::NotificationCenter notifications;
     Diagnostics diagnostics;
     PathWatcher pathWatcher;
-    MetadataStore metadata;
+    const std::shared_ptr<ProcessMediaReader> reader;
     // Nobody waits for what it reads, so a property that somebody waits for never stands behind that.
     const std::shared_ptr<ProcessMediaReader> backgroundReader;
+    MetadataStore metadata;
+    const std::shared_ptr<MetadataPrefetcher> prefetcher;  // nil where nothing is prefetched
     Thumbnailer thumbnails;
     ImageManager images;
     std::unique_ptr<platform::LinuxDispatcher> dispatcher;
@@ -95,14 +113,19 @@ Host::~Host() {
     for (const LoadedPlugin& plugin : state_->plugins)
         plugin.manager->close();
     state_->thumbnails.close();
+    if (state_->prefetcher)
+        state_->prefetcher->close();
+    // Nobody waits for a movie any more.
+    state_->reader->close();
+    state_->backgroundReader->close();
     for (const LoadedPlugin& plugin : state_->plugins)
         plugin.manager->waitUntilLoaded();
     state_->dispatcher.reset();
 }
 
 std::optional<std::string> Host::loadPlugins() {
-    const bool named = !state_->pluginBundles.empty();
-    for (const std::string& bundlePath : pluginBundles(state_->pluginBundles)) {
+    const bool named = !state_->options.pluginBundles.empty();
+    for (const std::string& bundlePath : pluginBundles(state_->options.pluginBundles)) {
         const std::optional<std::string> problem = loadPlugin(bundlePath);
         if (problem && named)
             return problem;
@@ -132,6 +155,10 @@ std::optional<std::string> Host::loadPlugin(const std::string& bundlePath) {
     runGuarded([&] { manager = principalClass->newObject(opened.bundle); });
     if (!manager)
         return "the plug-in '" + bundlePath + "' could not be initialised";
+    if (state_->prefetcher)
+        manager->addTreeObserver(
+            state_->prefetcher,
+            [&prefetcher = *state_->prefetcher](const VXMediaGroupRef& root) { prefetcher.prefetch(root); });
     state_->plugins.push_back({std::move(opened.bundle), principalClass, std::move(manager)});
     return std::nullopt;
 }
@@ -156,6 +183,16 @@ bool Host::waitUntilLoaded(std::chrono::nanoseconds atMost) const {
 void Host::cancelLoading() {
     for (const LoadedPlugin& plugin : state_->plugins)
         plugin.manager->cancelLoad();
+    if (state_->prefetcher)
+        state_->prefetcher->cancel();
+}
+
+const MetadataStore& Host::metadata() const {
+    return state_->metadata;
+}
+
+std::optional<std::vector<std::string>> Host::mediaReaderConfinement() {
+    return state_->reader->confinement();
 }
 
 Diagnostics& Host::diagnostics() {

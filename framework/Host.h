@@ -16,6 +16,7 @@
 
 namespace vexo {
 
+class MetadataStore;
 class PathWatcher;
 
 struct HostOptions {
@@ -24,6 +25,9 @@ struct HostOptions {
     // Bundle folders to load instead of those found in the usual places.
     std::vector<std::string> pluginBundles;
     Verbosity verbosity = Verbosity::normal;
+    // Whether the index learns of every movie of a loaded tree while nobody waits for it. For programs that
+    // stay.
+    bool prefetchesMetadata = false;
 };
 
 // A plug-in that was loaded; no field is nil.
@@ -50,11 +54,14 @@ class Host {
     void startLoading();
     // Waits until no plug-in loads, `atMost` as long. Answers whether that is so.
     bool waitUntilLoaded(std::chrono::nanoseconds atMost) const;
-    // Asks the loads in progress to stop.
+    // Asks the loads in progress to stop, and the work that followed earlier ones.
     void cancelLoading();
 
     Diagnostics& diagnostics();
     const PathWatcher& pathWatcher() const;
+    const MetadataStore& metadata() const;
+    // What the program that reads movies has given up, in words for people; nil when it cannot be started.
+    std::optional<std::vector<std::string>> mediaReaderConfinement();
 
     // Files that people may want to look at; they need not exist.
     std::string suitePreferencesPath() const;

@@ -23,18 +23,25 @@ struct Arguments {
     bool verbose = false;
     bool json = false;
     TreeOptions tree;
+    std::vector<std::string> files;
     std::string demoFolder;
 };
 
-// The commands that need a host are kept apart from those that don't.
-using HostCommand = std::function<Problem(Host&)>;
+// What a command needs to be there before it runs.
+enum class Needs { plugins, hostAlone };
+
+// A command that needs a host. Those that don't are kept apart.
+struct HostCommand {
+    Needs needs;
+    std::function<Problems(Host&)> run;
+};
 
 struct Parser {
     explicit Parser(Arguments& arguments);
 
     CLI::App app;
-    HostCommand hostCommand;                // the command that was named, if it needs a host
-    std::function<Problem()> plainCommand;  // else
+    std::optional<HostCommand> hostCommand;  // the command that was named, if it needs a host
+    std::function<Problems()> plainCommand;  // else
 
   private:
     CLI::App* addCommand(const std::string& name, const std::string& summary);
@@ -74,19 +81,33 @@ Parser::Parser(Arguments& arguments)
         ->check(wholeNumber);
     tree->callback([this, &arguments] {
         arguments.tree.format = format(arguments);
-        hostCommand = [&arguments](Host& host) { return runTree(host, arguments.tree, std::cout); };
+        hostCommand = {Needs::plugins,
+                       [&arguments](Host& host) { return runTree(host, arguments.tree, std::cout); }};
     });
 
     CLI::App* info = addCommand("info", "Print the plug-ins found and what they say of themselves");
     info->add_flag("--json", arguments.json, "Print JSON");
     info->callback([this, &arguments] {
-        hostCommand = [&arguments](Host& host) { return runInfo(host, format(arguments), std::cout); };
+        hostCommand = {Needs::plugins, [&arguments](Host& host) {
+                           return runInfo(host, {format(arguments), arguments.verbose}, std::cout);
+                       }};
     });
 
     CLI::App* locations = addCommand("locations", "Print every folder that is looked at for libraries");
     locations->add_flag("--json", arguments.json, "Print JSON");
     locations->callback([this, &arguments] {
-        hostCommand = [&arguments](Host& host) { return runLocations(host, format(arguments), std::cout); };
+        hostCommand = {Needs::plugins,
+                       [&arguments](Host& host) { return runLocations(host, format(arguments), std::cout); }};
+    });
+
+    CLI::App* metadata =
+        addCommand("metadata", "Print what is known of files: size, duration, type and more");
+    metadata->add_flag("--json", arguments.json, "Print JSON");
+    metadata->add_option("FILE", arguments.files, "The files; movies as a rule")->required();
+    metadata->callback([this, &arguments] {
+        hostCommand = {Needs::hostAlone, [&arguments](Host& host) {
+                           return runMetadata(host, arguments.files, format(arguments), std::cout);
+                       }};
     });
 
     CLI::App* demo = addCommand("demo", "Make a small, complete sample home with real movies");
@@ -101,9 +122,13 @@ CLI::App* Parser::addCommand(const std::string& name, const std::string& summary
     return app.add_subcommand(name, summary)->fallthrough();
 }
 
-int report(const std::string& problem, int status) {
+void report(const std::string& problem) {
     std::cerr << "vexo: " << printable(problem) << std::endl;
-    return status;
+}
+
+int refuse(const std::string& problem) {
+    report(problem);
+    return statusWrongLine;
 }
 
 Problem checkHome(Arguments& arguments) {
@@ -119,9 +144,17 @@ Problem checkHome(Arguments& arguments) {
     return std::nullopt;
 }
 
-Problem runWithHost(const HostCommand& command, Arguments& arguments) {
-    if (const Problem problem = checkHome(arguments))
+Problem loadPlugins(Host& host) {
+    if (Problem problem = host.loadPlugins())
         return problem;
+    if (host.plugins().empty())
+        return "no plug-in was found; name one with --plugin BUNDLE, or its folder in VEXO_PLUGIN_PATH";
+    return std::nullopt;
+}
+
+Problems runWithHost(const HostCommand& command, Arguments& arguments) {
+    if (const Problem problem = checkHome(arguments))
+        return {*problem};
     HostOptions options;
     options.homeDirectory = arguments.home;
     options.pluginBundles = arguments.plugins;
@@ -130,11 +163,8 @@ Problem runWithHost(const HostCommand& command, Arguments& arguments) {
     // A verbose host's log shows warnings already.
     if (!arguments.quiet && !arguments.verbose)
         host.diagnostics().setWarningHandler([](const std::string& warning) { showWarning(warning); });
-    if (const Problem problem = host.loadPlugins())
-        return problem;
-    if (host.plugins().empty())
-        return "no plug-in was found; name one with --plugin BUNDLE, or its folder in VEXO_PLUGIN_PATH";
-    return command(host);
+    const Problem problem = command.needs == Needs::plugins ? loadPlugins(host) : std::nullopt;
+    return problem ? Problems{*problem} : command.run(host);
 }
 
 }  // namespace
@@ -148,22 +178,21 @@ int runCommandLine(int argc, char** argv) {
         return parser.app.exit(answer);
     } catch (const CLI::ExtrasError&) {
         const std::vector<std::string> unknown = parser.app.remaining(/*recurse=*/true);
-        return report(
-            "'" + unknown.front() + "' is no option or command that belongs here; try 'vexo --help'",
-            statusWrongLine);
+        return refuse("'" + unknown.front() +
+                      "' is no option or command that belongs here; try 'vexo --help'");
     } catch (const CLI::ParseError& error) {
-        return report(std::string(error.what()) + "; try 'vexo --help'", statusWrongLine);
+        return refuse(std::string(error.what()) + "; try 'vexo --help'");
     }
 
     if (!parser.hostCommand && !parser.plainCommand)
-        return report("no command was given; try 'vexo --help'", statusWrongLine);
-    const Problem problem =
-        parser.hostCommand ? runWithHost(parser.hostCommand, arguments) : parser.plainCommand();
-    if (problem)
-        return report(*problem, statusFailed);
+        return refuse("no command was given; try 'vexo --help'");
+    Problems problems =
+        parser.hostCommand ? runWithHost(*parser.hostCommand, arguments) : parser.plainCommand();
     if (!std::cout.flush())
-        return report("the answer cannot be written to standard output", statusFailed);
-    return statusDone;
+        problems.push_back("the answer cannot be written to standard output");
+    for (const std::string& problem : problems)
+        report(problem);
+    return problems.empty() ? statusDone : statusFailed;
 }
 
 }  // namespace vexo

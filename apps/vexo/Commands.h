@@ -1,9 +1,10 @@
-// The commands of vexo. Each writes its answer to `out` and answers what went wrong, nil when nothing did.
+// The commands of vexo. Each writes its answer to `out` and answers what went wrong.
 #pragma once
 
 #include <optional>
 #include <ostream>
 #include <string>
+#include <vector>
 
 #include "framework/Host.h"
 
@@ -13,6 +14,8 @@ enum class OutputFormat { text, json };
 
 // What is wrong, and where there is something, what to do about it. One line.
 using Problem = std::optional<std::string>;
+// Of a command that goes on after a problem with one of several things; empty when all went well.
+using Problems = std::vector<std::string>;
 
 struct TreeOptions {
     OutputFormat format = OutputFormat::text;
@@ -20,10 +23,18 @@ struct TreeOptions {
     std::optional<int> depth;   // levels below the root; nil for all
 };
 
-Problem runTree(Host& host, const TreeOptions& options, std::ostream& out);
-Problem runInfo(Host& host, OutputFormat format, std::ostream& out);
-Problem runLocations(Host& host, OutputFormat format, std::ostream& out);
+struct InfoOptions {
+    OutputFormat format = OutputFormat::text;
+    bool withMediaReader = false;  // start the program that reads movies and ask what it has given up
+};
+
+Problems runTree(Host& host, const TreeOptions& options, std::ostream& out);
+Problems runInfo(Host& host, const InfoOptions& options, std::ostream& out);
+Problems runLocations(Host& host, OutputFormat format, std::ostream& out);
+// Needs no plug-in.
+Problems runMetadata(Host& host, const std::vector<std::string>& files, OutputFormat format,
+                     std::ostream& out);
 // Needs no host: writes a sample home into `folder`.
-Problem runDemo(const std::string& folder, std::ostream& out);
+Problems runDemo(const std::string& folder, std::ostream& out);
 
 }  // namespace vexo

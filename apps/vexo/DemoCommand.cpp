@@ -32,12 +32,12 @@ void print(const DemoHome& home, std::ostream& out) {
 
 }  // namespace
 
-Problem runDemo(const std::string& folder, std::ostream& out) {
+Problems runDemo(const std::string& folder, std::ostream& out) {
     const DemoHomeResult made = makeDemoHome(folder, DemoMovieMaker());
     if (!made.home)
-        return printable(made.error);  // stays one line whatever the folder is called
+        return {printable(made.error)};  // stays one line whatever the folder is called
     print(*made.home, out);
-    return std::nullopt;
+    return {};
 }
 
 }  // namespace vexo

@@ -1,6 +1,9 @@
+#include <fmt/format.h>
+
 #include "apps/vexo/Commands.h"
 #include "apps/vexo/Json.h"
 #include "apps/vexo/Terminal.h"
+#include "framework/metadata/MediaReader.h"
 
 namespace vexo {
 namespace {
@@ -20,23 +23,38 @@ Json jsonPlugin(const LoadedPlugin& plugin) {
             {"appInstalled", manager.appInstalled()}};
 }
 
-void printJson(Host& host, std::ostream& out) {
+Json jsonMediaReader(Host& host) {
+    const auto confinement = host.mediaReaderConfinement();
+    return {{"program", jsonText(mediaReaderProgram())},
+            {"confinement", confinement ? Json(*confinement) : Json()}};
+}
+
+void printJson(Host& host, const InfoOptions& options, std::ostream& out) {
     Json plugins = Json::array();
     for (const LoadedPlugin& plugin : host.plugins())
         plugins.push_back(jsonPlugin(plugin));
-    out << Json{{"plugins", plugins},
-                {"suitePreferences", jsonText(host.suitePreferencesPath())},
-                {"userDefaults", jsonText(host.userDefaultsPath())},
-                {"index", jsonText(host.metadataIndexPath())}}
-               .dump(2)
-        << "\n";
+    Json json{{"plugins", plugins},
+              {"suitePreferences", jsonText(host.suitePreferencesPath())},
+              {"userDefaults", jsonText(host.userDefaultsPath())},
+              {"index", jsonText(host.metadataIndexPath())}};
+    if (options.withMediaReader)
+        json["mediaReader"] = jsonMediaReader(host);
+    out << json.dump(2) << "\n";
 }
 
 const char* yesOrNo(bool answer) {
     return answer ? "yes" : "no";
 }
 
-void printText(Host& host, std::ostream& out) {
+void printMediaReader(Host& host, std::ostream& out) {
+    const auto confinement = host.mediaReaderConfinement();
+    out << "Media reader       " << printable(mediaReaderProgram()) << "\n"
+        << "  confined by      "
+        << (confinement ? fmt::format("{}", fmt::join(*confinement, ", ")) : "(it cannot be started)")
+        << "\n";
+}
+
+void printText(Host& host, const InfoOptions& options, std::ostream& out) {
     const OutputStyle style = OutputStyle::ofStandardOutput();
     for (const LoadedPlugin& plugin : host.plugins()) {
         VXMediaManager& manager = *plugin.manager;
@@ -50,16 +68,18 @@ void printText(Host& host, std::ostream& out) {
     out << "Suite preferences  " << printable(host.suitePreferencesPath()) << "\n"
         << "User defaults      " << printable(host.userDefaultsPath()) << "\n"
         << "Metadata index     " << printable(host.metadataIndexPath()) << "\n";
+    if (options.withMediaReader)
+        printMediaReader(host, out);
 }
 
 }  // namespace
 
-Problem runInfo(Host& host, OutputFormat format, std::ostream& out) {
-    if (format == OutputFormat::json)
-        printJson(host, out);
+Problems runInfo(Host& host, const InfoOptions& options, std::ostream& out) {
+    if (options.format == OutputFormat::json)
+        printJson(host, options, out);
     else
-        printText(host, out);
-    return std::nullopt;
+        printText(host, options, out);
+    return {};
 }
 
 }  // namespace vexo

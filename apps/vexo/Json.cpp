@@ -75,6 +75,13 @@ Json JsonTreeWriter::groupAlone(const VXMediaGroupRef& group) {
             {"noDataMessage", jsonText(noDataMessage(manager_, group))}};
 }
 
+Json JsonTreeWriter::mediaGroups() {
+    Json groups = Json::array();
+    for (const VXMediaGroupRef& group : manager_.mediaGroups())
+        groups.push_back(groupAlone(group));
+    return groups;
+}
+
 Json JsonTreeWriter::group(const VXMediaGroupRef& group, std::optional<int> depth) {
     Json json = groupAlone(group);
     Json& mediaObjects = json["mediaObjects"] = Json::array();

@@ -20,7 +20,8 @@ Json jsonValues(const platform::Dictionary& values);
 
 enum class MetadataOutput { leaveOut, include };
 
-// Writes the groups of one run. Numbers objects and images by identity: the same number for the same object.
+// Writes the groups of one run. Numbers objects and images by identity: the same number for the same object,
+// for as long as that lives.
 class JsonTreeWriter {
   public:
     JsonTreeWriter(VXMediaManager& manager, MetadataOutput metadata)
@@ -30,22 +31,36 @@ class JsonTreeWriter {
     Json group(const VXMediaGroupRef& group, std::optional<int> depth);
     // The group without its items and children.
     Json groupAlone(const VXMediaGroupRef& group);
+    // `mediaGroups` of the plug-in, each without its items and children.
+    Json mediaGroups();
 
   private:
     Json object(const VXMediaObjectRef& mediaObject);
     Json image(const platform::ImageRef& image);
     void addMetadata(Json& json, const VXMediaObject& mediaObject);
 
-    // Numbers things by their address, which stays theirs because they are kept.
+    // No number is given twice. A thing that is gone is remembered until the next ones are numbered by the
+    // thousand, so that a program that runs for weeks does not collect them.
     template <typename T>
     class Numbers {
       public:
         int of(const std::shared_ptr<T>& thing) {
-            return numbers_.emplace(thing, static_cast<int>(numbers_.size()) + 1).first->second;
+            if (numbers_.size() >= 2 * living_)
+                forgetGone();
+            const auto [entry, isNew] = numbers_.try_emplace(thing, last_ + 1);
+            last_ += isNew ? 1 : 0;
+            return entry->second;
         }
 
       private:
-        std::map<std::shared_ptr<T>, int> numbers_;
+        void forgetGone() {
+            std::erase_if(numbers_, [](const auto& entry) { return entry.first.expired(); });
+            living_ = std::max<std::size_t>(numbers_.size(), 1000);
+        }
+
+        std::map<std::weak_ptr<T>, int, std::owner_less<>> numbers_;
+        int last_ = 0;
+        std::size_t living_ = 1000;  // at the last look, or the least that is worth one
     };
 
     VXMediaManager& manager_;

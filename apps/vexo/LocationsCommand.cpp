@@ -94,13 +94,13 @@ void printText(Host& host, std::ostream& out) {
 
 }  // namespace
 
-Problem runLocations(Host& host, OutputFormat format, std::ostream& out) {
+Problems runLocations(Host& host, OutputFormat format, std::ostream& out) {
     loadWithProgress(host);
     if (format == OutputFormat::json)
         printJson(host, out);
     else
         printText(host, out);
-    return std::nullopt;
+    return {};
 }
 
 }  // namespace vexo

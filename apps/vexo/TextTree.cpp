@@ -5,6 +5,8 @@
 
 #include <cmath>
 
+#include "apps/vexo/Json.h"
+
 namespace vexo {
 namespace {
 
@@ -193,6 +195,13 @@ void TextTree::print(std::ostream& out, const OutputStyle& style) const {
         out << style.dim(row.guide) << (row.emphasis == Emphasis::group ? style.bold(name) : name) << filler
             << style.accent(details) << "\n";
     }
+}
+
+void printTree(VXMediaManager& manager, const VXMediaGroupRef& root, const TextTreeOptions& options,
+               const OutputStyle& style, std::ostream& out) {
+    TextTree(root, options).print(out, style);
+    if (const auto message = noDataMessage(manager, root))
+        out << printable(*message) << "\nRun 'vexo locations' to see where libraries are looked for.\n";
 }
 
 }  // namespace vexo

@@ -9,7 +9,7 @@
 #include <vector>
 
 #include "apps/vexo/Terminal.h"
-#include "host/VXMediaGroup.h"
+#include "host/VXMediaManager.h"
 
 namespace vexo {
 
@@ -56,5 +56,9 @@ class TextTree {
     const TextTreeOptions options_;
     std::vector<Row> rows_;
 };
+
+// Prints a plug-in's tree, and what the plug-in has to say where it is empty.
+void printTree(VXMediaManager& manager, const VXMediaGroupRef& root, const TextTreeOptions& options,
+               const OutputStyle& style, std::ostream& out);
 
 }  // namespace vexo

@@ -20,9 +20,7 @@ Json jsonPlugin(const LoadedPlugin& plugin, const TreeOptions& options) {
               {"appInstalled", manager.appInstalled()},
               {"defaultNoDataMessage", jsonText(noDataMessage(manager, root))},
               {"root", root ? writer.group(root, options.depth) : Json()}};
-    Json& mediaGroups = json["mediaGroups"] = Json::array();
-    for (const VXMediaGroupRef& group : manager.mediaGroups())
-        mediaGroups.push_back(writer.groupAlone(group));
+    json["mediaGroups"] = writer.mediaGroups();
     return json;
 }
 
@@ -39,25 +37,22 @@ void printJson(Host& host, const TreeOptions& options, std::ostream& out) {
 void printText(Host& host, const TreeOptions& options, std::ostream& out) {
     const OutputStyle style = OutputStyle::ofStandardOutput();
     for (const LoadedPlugin& plugin : host.plugins()) {
-        const VXMediaGroupRef root = plugin.manager->rootMediaGroup();
-        if (!root)
-            continue;
-        const TextTree tree(root, {options.depth, options.withMetadata});
-        tree.print(out, style);
-        if (const auto message = noDataMessage(*plugin.manager, root))
-            out << printable(*message) << "\nRun 'vexo locations' to see where libraries are looked for.\n";
+        if (const VXMediaGroupRef root = plugin.manager->rootMediaGroup())
+            printTree(*plugin.manager, root, {options.depth, options.withMetadata}, style, out);
     }
 }
 
 }  // namespace
 
-Problem runTree(Host& host, const TreeOptions& options, std::ostream& out) {
+Problems runTree(Host& host, const TreeOptions& options, std::ostream& out) {
     loadWithProgress(host);
+    if (options.withMetadata)
+        readMetadataWithProgress(host);
     if (options.format == OutputFormat::json)
         printJson(host, options, out);
     else
         printText(host, options, out);
-    return std::nullopt;
+    return {};
 }
 
 }  // namespace vexo
