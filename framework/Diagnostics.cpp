@@ -8,17 +8,14 @@
 namespace vexo {
 
 void Diagnostics::warn(const std::string& warning) {
-    WarningHandler handler;
     {
         platform::Locked lock(mutex_);
         if (std::find(warnings_.begin(), warnings_.end(), warning) != warnings_.end())
             return;
         warnings_.push_back(warning);
-        handler = handler_;
     }
     log_.log(warning);
-    if (handler)
-        handler(warning);
+    observers_.notify(warning);
 }
 
 std::vector<std::string> Diagnostics::warnings() const {
@@ -26,9 +23,8 @@ std::vector<std::string> Diagnostics::warnings() const {
     return warnings_;
 }
 
-void Diagnostics::setWarningHandler(WarningHandler handler) {
-    platform::Locked lock(mutex_);
-    handler_ = std::move(handler);
+void Diagnostics::addWarningObserver(std::weak_ptr<const void> owner, WarningObserver observer) {
+    observers_.add(std::move(owner), std::move(observer));
 }
 
 void Diagnostics::trace(std::string_view line) {

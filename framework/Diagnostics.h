@@ -3,10 +3,12 @@
 #pragma once
 
 #include <functional>
+#include <memory>
 #include <string>
 #include <string_view>
 #include <vector>
 
+#include "platform/ObserverList.h"
 #include "platform/SystemLog.h"
 #include "platform/ThreadSafety.h"
 
@@ -16,16 +18,16 @@ enum class Verbosity { normal, verbose };
 
 class Diagnostics {
   public:
-    using WarningHandler = std::function<void(const std::string& warning)>;
+    using WarningObserver = std::function<void(const std::string& warning)>;
 
     // `log` is not owned and outlives the object.
     Diagnostics(platform::SystemLog& log, Verbosity verbosity) : log_(log), verbosity_(verbosity) {}
 
-    // Keeps a warning, logs it and tells the handler. One that is known already is not repeated.
+    // Keeps a warning, logs it and tells the observers. One that is known already is not repeated.
     void warn(const std::string& warning) VX_EXCLUDES(mutex_);
     std::vector<std::string> warnings() const VX_EXCLUDES(mutex_);
-    // Called for each new warning, on the thread that warns, outside the lock.
-    void setWarningHandler(WarningHandler handler) VX_EXCLUDES(mutex_);
+    // Told of each new warning, on the thread that warns, for as long as `owner` lives.
+    void addWarningObserver(std::weak_ptr<const void> owner, WarningObserver observer);
 
     void log(std::string_view line) { log_.log(line); }
     // Like `log`, in a verbose host only.
@@ -36,7 +38,7 @@ class Diagnostics {
     const Verbosity verbosity_;
     mutable platform::Mutex mutex_;
     std::vector<std::string> warnings_ VX_GUARDED_BY(mutex_);
-    WarningHandler handler_ VX_GUARDED_BY(mutex_);
+    platform::ObserverList<std::string> observers_;
 };
 
 }  // namespace vexo

@@ -34,6 +34,7 @@ enum class Needs { plugins, hostAlone };
 struct HostCommand {
     Needs needs;
     std::function<Problems(Host&)> run;
+    HostOptions options = {};  // of a command that stays
 };
 
 struct Parser {
@@ -155,14 +156,15 @@ Problem loadPlugins(Host& host) {
 Problems runWithHost(const HostCommand& command, Arguments& arguments) {
     if (const Problem problem = checkHome(arguments))
         return {*problem};
-    HostOptions options;
+    HostOptions options = command.options;
     options.homeDirectory = arguments.home;
     options.pluginBundles = arguments.plugins;
     options.verbosity = arguments.verbose ? Verbosity::verbose : Verbosity::normal;
     Host host(options);
+    const auto warningOwner = std::make_shared<int>();
     // A verbose host's log shows warnings already.
     if (!arguments.quiet && !arguments.verbose)
-        host.diagnostics().setWarningHandler([](const std::string& warning) { showWarning(warning); });
+        host.diagnostics().addWarningObserver(warningOwner, showWarning);
     const Problem problem = command.needs == Needs::plugins ? loadPlugins(host) : std::nullopt;
     return problem ? Problems{*problem} : command.run(host);
 }
