@@ -2,8 +2,8 @@
 #include "apps/vexo/Json.h"
 #include "apps/vexo/Progress.h"
 #include "apps/vexo/Terminal.h"
-#include "framework/PathWatcher.h"
-#include "framework/WatchLimits.h"
+#include "framework/pathwatcher/PathWatcher.h"
+#include "framework/pathwatcher/WatchLimits.h"
 #include "platform/FileManager.h"
 #include "platform/Services.h"
 

@@ -1,4 +1,4 @@
-#include "framework/WatchLimits.h"
+#include "framework/pathwatcher/WatchLimits.h"
 
 #include <fstream>
 #include <string>

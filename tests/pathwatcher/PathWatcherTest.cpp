@@ -1,4 +1,4 @@
-#include "framework/PathWatcher.h"
+#include "framework/pathwatcher/PathWatcher.h"
 
 #include <gtest/gtest.h>
 
