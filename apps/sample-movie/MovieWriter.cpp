@@ -153,7 +153,7 @@ class VideoTrack final : public Track {
         constexpr std::size_t size = 9 * sizeof(std::int32_t);
         auto* matrix =
             existing(av_stream_new_side_data(stream_, AV_PKT_DATA_DISPLAYMATRIX, size), "turn the picture");
-        av_display_rotation_set(reinterpret_cast<std::int32_t*>(matrix), -clockwise);
+        av_display_rotation_set(reinterpret_cast<std::int32_t*>(matrix), clockwise);
     }
 
     const int tint_;
