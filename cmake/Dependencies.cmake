@@ -9,6 +9,7 @@ pkg_check_modules(PIXBUF REQUIRED IMPORTED_TARGET gdk-pixbuf-2.0)     # thumbnai
 pkg_check_modules(EXPAT REQUIRED IMPORTED_TARGET expat)               # XML property lists
 pkg_check_modules(SQLITE REQUIRED IMPORTED_TARGET sqlite3)            # the metadata index
 pkg_check_modules(FFMPEG REQUIRED IMPORTED_TARGET libavformat libavcodec libavutil libswscale)
+pkg_check_modules(SECCOMP REQUIRED IMPORTED_TARGET libseccomp)        # walls around what reads foreign files
 find_package(fmt REQUIRED)
 find_package(nlohmann_json REQUIRED)
 find_package(CLI11 REQUIRED)

@@ -4,6 +4,7 @@
 #include <sys/resource.h>
 #include <unistd.h>
 
+#include "apps/media-reader/Sandbox.h"
 #include "framework/metadata/ReaderMessage.h"
 
 namespace reader {
@@ -27,6 +28,11 @@ bool limitMemory() {
 #endif
 }
 
+bool setLimits() {
+    return prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0) == 0 && limit(RLIMIT_CORE, 0) && limit(RLIMIT_FSIZE, 0) &&
+           limit(RLIMIT_NOFILE, openFiles) && limitMemory();
+}
+
 rlim_t processorSecondsUsed() {
     rusage usage{};
     getrusage(RUSAGE_SELF, &usage);
@@ -35,10 +41,14 @@ rlim_t processorSecondsUsed() {
 
 }  // namespace
 
-bool confine() {
+std::optional<std::vector<std::string>> confine() {
     closefrom(vexo::readerChannelDescriptor + 1);
-    return prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0) == 0 && limit(RLIMIT_CORE, 0) && limit(RLIMIT_FSIZE, 0) &&
-           limit(RLIMIT_NOFILE, openFiles) && limitMemory();
+    if (!setLimits())
+        return std::nullopt;
+    std::vector<std::string> given{"no new privileges", "limits"};
+    for (const std::string& wall : enterSandbox())
+        given.push_back(wall);
+    return given;
 }
 
 void renewProcessorTime() {

@@ -1,6 +1,8 @@
 // Reads movies for a host that started it: one file after another, each by a descriptor that the host sends,
 // until the host closes the channel. Runs confined, because the files may be anybody's.
 #include <cstdio>
+#include <cstdlib>
+#include <ctime>
 #include <exception>
 
 #include "apps/media-reader/Channel.h"
@@ -44,6 +46,12 @@ bool readNext() {
     return !reply.empty() && reader::Channel::send(reply);
 }
 
+// A date in a movie that names no time zone is in universal time.
+void takeDatesAsUniversal() {
+    setenv("TZ", "UTC0", /*overwrite=*/1);
+    tzset();
+}
+
 int refuse(const char* reason) {
     std::fprintf(stderr, "vexo-media-reader: %s\n", reason);
     return 2;
@@ -54,13 +62,15 @@ int refuse(const char* reason) {
 int main() {
     if (!reader::Channel::isOpen())
         return refuse("is started by programs that show movies, not by hand");
-    if (!reader::confine())
-        return refuse("cannot limit itself, so it reads nothing");
     reader::Channel::endWithHost();
+    takeDatesAsUniversal();
     av_log_set_level(AV_LOG_QUIET);
     av_max_alloc(largestAllocation);
+    const auto confinement = reader::confine();
+    if (!confinement)
+        return refuse("cannot limit itself, so it reads nothing");
 
-    reader::Channel::send(vexo::encodeGreeting({"limits"}));
+    reader::Channel::send(vexo::encodeGreeting(*confinement));
     while (readNext()) {
     }
     return 0;

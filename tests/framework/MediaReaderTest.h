@@ -1,0 +1,71 @@
+// What the tests of the media reader share: the real program, and questions to a reader.
+#pragma once
+
+#include <fcntl.h>
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+
+#include <cerrno>
+#include <fstream>
+#include <iterator>
+#include <string>
+
+#include "framework/metadata/MediaReader.h"
+#include "platform/linux/FileDescriptor.h"
+#include "tests/support/TemporaryFolder.h"
+
+namespace vexo {
+
+inline const std::string realProgram = VEXO_BIN_DIR "/vexo-media-reader";
+
+inline std::string contentOf(const std::string& path) {
+    std::ifstream file(path, std::ios::binary);
+    return {std::istreambuf_iterator<char>(file), {}};
+}
+
+inline MediaReaderAnswer answerFor(MediaReader& reader, const std::string& path) {
+    const platform::FileDescriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
+    return reader.read(file.number());
+}
+
+inline MediaFrameAnswer frameAnswerFor(MediaReader& reader, const std::string& path, int longestSide) {
+    const platform::FileDescriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
+    return reader.frame(file.number(), longestSide);
+}
+
+// What an answer holds besides a failure, which fails the test.
+template <typename Wanted>
+Wanted wantedIn(const std::variant<Wanted, MediaFailure>& answer, const std::string& path) {
+    if (const auto* failure = std::get_if<MediaFailure>(&answer)) {
+        ADD_FAILURE() << path << ": " << failure->reason;
+        return {};
+    }
+    return std::get<Wanted>(answer);
+}
+
+template <typename Unwanted>
+MediaFailure failureIn(const std::variant<Unwanted, MediaFailure>& answer, const std::string& path) {
+    const auto* failure = std::get_if<MediaFailure>(&answer);
+    EXPECT_TRUE(failure) << path << " was read";
+    return failure ? *failure : MediaFailure{};
+}
+
+inline MediaProperties propertiesFor(MediaReader& reader, const std::string& path) {
+    return wantedIn(answerFor(reader, path), path);
+}
+
+inline platform::Bitmap frameFor(MediaReader& reader, const std::string& path, int longestSide) {
+    return wantedIn(frameAnswerFor(reader, path, longestSide), path);
+}
+
+inline bool hasChildProcess() {
+    return waitpid(-1, nullptr, WNOHANG) != -1 || errno != ECHILD;
+}
+
+class RealMediaReader : public testing::Test {
+  protected:
+    testing_support::TemporaryFolder folder_;
+    ProcessMediaReader reader_{{realProgram}};
+};
+
+}  // namespace vexo
