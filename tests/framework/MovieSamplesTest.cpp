@@ -173,19 +173,38 @@ bool isTurned(const json& video) {
     return false;
 }
 
+double quotient(const std::string& ratio) {
+    const auto slash = ratio.find('/');
+    return std::stod(ratio.substr(0, slash)) / std::stod(ratio.substr(slash + 1));
+}
+
 void addPicture(json& facts, const json& video) {
     if (video["width"] > 0) {
         facts[kMDItemPixelWidth] = video[isTurned(video) ? "height" : "width"];
         facts[kMDItemPixelHeight] = video[isTurned(video) ? "width" : "height"];
     }
+    if (video["avg_frame_rate"] != "0/0")
+        facts[kMDItemVideoFrameRate] = quotient(video["avg_frame_rate"]);
+}
+
+void addSound(json& facts, const json& sound) {
+    facts[kMDItemAudioChannelCount] = sound["channels"];
+    facts[kMDItemAudioSampleRate] = std::stoi(sound["sample_rate"].get<std::string>());
 }
 
 void addContainer(json& facts, const json& format) {
     if (format.contains("duration"))
         facts[kMDItemDurationSeconds] = std::stod(format["duration"].get<std::string>());
+    if (format.contains("bit_rate"))
+        facts[kMDItemTotalBitRate] = std::stoll(format["bit_rate"].get<std::string>());
     const json tags = format.value("tags", json::object());
     if (tags.contains("creation_time"))
         facts[kMDItemContentCreationDate] = tags["creation_time"].get<std::string>().substr(0, 19) + "Z";
+    for (const auto& [key, tag] : {std::pair{kMDItemTitle, "title"},
+                                   {kMDItemAcquisitionMake, "make"},
+                                   {kMDItemAcquisitionModel, "model"}})
+        if (tags.contains(tag))
+            facts[key] = tags[tag];
 }
 
 json factsOf(const json& probe) {
@@ -193,6 +212,8 @@ json factsOf(const json& probe) {
     addContainer(facts, probe["format"]);
     if (const json* video = firstOf(probe, isVideo))
         addPicture(facts, *video);
+    if (const json* sound = firstOf(probe, isSound))
+        addSound(facts, *sound);
     return facts;
 }
 
@@ -217,7 +238,8 @@ json factsOf(const VXMetadataProperties& properties) {
     json facts = json::object();
     for (const std::string_view key :
          {kMDItemMediaTypes, kMDItemCodecs, kMDItemPixelWidth, kMDItemPixelHeight, kMDItemDurationSeconds,
-          kMDItemContentCreationDate})
+          kMDItemContentCreationDate, kMDItemVideoFrameRate, kMDItemAudioChannelCount, kMDItemAudioSampleRate,
+          kMDItemTotalBitRate, kMDItemTitle, kMDItemAcquisitionMake, kMDItemAcquisitionModel})
         if (const auto value = properties.valueForKey(key))
             facts[key] = jsonOf(*value);
     return facts;
@@ -341,6 +363,10 @@ TEST_F(MovieSamples, AreAsOddAsTheirNamesSay) {
     EXPECT_EQ(factsAbout(sample("cover.m4a")).at(kMDItemMediaTypes), json{"Sound"});
     EXPECT_FALSE(factsAbout(sample("no-frames.mp4")).contains(kMDItemDurationSeconds));
     EXPECT_FALSE(factsAbout(sample("reference.mov")).contains(kMDItemPixelWidth));
+    const json camera = factsAbout(sample("camera.mov"));
+    EXPECT_EQ(camera.at(kMDItemTitle), "Räder am Fluß");
+    EXPECT_EQ(camera.at(kMDItemAcquisitionMake), "Camera Works");
+    EXPECT_EQ(camera.at(kMDItemAcquisitionModel), "CW 100");
 }
 
 // --- Files that grow
