@@ -1,5 +1,6 @@
 #include "framework/metadata/IndexTable.h"
 
+#include <fmt/format.h>
 #include <sqlite3.h>
 
 #include "framework/metadata/ReaderMessage.h"
@@ -9,21 +10,42 @@ namespace vexo {
 namespace {
 
 // Raised when the columns change or what answers mean does.
-constexpr int tableVersion = 1;
+constexpr int tableVersion = 2;
 constexpr int busyMilliseconds = 2000;
+// Uses are noted this coarsely, so that a library which is looked at daily is written to once a week.
+constexpr DayNumber daysOfOneNote = 7;
 
-// Several processes may find the file empty at once: only the first one makes the table.
+// The index by day holds the keys as well, so pruning looks at nothing else to choose what goes.
 constexpr const char* creation =
-    "BEGIN IMMEDIATE;"
     "CREATE TABLE IF NOT EXISTS files ("
     " device INTEGER NOT NULL, inode INTEGER NOT NULL, size INTEGER NOT NULL, modified INTEGER NOT NULL,"
-    " answer TEXT NOT NULL, PRIMARY KEY (device, inode)) WITHOUT ROWID;"
-    "PRAGMA user_version = 1;"  // tableVersion
-    "COMMIT";
+    " day INTEGER NOT NULL, answer TEXT NOT NULL, PRIMARY KEY (device, inode)) WITHOUT ROWID;"
+    "CREATE INDEX IF NOT EXISTS filesByDay ON files (day);"
+    "CREATE TABLE IF NOT EXISTS pruning (id INTEGER PRIMARY KEY, day INTEGER NOT NULL);"
+    "PRAGMA user_version = 2";  // tableVersion
+constexpr const char* removal = "DROP TABLE IF EXISTS files; DROP TABLE IF EXISTS pruning";
+
 constexpr const char* selection =
-    "SELECT answer FROM files WHERE device = ?1 AND inode = ?2 AND size = ?3 AND modified = ?4";
+    "SELECT answer, day BETWEEN ?5 AND ?6 FROM files"
+    " WHERE device = ?1 AND inode = ?2 AND size = ?3 AND modified = ?4";
 constexpr const char* insertion =
-    "INSERT OR REPLACE INTO files (device, inode, size, modified, answer) VALUES (?1, ?2, ?3, ?4, ?5)";
+    "INSERT OR REPLACE INTO files (device, inode, size, modified, day, answer)"
+    " VALUES (?1, ?2, ?3, ?4, ?5, ?6)";
+constexpr const char* use =
+    "UPDATE files SET day = ?5 WHERE device = ?1 AND inode = ?2 AND size = ?3 AND modified = ?4";
+
+std::string pruningFor(DayNumber today, const IndexLimits& limits) {
+    constexpr const char* sql =
+        "DELETE FROM files WHERE (device, inode) IN ("
+        " SELECT device, inode FROM files ORDER BY day LIMIT min({atOnce}, max("
+        "  (SELECT COUNT(*) FROM (SELECT 1 FROM files WHERE day < {oldest} LIMIT {atOnce})),"
+        "  (SELECT COUNT(*) FROM files) - {entries})));"
+        "INSERT OR REPLACE INTO pruning (id, day) SELECT 1, {today}"
+        " WHERE (SELECT COUNT(*) FROM files) <= {entries}"
+        " AND NOT EXISTS (SELECT 1 FROM files WHERE day < {oldest})";
+    return fmt::format(sql, fmt::arg("atOnce", limits.droppedAtOnce), fmt::arg("entries", limits.entries),
+                       fmt::arg("oldest", today - limits.unusedDays), fmt::arg("today", today));
+}
 
 IndexTable::Outcome outcomeOf(int result) {
     switch (result & 0xff) {
@@ -60,11 +82,76 @@ std::string textOf(sqlite3_stmt* statement) {
     return std::string(bytes ? bytes : "", static_cast<std::size_t>(sqlite3_column_bytes(statement, 0)));
 }
 
-int prepareStatement(sqlite3* database, const char* sql, sqlite3_stmt*& statement) {
-    return sqlite3_prepare_v3(database, sql, -1, SQLITE_PREPARE_PERSISTENT, &statement, nullptr);
+// Runs a statement that answers nothing, and makes it ready for the next time.
+int run(sqlite3_stmt* statement) {
+    const int result = sqlite3_step(statement);
+    sqlite3_reset(statement);
+    return result == SQLITE_DONE ? SQLITE_OK : result;
+}
+
+int execute(sqlite3* database, const std::string& sql) {
+    return sqlite3_exec(database, sql.c_str(), nullptr, nullptr, nullptr);
+}
+
+int readNumber(sqlite3* database, const char* sql, std::int64_t& number) {
+    sqlite3_stmt* statement = nullptr;
+    int result = sqlite3_prepare_v2(database, sql, -1, &statement, nullptr);
+    if (result == SQLITE_OK)
+        result = sqlite3_step(statement);
+    if (result == SQLITE_ROW)
+        number = sqlite3_column_int64(statement, 0);
+    sqlite3_finalize(statement);
+    return result == SQLITE_ROW || result == SQLITE_DONE ? SQLITE_OK : result;
+}
+
+int readVersion(sqlite3* database, std::int64_t& version) {
+    return readNumber(database, "PRAGMA user_version", version);
+}
+
+// Does all of the work or nothing, even when the process is killed over it.
+template <typename Work>
+int inTransaction(sqlite3* database, Work work) {
+    int result = execute(database, "BEGIN IMMEDIATE");
+    if (result != SQLITE_OK)
+        return result;
+    result = work();
+    if (result == SQLITE_OK)
+        result = execute(database, "COMMIT");
+    if (result != SQLITE_OK)
+        execute(database, "ROLLBACK");
+    return result;
+}
+
+template <typename Work>
+int inTransactionWithoutWaiting(sqlite3* database, Work work) {
+    sqlite3_busy_timeout(database, 0);
+    const int result = inTransaction(database, work);
+    sqlite3_busy_timeout(database, busyMilliseconds);
+    return result;
+}
+
+// Several processes may find the file empty or old at once: only the first one makes the table.
+int makeTable(sqlite3* database) {
+    return inTransaction(database, [database] {
+        std::int64_t version = 0;
+        int result = readVersion(database, version);
+        if (result != SQLITE_OK || version == tableVersion)
+            return result;
+        if (version != 0)
+            result = execute(database, removal);
+        return result == SQLITE_OK ? execute(database, creation) : result;
+    });
 }
 
 }  // namespace
+
+void IndexTable::Closer::operator()(sqlite3* database) const {
+    sqlite3_close(database);
+}
+
+void IndexTable::Closer::operator()(sqlite3_stmt* statement) const {
+    sqlite3_finalize(statement);
+}
 
 IndexTable::Outcome IndexTable::open(const std::string& path, std::unique_ptr<IndexTable>& table) {
     std::unique_ptr<IndexTable> opened(new IndexTable);
@@ -73,71 +160,94 @@ IndexTable::Outcome IndexTable::open(const std::string& path, std::unique_ptr<In
     return outcome;
 }
 
-IndexTable::~IndexTable() {
-    sqlite3_finalize(find_);
-    sqlite3_finalize(store_);
-    sqlite3_close(database_);
-}
+IndexTable::~IndexTable() = default;
 
 int IndexTable::prepare(const std::string& path) {
     constexpr int flags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE | SQLITE_OPEN_NOMUTEX;
-    int result = sqlite3_open_v2(path.c_str(), &database_, flags, nullptr);
+    sqlite3* database = nullptr;
+    int result = sqlite3_open_v2(path.c_str(), &database, flags, nullptr);
+    database_.reset(database);
     if (result == SQLITE_OK)
         result = configure();
     if (result == SQLITE_OK)
-        result = prepareStatement(database_, selection, find_);
+        result = prepareStatement(selection, find_);
     if (result == SQLITE_OK)
-        result = prepareStatement(database_, insertion, store_);
+        result = prepareStatement(insertion, store_);
+    if (result == SQLITE_OK)
+        result = prepareStatement(use, use_);
     return result;
 }
 
 int IndexTable::configure() {
-    sqlite3_busy_timeout(database_, busyMilliseconds);
-    sqlite3_limit(database_, SQLITE_LIMIT_LENGTH, 4 * static_cast<int>(maximumMessageBytes));
-    int version = 0;
-    int result = checkVersion(version);
+    sqlite3* const database = database_.get();
+    sqlite3_busy_timeout(database, busyMilliseconds);
+    sqlite3_limit(database, SQLITE_LIMIT_LENGTH, 4 * static_cast<int>(maximumMessageBytes));
+    std::int64_t version = 0;
+    const int result = readVersion(database, version);
     if (result != SQLITE_OK)
         return result;
-    if (version != 0 && version != tableVersion)
+    if (version < 0 || version > tableVersion)
         return SQLITE_NOTADB;
     // Not every file system can share memory and another process may be changing the mode; the index works in
     // SQLite's own mode as well.
-    sqlite3_exec(database_, "PRAGMA journal_mode = WAL; PRAGMA synchronous = NORMAL", nullptr, nullptr,
-                 nullptr);
-    return version == 0 ? createTable() : SQLITE_OK;
+    execute(database, "PRAGMA journal_mode = WAL; PRAGMA synchronous = NORMAL");
+    return version == tableVersion ? SQLITE_OK : makeTable(database);
 }
 
-int IndexTable::checkVersion(int& version) {
-    sqlite3_stmt* statement = nullptr;
-    int result = prepareStatement(database_, "PRAGMA user_version", statement);
-    if (result == SQLITE_OK) {
-        result = sqlite3_step(statement);
-        version = sqlite3_column_int(statement, 0);
-    }
-    sqlite3_finalize(statement);
-    return result == SQLITE_ROW ? SQLITE_OK : result;
+int IndexTable::prepareStatement(const char* sql, Statement& statement) {
+    sqlite3_stmt* prepared = nullptr;
+    const int result =
+        sqlite3_prepare_v3(database_.get(), sql, -1, SQLITE_PREPARE_PERSISTENT, &prepared, nullptr);
+    statement.reset(prepared);
+    return result;
 }
 
-int IndexTable::createTable() {
-    return sqlite3_exec(database_, creation, nullptr, nullptr, nullptr);
-}
-
-IndexTable::Outcome IndexTable::find(const FileKey& key, std::string& answer) {
-    bindKey(find_, key);
-    const int result = sqlite3_step(find_);
+IndexTable::Outcome IndexTable::find(const FileKey& key, DayNumber today, Entry& entry) {
+    bindKey(find_.get(), key);
+    sqlite3_bind_int64(find_.get(), 5, today - daysOfOneNote + 1);
+    sqlite3_bind_int64(find_.get(), 6, today);
+    const int result = sqlite3_step(find_.get());
     if (result == SQLITE_ROW)
-        answer = textOf(find_);
-    sqlite3_reset(find_);
+        entry = {textOf(find_.get()), sqlite3_column_int(find_.get(), 1) != 0};
+    sqlite3_reset(find_.get());
     return result == SQLITE_DONE ? Outcome::missing : outcomeOf(result);
 }
 
-IndexTable::Outcome IndexTable::store(const FileKey& key, const std::string& answer) {
-    bindKey(store_, key);
-    sqlite3_bind_text(store_, 5, answer.data(), static_cast<int>(answer.size()), SQLITE_STATIC);
-    const int result = sqlite3_step(store_);
-    sqlite3_reset(store_);
-    sqlite3_clear_bindings(store_);
+IndexTable::Outcome IndexTable::store(const FileKey& key, const std::string& answer, DayNumber today) {
+    bindKey(store_.get(), key);
+    sqlite3_bind_int64(store_.get(), 5, today);
+    sqlite3_bind_text(store_.get(), 6, answer.data(), static_cast<int>(answer.size()), SQLITE_STATIC);
+    const int result = run(store_.get());
+    sqlite3_clear_bindings(store_.get());
     return outcomeOf(result);
+}
+
+IndexTable::Outcome IndexTable::noteUse(const std::vector<FileKey>& keys, DayNumber today) {
+    return outcomeOf(inTransactionWithoutWaiting(database_.get(), [&] {
+        int result = SQLITE_OK;
+        for (auto key = keys.begin(); key != keys.end() && result == SQLITE_OK; ++key) {
+            bindKey(use_.get(), *key);
+            sqlite3_bind_int64(use_.get(), 5, today);
+            result = run(use_.get());
+        }
+        return result;
+    }));
+}
+
+IndexTable::Outcome IndexTable::prune(DayNumber today, const IndexLimits& limits) {
+    // The last day may be in the future, noted when the clock was wrong; it is not today all the same.
+    std::int64_t last = today - 1;
+    const int result = readNumber(database_.get(), "SELECT day FROM pruning", last);
+    if (result != SQLITE_OK || last == today)
+        return outcomeOf(result);
+    return outcomeOf(inTransactionWithoutWaiting(
+        database_.get(), [&] { return execute(database_.get(), pruningFor(today, limits)); }));
+}
+
+bool IndexTable::isDisplaced() const {
+    int moved = 0;
+    sqlite3_file_control(database_.get(), "main", SQLITE_FCNTL_HAS_MOVED, &moved);
+    return moved != 0;
 }
 
 }  // namespace vexo

@@ -1,10 +1,13 @@
 // The table behind the metadata index, in an SQLite file that several processes may have open. Knows how to
 // tell a damaged file from one that is out of reach for now. Belongs to one thread at a time.
+//
+// Each entry carries the day on which it was last used, by which `prune` finds those that can go.
 #pragma once
 
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <vector>
 
 struct sqlite3;
 struct sqlite3_stmt;
@@ -22,38 +25,72 @@ struct FileKey {
     bool operator==(const FileKey&) const = default;
 };
 
+using DayNumber = std::int64_t;  // days from 1970-01-01, UTC
+
+// An entry takes some 200 bytes.
+struct IndexLimits {
+    // A disk that is brought out once a year keeps its entries; those of files that are gone go in the end.
+    DayNumber unusedDays = 400;
+    // About 100 MB, and far more movies than a home holds.
+    int entries = 500'000;
+    // A tenth of a second: whoever opens the table after a long while does not wait for all that went stale.
+    int droppedAtOnce = 2'000;
+};
+
 class IndexTable {
   public:
     enum class Outcome {
         done,
         missing,      // there is no such entry
-        damaged,      // the file is no index, or one of another version
+        damaged,      // the file is no index, or one of a newer version
         unavailable,  // locked for long, unreadable, disk full
     };
 
+    struct Entry {
+        std::string answer;
+        bool isNewlyUsed = false;  // no need to note that it is used today
+    };
+
     // Opens the table, making it where there is none; ":memory:" makes one that lives as long as the object.
-    // `table` is nil unless the outcome is `done`.
+    // One of an older version is emptied. `table` is nil unless the outcome is `done`.
     static Outcome open(const std::string& path, std::unique_ptr<IndexTable>& table);
     ~IndexTable();
     IndexTable(const IndexTable&) = delete;
     IndexTable& operator=(const IndexTable&) = delete;
 
-    // `answer` is set when the outcome is `done`.
-    [[nodiscard]] Outcome find(const FileKey& key, std::string& answer);
+    // `entry` is set when the outcome is `done`.
+    [[nodiscard]] Outcome find(const FileKey& key, DayNumber today, Entry& entry);
     // An answer for an earlier state of the file is replaced.
-    [[nodiscard]] Outcome store(const FileKey& key, const std::string& answer);
+    [[nodiscard]] Outcome store(const FileKey& key, const std::string& answer, DayNumber today);
+
+    // These two only tidy up: they do not wait for another process, but are unavailable while it writes.
+
+    // Keys that have no entry are passed over.
+    [[nodiscard]] Outcome noteUse(const std::vector<FileKey>& keys, DayNumber today);
+    // Drops what is beyond the limits, the longest unused first, once a day or until all of it is gone.
+    [[nodiscard]] Outcome prune(DayNumber today, const IndexLimits& limits);
+
+    // Whether the file was deleted or renamed since it was opened, so that nobody else will see what is
+    // stored.
+    bool isDisplaced() const;
 
   private:
+    struct Closer {
+        void operator()(sqlite3* database) const;
+        void operator()(sqlite3_stmt* statement) const;
+    };
+    using Statement = std::unique_ptr<sqlite3_stmt, Closer>;
+
     IndexTable() = default;
 
     int prepare(const std::string& path);
     int configure();
-    int createTable();
-    int checkVersion(int& version);
+    int prepareStatement(const char* sql, Statement& statement);
 
-    sqlite3* database_ = nullptr;
-    sqlite3_stmt* find_ = nullptr;
-    sqlite3_stmt* store_ = nullptr;
+    std::unique_ptr<sqlite3, Closer> database_;
+    Statement find_;
+    Statement store_;
+    Statement use_;
 };
 
 }  // namespace vexo

@@ -4,6 +4,7 @@
 #include <sys/file.h>
 #include <sys/stat.h>
 
+#include <chrono>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -17,6 +18,9 @@ namespace vexo {
 namespace {
 
 using Outcome = IndexTable::Outcome;
+
+// Some milliseconds of writing at a time.
+constexpr std::size_t usesInOneTransaction = 512;
 
 void makeFolderForUserAlone(const std::string& folder) {
     std::error_code ignored;
@@ -42,16 +46,23 @@ platform::FileDescriptor lockForReplacing(const std::string& path) {
     return lock;
 }
 
-bool setAsideUnderLock(const std::string& path) {
+// False while another process is at it. Does not touch the path's file when it isn't the table's any more.
+bool setAsideUnderLock(const std::string& path, const IndexTable& table) {
     const platform::FileDescriptor lock = lockForReplacing(path);
-    if (lock)
+    if (lock && !table.isDisplaced())
         setAside(path);
     return static_cast<bool>(lock);
 }
 
 }  // namespace
 
-MetadataIndex::MetadataIndex(const std::optional<std::string>& path) : path_(path.value_or("")) {
+DayNumber systemDay() {
+    const auto now = std::chrono::system_clock::now().time_since_epoch();
+    return std::chrono::floor<std::chrono::days>(now).count();
+}
+
+MetadataIndex::MetadataIndex(const std::optional<std::string>& path, DayClock today)
+    : today_(std::move(today)), path_(path.value_or("")) {
     platform::Locked lock(mutex_);
     if (path_.empty())
         openMemory();
@@ -59,7 +70,10 @@ MetadataIndex::MetadataIndex(const std::optional<std::string>& path) : path_(pat
         openFile();
 }
 
-MetadataIndex::~MetadataIndex() = default;
+MetadataIndex::~MetadataIndex() {
+    platform::Locked lock(mutex_);
+    writeUses();
+}
 
 std::optional<std::string> MetadataIndex::defaultPath() {
     // A relative XDG_CACHE_HOME is to be ignored.
@@ -77,7 +91,7 @@ std::string MetadataIndex::path() const {
 
 void MetadataIndex::openFile() {
     makeFolderForUserAlone(platform::path::withoutLastComponent(path_));
-    Outcome outcome = IndexTable::open(path_, table_);
+    Outcome outcome = openTidied();
     if (outcome == Outcome::damaged)
         outcome = replaceFile();
     if (outcome != Outcome::done)
@@ -89,36 +103,68 @@ void MetadataIndex::openMemory() {
     IndexTable::open(":memory:", table_);
 }
 
+Outcome MetadataIndex::openTidied() {
+    const Outcome outcome = IndexTable::open(path_, table_);
+    if (outcome != Outcome::done || table_->prune(today_(), IndexLimits()) != Outcome::damaged)
+        return outcome;
+    table_.reset();
+    return Outcome::damaged;
+}
+
 Outcome MetadataIndex::replaceFile() {
     const platform::FileDescriptor lock = lockForReplacing(path_);
     if (!lock)
         return Outcome::unavailable;
     // Another process may have replaced it since.
-    const Outcome outcome = IndexTable::open(path_, table_);
+    const Outcome outcome = openTidied();
     if (outcome != Outcome::damaged)
         return outcome;
     setAside(path_);
-    return IndexTable::open(path_, table_);
+    return openTidied();
 }
 
 void MetadataIndex::recoverFrom(Outcome outcome) {
     if (outcome != Outcome::damaged)
         return;
+    const bool isReplaceable = !path_.empty() && setAsideUnderLock(path_, *table_);
     table_.reset();
-    if (!path_.empty() && setAsideUnderLock(path_))
+    if (isReplaceable)
         openFile();
     else
         openMemory();
+}
+
+void MetadataIndex::reopenIfDisplaced() {
+    if (path_.empty() || !table_->isDisplaced())
+        return;
+    table_.reset();
+    openFile();
+}
+
+void MetadataIndex::noteUse(const FileKey& key) {
+    used_.push_back(key);
+    if (used_.size() >= usesInOneTransaction)
+        writeUses();
+}
+
+void MetadataIndex::writeUses() {
+    if (!used_.empty() && table_)
+        recoverFrom(table_->noteUse(used_, today_()));
+    used_.clear();
 }
 
 std::optional<MediaReaderAnswer> MetadataIndex::find(const FileKey& key) {
     platform::Locked lock(mutex_);
     if (!table_)
         return std::nullopt;
-    std::string answer;
-    const Outcome outcome = table_->find(key, answer);
+    IndexTable::Entry entry;
+    const Outcome outcome = table_->find(key, today_(), entry);
     recoverFrom(outcome);
-    return outcome == Outcome::done ? decodeAnswer(answer) : std::nullopt;
+    if (outcome != Outcome::done)
+        return std::nullopt;
+    if (!entry.isNewlyUsed)
+        noteUse(key);
+    return decodeAnswer(entry.answer);
 }
 
 void MetadataIndex::store(const FileKey& key, const MediaReaderAnswer& answer) {
@@ -127,7 +173,9 @@ void MetadataIndex::store(const FileKey& key, const MediaReaderAnswer& answer) {
         return;
     platform::Locked lock(mutex_);
     if (table_)
-        recoverFrom(table_->store(key, encodeAnswer(answer)));
+        reopenIfDisplaced();
+    if (table_)
+        recoverFrom(table_->store(key, encodeAnswer(answer), today_()));
 }
 
 }  // namespace vexo
