@@ -3,11 +3,25 @@
 #include <fcntl.h>
 #include <sys/stat.h>
 
+#include <cerrno>
+#include <system_error>
+
 #include "platform/linux/FileDescriptor.h"
 
 namespace vexo {
 
 namespace {
+
+// The key of a file that can be read, or why it can't be.
+using FileLook = std::variant<FileKey, MediaFailure>;
+
+MediaFailure notReadable(std::string reason) {
+    return {std::move(reason), FailureCause::elsewhere};
+}
+
+MediaFailure systemFailure(int error) {
+    return notReadable(std::generic_category().message(error));
+}
 
 FileKey keyOf(const struct stat& status) {
     const auto seconds = static_cast<std::int64_t>(status.st_mtim.tv_sec);
@@ -19,24 +33,25 @@ FileKey keyOf(const struct stat& status) {
     return {status.st_dev, status.st_ino, static_cast<std::uint64_t>(status.st_size), nanoseconds};
 }
 
-// The key of a plain file that has a content; nil for all else.
-std::optional<FileKey> keyOfMedia(const struct stat& status) {
-    if (!S_ISREG(status.st_mode) || status.st_size == 0)
-        return std::nullopt;
+FileLook lookOf(const struct stat& status) {
+    if (S_ISDIR(status.st_mode))
+        return notReadable("it is a folder");
+    if (!S_ISREG(status.st_mode))
+        return notReadable("it is no plain file");
+    if (status.st_size == 0)
+        return notReadable("it is empty");
     return keyOf(status);
 }
 
-std::optional<FileKey> keyOfFile(const std::string& path) {
+FileLook lookAt(const std::string& path) {
     struct stat status;
-    return stat(path.c_str(), &status) == 0 ? keyOfMedia(status) : std::nullopt;
+    return stat(path.c_str(), &status) == 0 ? lookOf(status) : systemFailure(errno);
 }
 
-std::optional<FileKey> keyOfFile(const platform::FileDescriptor& file) {
+FileLook lookAt(int descriptor) {
     struct stat status;
-    return fstat(file.number(), &status) == 0 ? keyOfMedia(status) : std::nullopt;
+    return fstat(descriptor, &status) == 0 ? lookOf(status) : systemFailure(errno);
 }
-
-const MediaFailure notReadable{"not a readable file with a content", FailureCause::elsewhere};
 
 }  // namespace
 
@@ -44,23 +59,32 @@ MetadataCache::MetadataCache(const std::optional<std::string>& indexPath, std::s
     : reader_(std::move(reader)), index_(indexPath) {}
 
 MediaReaderAnswer MetadataCache::answerForFile(const std::string& path) {
-    if (const auto key = keyOfFile(path); !key)
-        return notReadable;
-    else if (const auto known = index_.find(*key))
+    const FileLook look = lookAt(path);
+    if (const auto* failure = std::get_if<MediaFailure>(&look))
+        return *failure;
+    if (const auto known = index_.find(std::get<FileKey>(look)))
         return *known;
 
     // What lies at the path now may be another thing than what was just looked at: the flags keep a FIFO or a
-    // terminal from doing harm, and the key is taken anew.
+    // terminal from doing harm, and what was opened is looked at anew.
     const platform::FileDescriptor file(open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
-    const auto key = file ? keyOfFile(file) : std::nullopt;
-    if (!key)
-        return notReadable;
+    if (!file)
+        return systemFailure(errno);
+    return read(file.number());
+}
 
+MediaReaderAnswer MetadataCache::read(int descriptor) {
     platform::Locked lock(reading_);
-    if (const auto known = index_.find(*key))
+    // Only now: the file may have changed while this thread waited.
+    const FileLook before = lookAt(descriptor);
+    if (const auto* failure = std::get_if<MediaFailure>(&before))
+        return *failure;
+    const FileKey key = std::get<FileKey>(before);
+    if (const auto known = index_.find(key))
         return *known;
-    const MediaReaderAnswer answer = reader_->read(file.number());
-    index_.store(*key, answer);
+    const MediaReaderAnswer answer = reader_->read(descriptor);
+    if (lookAt(descriptor) == before)
+        index_.store(key, answer);
     return answer;
 }
 

@@ -15,12 +15,19 @@ class MetadataCache {
   public:
     MetadataCache(const std::optional<std::string>& indexPath, std::shared_ptr<MediaReader> reader);
 
-    // The answer for the file at a real path. Waits for the reader where the index does not know the file.
+    // The answer for the file at a real path. Waits for the reader where the index does not know the file,
+    // and for nothing else that is being read.
+    //
+    // A failure says why there is no answer, in words to be put after the path: the system's message, or what
+    // lies there instead of a plain file with a content. An answer for a file that changed while it was read
+    // is given and not kept.
     MediaReaderAnswer answerForFile(const std::string& path) VX_EXCLUDES(reading_);
 
     std::string indexPath() const { return index_.path(); }
 
   private:
+    MediaReaderAnswer read(int descriptor) VX_EXCLUDES(reading_);
+
     const std::shared_ptr<MediaReader> reader_;
     MetadataIndex index_;
     // Held while a file is read, on purpose: whoever asks for the same file meanwhile finds it in the index.
