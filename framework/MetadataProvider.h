@@ -13,7 +13,8 @@ class MetadataProvider {
 
     // Never nil; nothing is read before a property is asked for.
     virtual VXMetadataPropertiesRef propertiesForFile(const std::string& path) const = 0;
-    // Whether the file is a movie by its type. Reads no more than the beginning, where the name tells no type.
+    // Whether the file is a movie by its type. Reads no more than the beginning, where the name tells no
+    // type.
     virtual bool supportedMovieFile(const std::string& path) const = 0;
 };
 
