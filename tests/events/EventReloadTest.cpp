@@ -404,8 +404,8 @@ class EventWatchesTest : public EventReloadTest {
     RecordingWatcher watcher;
 
   private:
-    vexo::HostServicesScope scope_{
-        {watcher, vexo::hostServices().imageManager, environment.metadata, environment.diagnostics}};
+    vexo::HostServicesScope scope_{{watcher, vexo::hostServices().imageManager, environment.metadata,
+                                    environment.thumbnails, environment.diagnostics}};
 };
 
 TEST_F(EventWatchesTest, LibraryIsWatchedWhereItsParentIsNot) {
