@@ -27,11 +27,11 @@ struct FileKey {
 
 using DayNumber = std::int64_t;  // days from 1970-01-01, UTC
 
-// An entry takes some 200 bytes.
+// An entry takes some 280 bytes.
 struct IndexLimits {
     // A disk that is brought out once a year keeps its entries; those of files that are gone go in the end.
     DayNumber unusedDays = 400;
-    // About 100 MB, and far more movies than a home holds.
+    // About 140 MB, and far more movies than a home holds.
     int entries = 500'000;
     // A tenth of a second: whoever opens the table after a long while does not wait for all that went stale.
     int droppedAtOnce = 2'000;
