@@ -37,7 +37,8 @@ FrameDecoder::FrameDecoder(MediaFile& file, AVStream& track, Deadline deadline)
       deadline_(deadline),
       decoder_(decoderOf(track)),
       packet_(owned(av_packet_alloc())),
-      frame_(owned(av_frame_alloc())) {
+      frame_(owned(av_frame_alloc())),
+      upcoming_(owned(av_frame_alloc())) {
     readOnly(track, format_);
 }
 
@@ -53,9 +54,11 @@ void FrameDecoder::restart() {
 
 const AVFrame* FrameDecoder::next() {
     while (!isOver()) {
-        const int result = avcodec_receive_frame(decoder_.get(), frame_.get());
-        if (result == 0)
+        const int result = avcodec_receive_frame(decoder_.get(), upcoming_.get());
+        if (result == 0) {
+            frame_.swap(upcoming_);
             return frame_.get();
+        }
         if (result == AVERROR_EOF)
             return nullptr;
         feed();

@@ -24,7 +24,7 @@ class FrameDecoder {
     // Goes on with the first byte of the file, in formats in which that is possible.
     void restart();
 
-    // The next frame that could be decoded; nil at the end. It stays as it is until the next call.
+    // The next frame that could be decoded; nil at the end. It stays as it is until there is another one.
     const AVFrame* next();
 
   private:
@@ -37,7 +37,8 @@ class FrameDecoder {
     const Deadline deadline_;
     Owned<AVCodecContext> decoder_;
     Owned<AVPacket> packet_;
-    Owned<AVFrame> frame_;
+    Owned<AVFrame> frame_;     // the last one that was answered
+    Owned<AVFrame> upcoming_;  // what the decoder gives out, which is nothing at times
 };
 
 }  // namespace reader
