@@ -6,6 +6,7 @@
 #include <iostream>
 
 #include "apps/vexo/Commands.h"
+#include "apps/vexo/Paths.h"
 #include "apps/vexo/Progress.h"
 #include "apps/vexo/Terminal.h"
 
@@ -45,6 +46,11 @@ struct Parser {
     std::function<Problems()> plainCommand;  // else
 
   private:
+    void addTree(Arguments& arguments);
+    void addInfo(Arguments& arguments);
+    void addLocations(Arguments& arguments);
+    void addMetadata(Arguments& arguments);
+    void addDemo(Arguments& arguments);
     CLI::App* addCommand(const std::string& name, const std::string& summary);
 };
 
@@ -73,6 +79,14 @@ Parser::Parser(Arguments& arguments)
     auto* quiet = app.add_flag("--quiet", arguments.quiet, "Print nothing but errors on standard error");
     app.add_flag("--verbose", arguments.verbose, "Print the host's log on standard error")->excludes(quiet);
 
+    addTree(arguments);
+    addInfo(arguments);
+    addLocations(arguments);
+    addMetadata(arguments);
+    addDemo(arguments);
+}
+
+void Parser::addTree(Arguments& arguments) {
     CLI::App* tree = addCommand("tree", "Print the tree of projects and events");
     tree->add_flag("--json", arguments.json, "Print JSON");
     tree->add_flag("--metadata", arguments.tree.withMetadata,
@@ -85,7 +99,9 @@ Parser::Parser(Arguments& arguments)
         hostCommand = {Needs::plugins,
                        [&arguments](Host& host) { return runTree(host, arguments.tree, std::cout); }};
     });
+}
 
+void Parser::addInfo(Arguments& arguments) {
     CLI::App* info = addCommand("info", "Print the plug-ins found and what they say of themselves");
     info->add_flag("--json", arguments.json, "Print JSON");
     info->callback([this, &arguments] {
@@ -93,14 +109,18 @@ Parser::Parser(Arguments& arguments)
                            return runInfo(host, {format(arguments), arguments.verbose}, std::cout);
                        }};
     });
+}
 
+void Parser::addLocations(Arguments& arguments) {
     CLI::App* locations = addCommand("locations", "Print every folder that is looked at for libraries");
     locations->add_flag("--json", arguments.json, "Print JSON");
     locations->callback([this, &arguments] {
         hostCommand = {Needs::plugins,
                        [&arguments](Host& host) { return runLocations(host, format(arguments), std::cout); }};
     });
+}
 
+void Parser::addMetadata(Arguments& arguments) {
     CLI::App* metadata =
         addCommand("metadata", "Print what is known of files: size, duration, type and more");
     metadata->add_flag("--json", arguments.json, "Print JSON");
@@ -110,7 +130,9 @@ Parser::Parser(Arguments& arguments)
                            return runMetadata(host, arguments.files, format(arguments), std::cout);
                        }};
     });
+}
 
+void Parser::addDemo(Arguments& arguments) {
     CLI::App* demo = addCommand("demo", "Make a small, complete sample home with real movies");
     demo->add_option("DIR", arguments.demoFolder, "The folder to make; must not exist or be empty")
         ->required();
@@ -135,13 +157,11 @@ int refuse(const std::string& problem) {
 Problem checkHome(Arguments& arguments) {
     if (!arguments.home)
         return std::nullopt;
+    const std::string home = absolutePath(*arguments.home);
     std::error_code error;
-    const std::filesystem::path home = std::filesystem::absolute(*arguments.home, error).lexically_normal();
     if (!std::filesystem::is_directory(home, error))
         return "there is no home folder '" + *arguments.home + "'; give an existing folder to --home";
-    arguments.home = home.string();
-    while (arguments.home->size() > 1 && arguments.home->back() == '/')
-        arguments.home->pop_back();
+    arguments.home = home;
     return std::nullopt;
 }
 

@@ -1,7 +1,6 @@
-#include <filesystem>
-
 #include "apps/vexo/Commands.h"
 #include "apps/vexo/Json.h"
+#include "apps/vexo/Paths.h"
 #include "apps/vexo/Progress.h"
 #include "apps/vexo/Terminal.h"
 #include "framework/metadata/MetadataStore.h"
@@ -16,12 +15,6 @@ struct Description {
     platform::Dictionary properties;
     Problem problem;  // why it is no movie that can be read
 };
-
-std::string absolutePath(const std::string& file) {
-    std::error_code unknown;
-    const std::filesystem::path path = std::filesystem::absolute(file, unknown);
-    return unknown ? file : path.string();
-}
 
 // Why a file is no movie is found out by reading it, so that its properties are known as well.
 Description descriptionOf(const std::string& file, const MetadataStore& metadata) {
