@@ -1,39 +1,59 @@
 #include "framework/pathwatcher/PathWatcher.h"
 
 #include <algorithm>
+#include <utility>
 
-#include "platform/Path.h"
+#include "framework/pathwatcher/SystemSeams.h"
+#include "platform/Dispatcher.h"
+#include "platform/Services.h"
 
 namespace vexo {
-namespace {
 
 using platform::Locked;
-namespace path = platform::path;
+
+namespace {
+
+constexpr double normalPriority = 0.5;
 
 bool isObserver(const std::weak_ptr<VXPathObserver>& registered, const VXPathObserverRef& observer) {
     return !registered.owner_before(observer) && !observer.owner_before(registered);
 }
 
-// One spelling for a path however many slashes it ends in.
-std::string withoutTrailingSlashes(std::string text) {
-    while (text.size() > 1 && text.back() == '/')
-        text.pop_back();
-    return text;
+void stepUntilClosed(ChangeFollower& follower) {
+    while (follower.step(ChangeFollower::forever)) {
+    }
 }
 
 }  // namespace
 
+PathWatcher::PathWatcher()
+    : PathWatcher([](const auto& wake) { return systemSeams(wake, usualPollInterval); }) {}
+
+PathWatcher::PathWatcher(SeamMaker seamMaker)
+    : seamMaker_(std::move(seamMaker)),
+      registrations_(std::make_shared<WatchRegistrations>()),
+      delivery_(std::make_shared<ChangeDelivery>()) {}
+
+PathWatcher::~PathWatcher() {
+    close();
+}
+
 void PathWatcher::watchPath(const std::string& path, const VXPathObserverRef& observer) {
-    Locked lock(mutex_);
-    Observers& observers = observersByPath_[withoutTrailingSlashes(path)];
-    std::erase_if(observers,
-                  [&](const auto& known) { return known.expired() || isObserver(known, observer); });
-    observers.push_back(observer);
+    registerSubscriber(path, Subscriber(observer));
 }
 
 bool PathWatcher::watchPathIsUnique(const std::string& path, const VXPathObserverRef& observer) {
-    Locked lock(mutex_);
-    return !findAncestor(path, [&](const auto& known) { return isObserver(known, observer); });
+    return !registrations_->covers(path, Subscriber(observer));
+}
+
+void PathWatcher::listen(const std::string& path, const std::shared_ptr<const ChangeListener>& listener) {
+    registerSubscriber(path, Subscriber(listener));
+}
+
+void PathWatcher::registerSubscriber(const std::string& path, const Subscriber& subscriber) {
+    registrations_->add(path, subscriber);
+    if (const auto follows = follower())
+        follows->watch(WatchRegistrations::registeredForm(path));
 }
 
 void PathWatcher::watchQuery(const std::string& query, const VXPathObserverRef& observer,
@@ -50,9 +70,70 @@ void PathWatcher::watchQuery(const std::string& query, const VXPathObserverRef& 
     queries_.push_back({query, observer, std::move(queryScope), queryRunMode});
 }
 
-std::optional<std::string> PathWatcher::watchedAncestor(const std::string& path) const {
+void PathWatcher::start() {
+    begin(Following::onThread);
+}
+
+std::shared_ptr<ChangeFollower> PathWatcher::startByHand() {
+    begin(Following::byHand);
+    return follower();
+}
+
+void PathWatcher::begin(Following following) {
+    {
+        Locked lock(mutex_);
+        following_ = following;
+    }
+    for (const std::string& path : registrations_->paths())
+        if (const auto follows = follower())
+            follows->watch(path);
+}
+
+std::shared_ptr<ChangeFollower> PathWatcher::follower() {
     Locked lock(mutex_);
-    return findAncestor(path, [](const auto& known) { return !known.expired(); });
+    if (following_ != Following::no && !follower_)
+        makeFollower();
+    return follower_;
+}
+
+void PathWatcher::makeFollower() {
+    const auto wake = std::make_shared<const WakeSignal>();
+    follower_ =
+        std::make_shared<ChangeFollower>(seamMaker_(wake), wake, registrations_, delivery_, warningHandler_);
+    if (following_ == Following::onThread)
+        platform::services().dispatcher.detachThread("vexo-watcher", normalPriority,
+                                                     [follower = follower_] { stepUntilClosed(*follower); });
+}
+
+void PathWatcher::close() {
+    delivery_->close();
+    Locked lock(mutex_);
+    following_ = Following::no;
+    if (const auto closing = std::exchange(follower_, nullptr))
+        closing->close();
+}
+
+void PathWatcher::setWarningHandler(WarningHandler handler) {
+    Locked lock(mutex_);
+    warningHandler_ = std::move(handler);
+}
+
+std::optional<std::string> PathWatcher::watchedAncestor(const std::string& path) const {
+    return registrations_->registeredAncestor(path);
+}
+
+WatchState PathWatcher::watchStateOf(const std::string& path) const {
+    const auto registered = registrations_->registeredAncestor(path);
+    if (!registered)
+        return {WatchState::How::none, "nobody watches it"};
+    std::shared_ptr<ChangeFollower> follower;
+    {
+        Locked lock(mutex_);
+        follower = follower_;
+    }
+    if (!follower)
+        return {WatchState::How::none, "this program does not follow changes"};
+    return follower->stateOf(*registered, WatchRegistrations::registeredForm(path));
 }
 
 std::vector<PathWatcher::QueryRegistration> PathWatcher::queries() const {
@@ -61,20 +142,6 @@ std::vector<PathWatcher::QueryRegistration> PathWatcher::queries() const {
     std::copy_if(queries_.begin(), queries_.end(), std::back_inserter(living),
                  [](const auto& known) { return !known.observer.expired(); });
     return living;
-}
-
-template <typename Predicate>
-std::optional<std::string> PathWatcher::findAncestor(const std::string& path, Predicate matches) const {
-    for (std::string folder = withoutTrailingSlashes(path); !folder.empty();
-         folder = path::withoutLastComponent(folder)) {
-        const auto found = observersByPath_.find(folder);
-        if (found != observersByPath_.end() &&
-            std::any_of(found->second.begin(), found->second.end(), matches))
-            return folder;
-        if (folder == "/")
-            break;
-    }
-    return std::nullopt;
 }
 
 }  // namespace vexo

@@ -1,12 +1,30 @@
-// Remembers who watches which paths and queries.
+// Watches paths in the file system, for plug-ins and for the framework itself. Thread-safe.
+//
+// Registrations are only remembered until `start`, so a program that reads the libraries once pays nothing.
+// From then on each path is watched, whatever is there and whatever becomes of it, and observers hear, a
+// moment after it happened (ChangeBurst::length) and on any thread:
+// - when something appeared, vanished, was renamed or got other attributes: the folder in which it happened;
+// - when the content of a file changed: the file;
+// - of anything inside a package: the package, except for the content of a movie, which is reported itself;
+// - when the watched path itself appeared, vanished or leads elsewhere, when its events were lost, and when
+//   it is a file that changed: the watched path.
+// Paths below a registered one are named by it, through whatever links it leads. Links below it are not
+// entered. Where the kernel sends no events, folders are polled; what changed is then the folder.
+//
+// Out of sight of the kernel, and so of this: what is written through a memory mapping until the file is
+// closed, and what is written to a file by another of its hard links in an unwatched folder.
 #pragma once
 
-#include <map>
+#include <chrono>
+#include <functional>
 #include <memory>
 #include <optional>
 #include <string>
 #include <vector>
 
+#include "framework/pathwatcher/ChangeFollower.h"
+#include "framework/pathwatcher/Subscriber.h"
+#include "framework/pathwatcher/WatchState.h"
 #include "host/VXPathWatcher.h"
 #include "platform/ThreadSafety.h"
 
@@ -14,15 +32,41 @@ namespace vexo {
 
 class PathWatcher final : public VXPathWatcher {
   public:
+    using WarningHandler = ChangeFollower::WarningHandler;
+    // Makes what stands for the world; it raises `wake` when the polling has news.
+    using SeamMaker = std::function<WatchSeams(const std::shared_ptr<const WakeSignal>& wake)>;
+
+    PathWatcher();
+    explicit PathWatcher(SeamMaker seamMaker);
+    ~PathWatcher() override;
+
     void watchPath(const std::string& path, const VXPathObserverRef& observer) override VX_EXCLUDES(mutex_);
-    bool watchPathIsUnique(const std::string& path, const VXPathObserverRef& observer) override
-        VX_EXCLUDES(mutex_);
+    bool watchPathIsUnique(const std::string& path, const VXPathObserverRef& observer) override;
     void watchQuery(const std::string& query, const VXPathObserverRef& observer, VXPathListRef queryScope,
                     unsigned queryRunMode) override VX_EXCLUDES(mutex_);
 
-    // The path through which `path` is watched for any living observer: itself or a folder above it; nil when
+    // For the framework's own purposes: the listener hears what an observer of the path would, a whole burst
+    // in one call. The registration ends when the listener goes.
+    void listen(const std::string& path, const std::shared_ptr<const ChangeListener>& listener)
+        VX_EXCLUDES(mutex_);
+
+    // Begins to follow changes, on a thread that is started with the first path. Called once. Requires: a
+    // platform::ServicesScope exists until the watcher is closed.
+    void start() VX_EXCLUDES(mutex_);
+    // Ends the thread and all reports; a report in progress goes on. Requires: called before the dispatcher
+    // goes, which waits for the thread.
+    void close() VX_EXCLUDES(mutex_);
+    // Hears of what keeps changes from being followed at once, each text once. To be set before the start;
+    // called on any thread.
+    void setWarningHandler(WarningHandler handler) VX_EXCLUDES(mutex_);
+
+    // The path through which `path` is watched for anybody living: itself or a folder above it; nil when
     // nobody watches it.
-    std::optional<std::string> watchedAncestor(const std::string& path) const VX_EXCLUDES(mutex_);
+    std::optional<std::string> watchedAncestor(const std::string& path) const;
+    WatchState watchStateOf(const std::string& path) const VX_EXCLUDES(mutex_);
+
+    // The start without a thread: the caller takes steps of the follower itself.
+    std::shared_ptr<ChangeFollower> startByHand() VX_EXCLUDES(mutex_);
 
     struct QueryRegistration {
         std::string query;
@@ -34,14 +78,22 @@ class PathWatcher final : public VXPathWatcher {
     std::vector<QueryRegistration> queries() const VX_EXCLUDES(mutex_);
 
   private:
-    using Observers = std::vector<std::weak_ptr<VXPathObserver>>;
+    enum class Following { no, onThread, byHand };
 
-    template <typename Predicate>
-    std::optional<std::string> findAncestor(const std::string& path, Predicate matches) const
-        VX_REQUIRES(mutex_);
+    void begin(Following following) VX_EXCLUDES(mutex_);
+    void registerSubscriber(const std::string& path, const Subscriber& subscriber) VX_EXCLUDES(mutex_);
+    // Made when it is first wanted; nil while changes are not followed.
+    std::shared_ptr<ChangeFollower> follower() VX_EXCLUDES(mutex_);
+    void makeFollower() VX_REQUIRES(mutex_);
+
+    const SeamMaker seamMaker_;
+    const std::shared_ptr<WatchRegistrations> registrations_;
+    const std::shared_ptr<ChangeDelivery> delivery_;
 
     mutable platform::Mutex mutex_;
-    std::map<std::string, Observers> observersByPath_ VX_GUARDED_BY(mutex_);
+    Following following_ VX_GUARDED_BY(mutex_) = Following::no;
+    std::shared_ptr<ChangeFollower> follower_ VX_GUARDED_BY(mutex_);
+    WarningHandler warningHandler_ VX_GUARDED_BY(mutex_) = [](const std::string&) {};
     std::vector<QueryRegistration> queries_ VX_GUARDED_BY(mutex_);
 };
 

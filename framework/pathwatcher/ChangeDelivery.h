@@ -1,0 +1,41 @@
+// Tells subscribers of changes, on a thread of its own that lives while there is something to tell: one that
+// takes its time doesn't keep the watcher from taking in events. What comes meanwhile is told in one go.
+// Thread-safe.
+#pragma once
+
+#include <map>
+#include <memory>
+#include <optional>
+#include <set>
+#include <string>
+#include <utility>
+
+#include "framework/pathwatcher/ChangeBurst.h"
+#include "framework/pathwatcher/Subscriber.h"
+#include "platform/ThreadSafety.h"
+
+namespace vexo {
+
+class ChangeDelivery : public std::enable_shared_from_this<ChangeDelivery> {
+  public:
+    // A path that waits for a subscriber already is told once.
+    void add(const Subscriber& subscriber, const ChangeBurst::Paths& changedPaths) VX_EXCLUDES(mutex_);
+    // Tells what was added. Requires: a platform::ServicesScope exists.
+    void begin() VX_EXCLUDES(mutex_);
+    // Nobody is told of anything any more; a call in progress goes on.
+    void close() VX_EXCLUDES(mutex_);
+
+  private:
+    using Reports = std::map<Subscriber, std::set<std::string>>;
+
+    void deliver() VX_EXCLUDES(mutex_);
+    // nil when nothing waits; the thread is then to end.
+    std::optional<Reports::value_type> takeNext() VX_EXCLUDES(mutex_);
+
+    platform::Mutex mutex_;
+    Reports waiting_ VX_GUARDED_BY(mutex_);
+    bool isDelivering_ VX_GUARDED_BY(mutex_) = false;
+    bool closed_ VX_GUARDED_BY(mutex_) = false;
+};
+
+}  // namespace vexo
