@@ -13,6 +13,7 @@ struct RawMovie {
     int width = 64;
     int height = 48;
     int frames = 10;
+    int missingFrames = 0;  // that the headers tell of as well
     int framesPerSecond = 10;
     bool everyFrameIsKey = true;  // else the first alone
     std::string date = {};        // "Wed Dec 31 23:59:59 2008"; empty for none
@@ -39,11 +40,11 @@ struct RawMovie {
     }
 
     std::string headers() const {
-        const std::string main = numbers(1'000'000 / framesPerSecond, 0, 0, hasIndex, frames, 0, 1,
-                                         pictureSize(), width, height, 0, 0, 0, 0);
-        const std::string stream = "vidsDIB " +
-                                   numbers(0, 0, 0, 1, framesPerSecond, 0, frames, pictureSize()) +
-                                   numbers(-1, 0) + numbers(0, 0);
+        const std::string main = numbers(1'000'000 / framesPerSecond, 0, 0, hasIndex, frames + missingFrames,
+                                         0, 1, pictureSize(), width, height, 0, 0, 0, 0);
+        const std::string stream =
+            "vidsDIB " + numbers(0, 0, 0, 1, framesPerSecond, 0, frames + missingFrames, pictureSize()) +
+            numbers(-1, 0) + numbers(0, 0);
         const std::string picture =
             numbers(40, width, height) + number(1, 2) + number(24, 2) + numbers(0, pictureSize(), 0, 0, 0, 0);
         return chunk("avih", main) + list("strl", chunk("strh", stream) + chunk("strf", picture)) +
