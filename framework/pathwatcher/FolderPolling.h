@@ -37,7 +37,7 @@ class FolderPolling {
   public:
     virtual ~FolderPolling() = default;
 
-    // The first look is taken soon; what changes before it is not noticed.
+    // The first look is taken soon. It reports the place, because what happened before it is not known.
     virtual std::uint64_t add(PolledPlace place) = 0;
     virtual void remove(std::uint64_t place) = 0;
     // The reports since the last call, which may be about places that were removed meanwhile.

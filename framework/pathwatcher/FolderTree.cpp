@@ -57,6 +57,7 @@ class FolderTree::Folder final : public EventListener {
     int watch = -1;
     std::optional<PolledSubtree::Reason> pollReason;
     std::string explanation;  // of the polling
+    bool couldNotBeListed = false;
     std::unique_ptr<PolledSubtree> polled;
 };
 
@@ -211,6 +212,7 @@ void FolderTree::pollInstead(Folder& folder, int error) {
     means_.watches.remove(std::exchange(folder.watch, -1), folder);
     folder.pollReason = PolledSubtree::Reason::passing;
     folder.explanation = explanationOf(pathBelow(path_, folder), error);
+    folder.couldNotBeListed = true;
     poll(folder);
 }
 
@@ -250,12 +252,15 @@ bool FolderTree::take(const PollReport& report) {
 
 // Whether what kept the folder from being watched has passed. The folder may be gone afterwards.
 void FolderTree::retry(Folder& folder) {
+    if (folder.couldNotBeListed && means_.folders.list(pathBelow(path_, folder)).error != 0)
+        return;
     if (folder.parent)
         return examine(*folder.parent, std::string(folder.name));
     follow(folder);
     if (folder.watch < 0)
         return;
     folder.pollReason.reset();
+    folder.couldNotBeListed = false;
     folder.stopPolling();
     explore(folder, Discovery::appeared);
 }

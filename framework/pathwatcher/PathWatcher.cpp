@@ -58,6 +58,13 @@ void PathWatcher::registerSubscriber(const std::string& path, const Subscriber& 
 
 void PathWatcher::watchQuery(const std::string& query, const VXPathObserverRef& observer,
                              VXPathListRef queryScope, unsigned queryRunMode) {
+    rememberQuery(query, observer, queryScope, queryRunMode);
+    if (const auto live = liveQueries())
+        live->watchQuery(query, observer, std::move(queryScope), queryRunMode);
+}
+
+void PathWatcher::rememberQuery(const std::string& query, const VXPathObserverRef& observer,
+                                VXPathListRef queryScope, unsigned queryRunMode) {
     Locked lock(mutex_);
     std::erase_if(queries_, [](const auto& known) { return known.observer.expired(); });
     for (QueryRegistration& known : queries_) {
@@ -83,10 +90,29 @@ void PathWatcher::begin(Following following) {
     {
         Locked lock(mutex_);
         following_ = following;
+        makeLiveQueries();
     }
     for (const std::string& path : registrations_->paths())
         if (const auto follows = follower())
             follows->watch(path);
+    for (QueryRegistration& query : queries())
+        if (const auto observer = query.observer.lock())
+            liveQueries()->watchQuery(query.query, observer, std::move(query.scope), query.runMode);
+}
+
+void PathWatcher::makeLiveQueries() {
+    liveQueries_ = std::make_shared<LiveQueries>(LiveQuerySurroundings{
+        [this](const std::string& folder) { listen(folder, queryListener_); }, systemTime});
+    queryListener_ = std::make_shared<const ChangeListener>(
+        [queries = std::weak_ptr(liveQueries_)](const std::vector<std::string>& changedPaths) {
+            if (const auto living = queries.lock())
+                living->changed(changedPaths);
+        });
+}
+
+std::shared_ptr<LiveQueries> PathWatcher::liveQueries() const {
+    Locked lock(mutex_);
+    return liveQueries_;
 }
 
 std::shared_ptr<ChangeFollower> PathWatcher::follower() {
@@ -107,6 +133,8 @@ void PathWatcher::makeFollower() {
 
 void PathWatcher::close() {
     delivery_->close();
+    if (const auto live = liveQueries())
+        live->close();
     Locked lock(mutex_);
     following_ = Following::no;
     if (const auto closing = std::exchange(follower_, nullptr))

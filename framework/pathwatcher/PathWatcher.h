@@ -25,6 +25,7 @@
 #include "framework/pathwatcher/ChangeFollower.h"
 #include "framework/pathwatcher/Subscriber.h"
 #include "framework/pathwatcher/WatchState.h"
+#include "framework/queries/LiveQueries.h"
 #include "host/VXPathWatcher.h"
 #include "platform/ThreadSafety.h"
 
@@ -50,11 +51,12 @@ class PathWatcher final : public VXPathWatcher {
     void listen(const std::string& path, const std::shared_ptr<const ChangeListener>& listener)
         VX_EXCLUDES(mutex_);
 
-    // Begins to follow changes, on a thread that is started with the first path. Called once. Requires: a
-    // platform::ServicesScope exists until the watcher is closed.
+    // Begins to follow changes, on a thread that is started with the first path, and to keep queries up to
+    // date. Called once. Requires: the platform's and the host's services are in place until the watcher is
+    // closed.
     void start() VX_EXCLUDES(mutex_);
-    // Ends the thread and all reports; a report in progress goes on. Requires: called before the dispatcher
-    // goes, which waits for the thread.
+    // Ends the thread, the queries and all reports; a report in progress goes on. Requires: called before the
+    // dispatcher goes, which waits for the thread, while the watcher itself goes after it.
     void close() VX_EXCLUDES(mutex_);
     // Hears of what keeps changes from being followed at once, each text once. To be set before the start;
     // called on any thread.
@@ -80,6 +82,10 @@ class PathWatcher final : public VXPathWatcher {
   private:
     enum class Following { no, onThread, byHand };
 
+    void rememberQuery(const std::string& query, const VXPathObserverRef& observer, VXPathListRef queryScope,
+                       unsigned queryRunMode) VX_EXCLUDES(mutex_);
+    void makeLiveQueries() VX_REQUIRES(mutex_);
+    std::shared_ptr<LiveQueries> liveQueries() const VX_EXCLUDES(mutex_);  // nil while none are followed
     void begin(Following following) VX_EXCLUDES(mutex_);
     void registerSubscriber(const std::string& path, const Subscriber& subscriber) VX_EXCLUDES(mutex_);
     // Made when it is first wanted; nil while changes are not followed.
@@ -95,6 +101,9 @@ class PathWatcher final : public VXPathWatcher {
     std::shared_ptr<ChangeFollower> follower_ VX_GUARDED_BY(mutex_);
     WarningHandler warningHandler_ VX_GUARDED_BY(mutex_) = [](const std::string&) {};
     std::vector<QueryRegistration> queries_ VX_GUARDED_BY(mutex_);
+    std::shared_ptr<LiveQueries> liveQueries_ VX_GUARDED_BY(mutex_);
+
+    std::shared_ptr<const ChangeListener> queryListener_;  // constant once the queries are followed
 };
 
 }  // namespace vexo

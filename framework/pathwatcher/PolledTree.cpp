@@ -99,7 +99,7 @@ std::vector<std::string> PolledTree::look(const std::atomic<bool>& stopped) {
     if (stopped || (isKnown_ && now == known_))
         return {};
     std::swap(known_, now);
-    return std::exchange(isKnown_, true) ? changesSince(now) : std::vector<std::string>();
+    return std::exchange(isKnown_, true) ? changesSince(now) : std::vector{reported("")};
 }
 
 PolledTree::Appearance PolledTree::appearance(const std::atomic<bool>& stopped) const {

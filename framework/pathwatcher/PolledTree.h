@@ -20,7 +20,8 @@ class PolledTree {
     const PolledPlace& place() const { return place_; }
 
     // Looks at all of it, for as long as a server takes. Answers what changed since the last look, each path
-    // once: nothing at the first. `stopped` ends the look early; its answer is then worth nothing.
+    // once: at the first look the place itself. `stopped` ends the look early; its answer is then worth
+    // nothing.
     std::vector<std::string> look(const std::atomic<bool>& stopped);
 
   private:

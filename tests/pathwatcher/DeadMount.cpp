@@ -1,0 +1,61 @@
+#include "tests/pathwatcher/DeadMount.h"
+
+#include <fcntl.h>
+#include <fmt/format.h>
+#include <linux/fuse.h>
+#include <sys/mount.h>
+
+#include <array>
+#include <cerrno>
+#include <cstring>
+#include <stdexcept>
+
+namespace testing_support {
+
+namespace {
+
+using Request = std::array<char, FUSE_MIN_READ_BUFFER>;
+
+void readRequest(int server, Request& request) {
+    if (read(server, request.data(), request.size()) < static_cast<ssize_t>(sizeof(fuse_in_header)))
+        throw std::runtime_error(std::string("cannot read a request: ") + std::strerror(errno));
+}
+
+}  // namespace
+
+DeadMount::DeadMount(const std::string& mountPoint)
+    : mountPoint_(mountPoint), server_(open("/dev/fuse", O_RDWR | O_CLOEXEC)) {
+    const std::string options = fmt::format("fd={},rootmode=40000,user_id=0,group_id=0", server_.number());
+    if (!server_ || mount("me@gone:/", mountPoint.c_str(), "fuse.sshfs", 0, options.c_str()) != 0)
+        throw std::runtime_error(std::string("cannot mount: ") + std::strerror(errno));
+    greet();
+}
+
+DeadMount::~DeadMount() {
+    umount2(mountPoint_.c_str(), MNT_DETACH);
+}
+
+// Without this the kernel holds all requests back.
+void DeadMount::greet() const {
+    Request request{};
+    readRequest(server_.number(), request);
+    fuse_in_header header{};
+    std::memcpy(&header, request.data(), sizeof header);
+    struct {
+        fuse_out_header header;
+        fuse_init_out answer;
+    } reply{};
+    reply.header = {sizeof reply, 0, header.unique};
+    reply.answer.major = FUSE_KERNEL_VERSION;
+    reply.answer.minor = FUSE_KERNEL_MINOR_VERSION;
+    reply.answer.max_write = 4096;
+    if (write(server_.number(), &reply, sizeof reply) != sizeof reply)
+        throw std::runtime_error(std::string("cannot greet the kernel: ") + std::strerror(errno));
+}
+
+void DeadMount::awaitRequest() const {
+    Request request{};
+    readRequest(server_.number(), request);
+}
+
+}  // namespace testing_support
