@@ -273,12 +273,13 @@ TEST_F(Representative, IsAnItemOfItsOwnForTheBestMovie) {
 
 TEST_F(Representative, HasTheThumbnailOfTheBestMovieAsItsIcon) {
     const Group beach = project();
-    EXPECT_EQ(plugin()._representingMediaObjectForProject(beach)->icon(), nullptr);
+    const Object best = beach->mediaObjects()[1];
+    ASSERT_NE(best->thumbnailImage(), nullptr);
+    EXPECT_EQ(plugin()._representingMediaObjectForProject(beach)->icon(), best->thumbnailImage());
+
     const auto thumbnail = plugin().iconNamed(reelix::MBReelixIcon);
-    beach->mediaObjects()[1]->setThumbnailImage(thumbnail);
-    const Object item = plugin()._representingMediaObjectForProject(beach);
-    EXPECT_EQ(item->icon(), thumbnail);
-    EXPECT_EQ(item->thumbnailImage(), nullptr);
+    best->setThumbnailImage(thumbnail);
+    EXPECT_EQ(plugin()._representingMediaObjectForProject(beach)->icon(), thumbnail);
 }
 
 TEST_F(Representative, HasNoResolutionWhereTheMovieHasNone) {

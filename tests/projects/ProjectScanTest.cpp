@@ -115,7 +115,7 @@ TEST_F(ProjectScan, ARenderedMovieBecomesAnItem) {
     EXPECT_EQ(item->name(), "The.Best");
     EXPECT_EQ(item->icon(), reelix::iconCache().smallApplicationIcon.get());
     EXPECT_TRUE(item->icon());
-    EXPECT_EQ(item->thumbnailImage(), nullptr);
+    EXPECT_EQ(item->thumbnailImage()->name(), "thumbnail of " + movie);  // the host's own
     const platform::Dictionary attributes{{"VXReelixProjectPathKey", package},
                                           {"VXReelixProjectFormatVersion", "7"}};
     EXPECT_EQ(platform::Value(item->attributes()), platform::Value(attributes));
