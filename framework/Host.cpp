@@ -107,11 +107,17 @@ struct Host::State {
     std::vector<LoadedPlugin> plugins;
 };
 
-Host::Host(const HostOptions& options) : state_(std::make_unique<State>(options)) {}
+Host::Host(const HostOptions& options) : state_(std::make_unique<State>(options)) {
+    state_->pathWatcher.setWarningHandler(
+        [&diagnostics = state_->diagnostics](const std::string& warning) { diagnostics.warn(warning); });
+    if (options.followsChanges)
+        state_->pathWatcher.start();
+}
 
 Host::~Host() {
     for (const LoadedPlugin& plugin : state_->plugins)
         plugin.manager->close();
+    state_->pathWatcher.close();
     state_->thumbnails.close();
     if (state_->prefetcher)
         state_->prefetcher->close();
@@ -199,7 +205,7 @@ Diagnostics& Host::diagnostics() {
     return state_->diagnostics;
 }
 
-const PathWatcher& Host::pathWatcher() const {
+PathWatcher& Host::pathWatcher() {
     return state_->pathWatcher;
 }
 

@@ -21,13 +21,15 @@ class PathWatcher;
 
 struct HostOptions {
     // The home to browse; nil for the user's own. Preferences are read from it as well.
-    std::optional<std::string> homeDirectory;
+    std::optional<std::string> homeDirectory = {};
     // Bundle folders to load instead of those found in the usual places.
-    std::vector<std::string> pluginBundles;
+    std::vector<std::string> pluginBundles = {};
     Verbosity verbosity = Verbosity::normal;
     // Whether the index learns of every movie of a loaded tree while nobody waits for it. For programs that
     // stay.
     bool prefetchesMetadata = false;
+    // Whether trees are kept up to date, by following changes in the file system.
+    bool followsChanges = false;
 };
 
 // A plug-in that was loaded; no field is nil.
@@ -58,7 +60,7 @@ class Host {
     void cancelLoading();
 
     Diagnostics& diagnostics();
-    const PathWatcher& pathWatcher() const;
+    PathWatcher& pathWatcher();
     const MetadataStore& metadata() const;
     // What the program that reads movies has given up, in words for people; nil when it cannot be started.
     std::optional<std::vector<std::string>> mediaReaderConfinement();

@@ -2,6 +2,7 @@
 
 #include <CLI/CLI.hpp>
 #include <charconv>
+#include <cmath>
 #include <filesystem>
 #include <iostream>
 
@@ -24,7 +25,11 @@ struct Arguments {
     bool verbose = false;
     bool json = false;
     TreeOptions tree;
+    std::optional<double> watchSeconds;
     std::vector<std::string> files;
+    std::string expression;
+    std::vector<std::string> folders;
+    bool watchesQuery = false;
     std::string demoFolder;
 };
 
@@ -47,9 +52,11 @@ struct Parser {
 
   private:
     void addTree(Arguments& arguments);
+    void addWatch(Arguments& arguments);
     void addInfo(Arguments& arguments);
     void addLocations(Arguments& arguments);
     void addMetadata(Arguments& arguments);
+    void addQuery(Arguments& arguments);
     void addDemo(Arguments& arguments);
     CLI::App* addCommand(const std::string& name, const std::string& summary);
 };
@@ -58,12 +65,35 @@ OutputFormat format(const Arguments& arguments) {
     return arguments.json ? OutputFormat::json : OutputFormat::text;
 }
 
+WatchOptions watchOptions(const Arguments& arguments) {
+    WatchOptions options{format(arguments), std::nullopt};
+    if (arguments.watchSeconds)
+        options.time = std::chrono::duration<double>(*arguments.watchSeconds);
+    return options;
+}
+
 // Empty for a number of levels, else what is wrong with the text.
 std::string wholeNumber(const std::string& text) {
     int number = 0;
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
     const bool isWhole = error == std::errc() && end == text.data() + text.size() && number >= 0;
     return isWhole ? "" : "'" + text + "' is no whole number from 0 up";
+}
+
+// The same for a length of time, with or without decimals.
+std::string numberOfSeconds(const std::string& text) {
+    double number = 0;
+    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
+    const bool isLength =
+        error == std::errc() && end == text.data() + text.size() && number >= 0 && std::isfinite(number);
+    return isLength ? "" : "'" + text + "' is no number of seconds";
+}
+
+// The same for a query.
+std::string queryExpression(const std::string& text) {
+    const auto result = QueryExpression::parse(text);
+    const auto* error = std::get_if<QuerySyntaxError>(&result);
+    return error ? error->description() : "";
 }
 
 Parser::Parser(Arguments& arguments)
@@ -80,9 +110,11 @@ Parser::Parser(Arguments& arguments)
     app.add_flag("--verbose", arguments.verbose, "Print the host's log on standard error")->excludes(quiet);
 
     addTree(arguments);
+    addWatch(arguments);
     addInfo(arguments);
     addLocations(arguments);
     addMetadata(arguments);
+    addQuery(arguments);
     addDemo(arguments);
 }
 
@@ -101,6 +133,20 @@ void Parser::addTree(Arguments& arguments) {
     });
 }
 
+void Parser::addWatch(Arguments& arguments) {
+    CLI::App* watch = addCommand("watch", "Print the tree, and stay and print each new one");
+    watch->add_flag("--json", arguments.json, "Print one JSON document a line");
+    watch->add_option("--for", arguments.watchSeconds, "Stay no longer than this; 0 for the first tree alone")
+        ->option_text("SECONDS")
+        ->check(numberOfSeconds);
+    watch->callback([this, &arguments] {
+        hostCommand = {
+            Needs::plugins,
+            [&arguments](Host& host) { return runWatch(host, watchOptions(arguments), std::cout); },
+            {.prefetchesMetadata = true, .followsChanges = true}};
+    });
+}
+
 void Parser::addInfo(Arguments& arguments) {
     CLI::App* info = addCommand("info", "Print the plug-ins found and what they say of themselves");
     info->add_flag("--json", arguments.json, "Print JSON");
@@ -116,7 +162,8 @@ void Parser::addLocations(Arguments& arguments) {
     locations->add_flag("--json", arguments.json, "Print JSON");
     locations->callback([this, &arguments] {
         hostCommand = {Needs::plugins,
-                       [&arguments](Host& host) { return runLocations(host, format(arguments), std::cout); }};
+                       [&arguments](Host& host) { return runLocations(host, format(arguments), std::cout); },
+                       {.followsChanges = true}};
     });
 }
 
@@ -129,6 +176,29 @@ void Parser::addMetadata(Arguments& arguments) {
         hostCommand = {Needs::hostAlone, [&arguments](Host& host) {
                            return runMetadata(host, arguments.files, format(arguments), std::cout);
                        }};
+    });
+}
+
+void Parser::addQuery(Arguments& arguments) {
+    CLI::App* query = addCommand("query", "Print the files whose metadata an expression means");
+    query->add_flag("--json", arguments.json, "Print JSON, one document a line");
+    query->add_flag("--watch", arguments.watchesQuery, "Stay, and print the results after each change");
+    query->add_option("EXPRESSION", arguments.expression, "What is asked, \"kMDItemPixelWidth >= 1920\" say")
+        ->required()
+        ->check(queryExpression);
+    query->add_option("--in", arguments.folders, "The folders to look through")
+        ->option_text("DIR...")
+        ->required();
+    query->callback([this, &arguments] {
+        const auto expression = QueryExpression::parse(arguments.expression);
+        hostCommand = {Needs::hostAlone,
+                       [&arguments, expression](Host& host) {
+                           return runQuery(host,
+                                           {format(arguments), std::get<QueryExpression>(expression),
+                                            arguments.folders, arguments.watchesQuery},
+                                           std::cout);
+                       },
+                       {.followsChanges = arguments.watchesQuery}};
     });
 }
 

@@ -1,12 +1,14 @@
 // The commands of vexo. Each writes its answer to `out` and answers what went wrong.
 #pragma once
 
+#include <chrono>
 #include <optional>
 #include <ostream>
 #include <string>
 #include <vector>
 
 #include "framework/Host.h"
+#include "framework/queries/QueryExpression.h"
 
 namespace vexo {
 
@@ -28,12 +30,27 @@ struct InfoOptions {
     bool withMediaReader = false;  // start the program that reads movies and ask what it has given up
 };
 
+struct WatchOptions {
+    OutputFormat format = OutputFormat::text;
+    std::optional<std::chrono::duration<double>> time;  // to stay after the first tree; nil for ever
+};
+
+struct QueryOptions {
+    OutputFormat format = OutputFormat::text;
+    QueryExpression expression;
+    std::vector<std::string> folders;
+    bool watches = false;  // stays, and prints the results again after each change
+};
+
 Problems runTree(Host& host, const TreeOptions& options, std::ostream& out);
 Problems runInfo(Host& host, const InfoOptions& options, std::ostream& out);
 Problems runLocations(Host& host, OutputFormat format, std::ostream& out);
-// Needs no plug-in.
+// Requires: the host follows changes. Stays until SIGINT or SIGTERM, or until the time is over.
+Problems runWatch(Host& host, const WatchOptions& options, std::ostream& out);
+// These need no plug-in.
 Problems runMetadata(Host& host, const std::vector<std::string>& files, OutputFormat format,
                      std::ostream& out);
+Problems runQuery(Host& host, QueryOptions options, std::ostream& out);
 // Needs no host: writes a sample home into `folder`.
 Problems runDemo(const std::string& folder, std::ostream& out);
 

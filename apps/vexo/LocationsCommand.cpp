@@ -14,12 +14,14 @@ struct Location {
     std::string path;
     std::optional<std::string> resolvedPath;  // nil where no volume has the name
     bool exists;
-    std::optional<std::string> watchedThrough;  // itself or a folder above it
+    WatchState watching;
+
+    bool isWatched() const { return watching.how != WatchState::How::none; }
 };
 
 Location locate(const std::string& path, const PathWatcher& watcher) {
     const platform::FileManager& files = platform::services().fileManager;
-    return {path, files.resolvedPath(path), files.fileExistsAtPath(path), watcher.watchedAncestor(path)};
+    return {path, files.resolvedPath(path), files.fileExistsAtPath(path), watcher.watchStateOf(path)};
 }
 
 // The folders of one kind of library, of all plug-ins, in the order in which they are looked at.
@@ -36,12 +38,16 @@ std::vector<Location> locationsOf(Host& host, std::string_view kind) {
     return locations;
 }
 
-std::string reason(const Location& location) {
-    if (!location.watchedThrough)
-        return "no plug-in watches it";
-    const std::string through =
-        *location.watchedThrough == location.path ? "" : " through " + *location.watchedThrough;
-    return "registered" + through + "; this program reads the libraries once and does not follow changes";
+const char* nameOf(WatchState::How how) {
+    switch (how) {
+        case WatchState::How::events:
+            return "events";
+        case WatchState::How::polling:
+            return "polling";
+        case WatchState::How::none:
+            break;
+    }
+    return "none";
 }
 
 Json jsonLocations(const std::vector<Location>& locations) {
@@ -50,9 +56,9 @@ Json jsonLocations(const std::vector<Location>& locations) {
         json.push_back({{"path", jsonText(location.path)},
                         {"resolvedPath", jsonText(location.resolvedPath)},
                         {"exists", location.exists},
-                        {"watched", location.watchedThrough.has_value()},
-                        {"how", "none"},
-                        {"why", jsonText(reason(location))}});
+                        {"watched", location.isWatched()},
+                        {"how", nameOf(location.watching.how)},
+                        {"why", jsonText(location.watching.why)}});
     return json;
 }
 
@@ -74,6 +80,11 @@ void printJson(Host& host, std::ostream& out) {
         << "\n";
 }
 
+// "events: watched through /home/you/Movies"
+std::string describe(const WatchState& watching) {
+    return nameOf(watching.how) + (": " + printable(watching.why));
+}
+
 void printLocations(const char* title, const std::vector<Location>& locations, const OutputStyle& style,
                     std::ostream& out) {
     out << style.bold(title) << "\n";
@@ -81,7 +92,7 @@ void printLocations(const char* title, const std::vector<Location>& locations, c
         out << (location.exists ? "  found    " : style.dim("  missing  ")) << printable(location.path);
         if (location.resolvedPath && *location.resolvedPath != location.path)
             out << style.dim(" → " + printable(*location.resolvedPath));
-        out << "\n";
+        out << "\n           " << style.dim(describe(location.watching)) << "\n";
     }
 }
 
