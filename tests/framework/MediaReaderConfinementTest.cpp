@@ -6,10 +6,8 @@
 #include "tests/framework/ForeignCall.h"
 #include "tests/framework/RunningReader.h"
 
-using testing::AnyOf;
 using testing::Contains;
 using testing::ContainsRegex;
-using testing::ElementsAre;
 
 namespace vexo {
 namespace {
@@ -21,7 +19,13 @@ constexpr bool isSanitized = true;
 constexpr bool isSanitized = false;
 #endif
 
-using Names = std::vector<std::string>;
+// How many filters of system calls a process is subject to, by its /proc/…/status. A container may have put
+// some on all of its processes.
+int filtersIn(const std::string& status) {
+    const std::string key = "Seccomp_filters:";
+    const auto found = status.find(key);
+    return found == std::string::npos ? 0 : std::stoi(status.substr(found + key.size()));
+}
 
 TEST(MediaReaderConfinement, LimitsWhatTheReaderMayUse) {
     const RunningReader program;
@@ -39,7 +43,7 @@ TEST(MediaReaderConfinement, SaysWhetherSystemCallsAreFiltered) {
     const RunningReader program;
     const auto given = decodeGreeting(program.receive());
     ASSERT_TRUE(given);
-    const bool isFiltered = program.about("status").find("Seccomp:\t2") != std::string::npos;
+    const bool isFiltered = filtersIn(program.about("status")) > filtersIn(contentOf("/proc/self/status"));
     EXPECT_EQ(testing::Value(*given, Contains("seccomp")), isFiltered);
     EXPECT_TRUE(isFiltered || isSanitized);
 }
@@ -48,7 +52,6 @@ TEST(MediaReaderConfinement, IsToldByTheMediaReader) {
     ProcessMediaReader reader({realProgram});
     const RunningReader program;
     EXPECT_EQ(reader.confinement(), decodeGreeting(program.receive()));
-    EXPECT_EQ(reader.confinement()->size(), isSanitized ? 2u : 4u);
     EXPECT_EQ(reader.startedHelpers(), 1);
 }
 
@@ -72,7 +75,7 @@ class ConfinedReader : public testing::Test {
     long long make(long number, ForeignCall::Arguments arguments = {}) {
         return call_->make(number, arguments);
     }
-    // Text among the arguments lies at `text_` in the reader.
+    // The address at which the text now lies in the reader.
     unsigned long long placed(const std::string& text) { return call_->place(text); }
 
     RunningReader program_;
