@@ -98,7 +98,8 @@ void FolderTree::heard(Folder& folder, const FileEvent& event) {
         return heardOfContent(folder, event);
     markChanged(folder);
     if (event.kinds & IN_ISDIR)
-        examine(folder, std::string(event.name));
+        examine(folder, std::string(event.name),
+                event.kinds & IN_MOVED_TO ? Known::isOutdated : Known::isKept);
 }
 
 void FolderTree::heardOfItself(Folder& folder, const FileEvent& event) {
@@ -126,12 +127,14 @@ void FolderTree::lost(Folder& folder, bool unmounted) {
     examine(*folder.parent, std::string(folder.name));
 }
 
-void FolderTree::examine(Folder& parent, const std::string& name) {
+// A folder that was moved here may be known, from a listing or because it was here before. What happened in
+// it while it was elsewhere was looked for here, in vain; so it is explored anew.
+void FolderTree::examine(Folder& parent, const std::string& name, Known whatIsKnown) {
     auto found = std::make_unique<Folder>(*this, &parent, name);
     follow(*found);
     const auto known = parent.children.find(name);
     if (known != parent.children.end()) {
-        if (found->isFollowed() && known->second->isFollowedLike(*found))
+        if (whatIsKnown == Known::isKept && found->isFollowed() && known->second->isFollowedLike(*found))
             return;
         std::unique_ptr<Folder> outdated = std::move(known->second);
         parent.children.erase(known);

@@ -58,13 +58,15 @@ class FolderTree {
   private:
     class Folder;
     enum class Discovery { initial, appeared };
+    // What becomes of a known folder when the same is found again.
+    enum class Known { isKept, isOutdated };
 
     void heard(Folder& folder, const FileEvent& event);
     void heardOfItself(Folder& folder, const FileEvent& event);
     void heardOfContent(Folder& folder, const FileEvent& event);
     void lost(Folder& folder, bool unmounted);
 
-    void examine(Folder& parent, const std::string& name);
+    void examine(Folder& parent, const std::string& name, Known whatIsKnown = Known::isKept);
     void add(std::unique_ptr<Folder> folder, Discovery discovery);
     void explore(Folder& folder, Discovery discovery);
     void discover(Folder& parent, const std::string& name, std::vector<Folder*>& discovered);

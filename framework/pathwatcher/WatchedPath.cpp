@@ -64,12 +64,13 @@ WatchedPath::Trails WatchedPath::newTrails() {
     return trails;
 }
 
+// What was away for a moment is not where it was: what happened in it meanwhile was looked for here, in vain.
 bool WatchedPath::leadsWhereItDid(const Trails& next) {
     const PathTrail &before = trail(), &now = *next.back();
     if (before.end() != now.end() || before.path() != now.path() || before.explanation() != now.explanation())
         return false;
     if (now.end() == End::folder)
-        return tree_ && tree_->isInPlace();
+        return !wasTouched_ && tree_ && tree_->isInPlace();
     return now.end() != End::file || (!wasTouched_ && before.entry() == now.entry());
 }
 
@@ -123,7 +124,7 @@ void WatchedPath::contentChanged() {
 }
 
 void WatchedPath::treeWasLost(bool unmounted) {
-    isInDoubt_ = true;
+    isInDoubt_ = wasTouched_ = true;
     if (unmounted)
         means_.warn(path_ + " was unmounted");
 }

@@ -64,7 +64,7 @@ class WatchedPath final : public PathTrail::Owner, public FolderTree::Owner {
     std::unique_ptr<PolledSubtree> polled_;
     std::string trouble_;  // why a folder at the path can't be watched
     bool isInDoubt_ = false;
-    bool wasTouched_ = false;  // what is at the path was certainly replaced
+    bool wasTouched_ = false;  // the path led elsewhere, if only for a moment
 };
 
 }  // namespace vexo

@@ -1,0 +1,170 @@
+// A watcher against chance: after any row of changes, however they fall between its own steps, it has
+// reported what differs and watches what exists.
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+
+#include <atomic>
+#include <filesystem>
+#include <fstream>
+#include <thread>
+
+#include "framework/pathwatcher/PackageName.h"
+#include "framework/pathwatcher/WatchedPaths.h"
+#include "platform/Path.h"
+#include "tests/pathwatcher/ExpectedReports.h"
+#include "tests/pathwatcher/FakeDisk.h"
+#include "tests/pathwatcher/FakeMounts.h"
+#include "tests/pathwatcher/FakePolling.h"
+#include "tests/pathwatcher/RandomSource.h"
+#include "tests/pathwatcher/WatcherTest.h"
+
+using namespace testing_support;
+using namespace vexo;
+
+namespace fs = std::filesystem;
+namespace path = platform::path;
+
+namespace {
+
+// Few names, so that they meet often.
+std::string randomPathBelow(const std::string& folder, RandomSource& random) {
+    static const std::vector<std::string> names{"a", "b", "c", "d.qnproject", "e.mov"};
+    std::string path = folder;
+    for (std::size_t depth = 1 + random.below(5); depth > 0; --depth)
+        path = path::appending(path, random.among(names));
+    return path;
+}
+
+std::set<std::string> relativeTo(const std::string& folder, const std::set<std::string>& paths) {
+    std::set<std::string> relative;
+    for (const std::string& path : paths)
+        relative.insert(path == folder ? "" : path.substr(folder.size() + 1));
+    return relative;
+}
+
+std::set<std::string> foldersOf(const Picture& picture) {
+    std::set<std::string> folders;
+    for (const auto& [folder, entries] : picture)
+        folders.insert(folder);
+    return folders;
+}
+
+void expectReports(const Picture& before, const Picture& after, const std::set<std::string>& reports) {
+    for (const std::string& folder : foldersToReport(before, after))
+        EXPECT_TRUE(reports.contains(folder)) << "folder '" << folder << "' was not reported";
+    for (const std::string& file : filesToReport(before, after))
+        EXPECT_TRUE(coversFile(reports, file)) << "file '" << file << "' was not reported";
+}
+
+// A disk in memory, whose changes also fall between the calls that the watcher makes.
+class WalkOnFakeDisk {
+  public:
+    WalkOnFakeDisk() : paths_(seams()) {
+        disk_.makeFolder("/home");
+        disk_.makeFolder("/home/Movies");
+        disk_.makeFolder("/tmp");
+        paths_.add("/home/Movies");
+        disk_.afterLook = [this] {
+            if (isWalking_ && random.oneIn(3))
+                change();
+        };
+    }
+
+    // Some changes while the watcher takes in events now and then, and at last all.
+    void walk() {
+        isWalking_ = true;
+        before_ = disk_.picture("/home/Movies");
+        rootBefore_ = disk_.identityOf("/home/Movies");
+        rootWasTouched_ = false;
+        for (std::size_t i = random.below(60); i > 0; --i) {
+            change();
+            if (random.oneIn(4))
+                paths_.takeEvents();
+        }
+        isWalking_ = false;
+        while (disk_.queueLength() > 0)
+            paths_.takeEvents();
+    }
+
+    void check() {
+        const Picture after = disk_.picture("/home/Movies");
+        const auto watched = paths_.watchedFolders();
+        EXPECT_EQ(relativeTo("/home/Movies", {watched.begin(), watched.end()}), foldersOf(after));
+        EXPECT_EQ(watched.size(), after.size()) << "a folder is watched twice";
+        EXPECT_EQ(paths_.watchCount(), disk_.watchCount());
+        std::set<std::string> reports;
+        for (const auto& [watchedPath, changed] : paths_.burst().take())
+            reports.insert(changed.begin(), changed.end());
+        if (rootWasTouched_ && reports.contains("/home/Movies"))
+            return;
+        EXPECT_EQ(rootBefore_, disk_.identityOf("/home/Movies"));
+        expectReports(before_, after, relativeTo("/home/Movies", reports));
+    }
+
+    RandomSource random;
+
+  private:
+    WatchSeams seams() {
+        WatchSeams seams;
+        seams.events = disk_.events();
+        seams.folders = disk_.access();
+        seams.mounts = std::make_unique<FakeMounts>(mounts_);
+        seams.polling = std::make_unique<FakePolling>(looks_);
+        seams.resolvedPath = [](const std::string& path) { return std::optional(path); };
+        return seams;
+    }
+
+    void change() {
+        if (random.oneIn(40))
+            return changeRoot();
+        const std::string place = randomPathBelow("/home/Movies", random);
+        switch (random.below(8)) {
+            case 0:
+            case 1:
+            case 2:
+                disk_.makeFolder(place);
+                break;
+            case 3:
+                disk_.makeFile(place);
+                break;
+            case 4:
+                disk_.write(place);
+                break;
+            case 5:
+                disk_.removeWithAllInIt(place);
+                break;
+            case 6:
+                disk_.rename(place, randomPathBelow(random.oneIn(4) ? "/tmp" : "/home/Movies", random));
+                break;
+            default:
+                disk_.rename(randomPathBelow("/tmp", random), place);
+        }
+    }
+    void changeRoot() {
+        static const std::vector<std::string> places{"/home", "/home/Movies", "/tmp/home", "/tmp/Movies"};
+        const std::string from = random.among(places), to = random.among(places);
+        const bool touches = disk_.rename(from, to) || disk_.makeFolder(random.among(places));
+        rootWasTouched_ = rootWasTouched_ || touches;
+    }
+
+    FakeDisk disk_;
+    FakeMounts::Table mounts_;
+    FakePolling::Looks looks_;
+    WatchedPaths paths_;
+    bool isWalking_ = false;
+    bool rootWasTouched_ = false;
+    Picture before_;
+    std::uint64_t rootBefore_ = 0;
+};
+
+}  // namespace
+
+TEST(RandomWalk, OnAFakeDiskEveryChangeIsReportedAndEveryFolderWatched) {
+    WalkOnFakeDisk walker;
+    SCOPED_TRACE("VEXO_TEST_SEED=" + std::to_string(walker.random.seed()));
+    for (int i = 0; i < 2000 && !testing::Test::HasFailure(); ++i) {
+        SCOPED_TRACE("walk " + std::to_string(i));
+        walker.walk();
+        walker.check();
+    }
+}
