@@ -3,9 +3,14 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <atomic>
+#include <climits>
 #include <filesystem>
 #include <fstream>
+#include <thread>
 
+#include "framework/pathwatcher/WatchLimits.h"
+#include "platform/linux/FileDescriptor.h"
 #include "tests/pathwatcher/WatcherTest.h"
 
 using namespace testing_support;
@@ -207,5 +212,63 @@ TEST_F(FolderChanges, WhatEndsAtTheSameTimeAsItBeginsIsReported) {
                   fs::remove_all(folder.path("short"));
               }),
               Paths{folder.path()});
+    EXPECT_THAT(follower().watchedFolders(), ElementsAre(folder.path()));
+}
+
+TEST_F(FolderChanges, AFolderThatIsFilledWhileItIsRenamedIsWatchedWhole) {
+    std::string name = folder.makeFolder("0");
+    watch(folder.path());
+    const platform::FileDescriptor filled(open(name.c_str(), O_RDONLY | O_DIRECTORY));
+    std::atomic<bool> isFull = false;
+    std::thread filler([&] {
+        for (int i = 0; i < 300; ++i) {
+            const std::string sub = std::to_string(i);
+            mkdirat(filled.number(), sub.c_str(), 0700);
+            mkdirat(filled.number(), (sub + "/deep").c_str(), 0700);
+        }
+        isFull = true;
+    });
+    for (int i = 1; !isFull; ++i) {
+        const std::string next = folder.path(std::to_string(i));
+        renameAt(name, next);
+        name = next;
+        step(std::chrono::milliseconds(0));
+    }
+    filler.join();
+    settle();
+    EXPECT_EQ(follower().watchedFolders().size(), 602u);
+    EXPECT_EQ(reportsOf([&] { fs::create_directory(name + "/299/deep/x"); }), Paths{name + "/299/deep"});
+}
+
+TEST_F(FolderChanges, WhenTheQueueRunsOverTheWatchedFolderIsReportedAndWatchedAnew) {
+    const auto limit = vexo::readWatchLimits().maxQueuedEvents;
+    if (!limit || *limit > 100'000)
+        GTEST_SKIP() << "the queue is too long to fill";
+    const std::string one = folder.writeFile("sub/1"), other = folder.path("sub/2");
+    watch(folder.path());
+    for (std::int64_t i = 0; i < *limit; ++i)
+        ASSERT_EQ(i % 2 == 0 ? rename(one.c_str(), other.c_str()) : rename(other.c_str(), one.c_str()), 0);
+    folder.makeFolder("unseen/deep");
+    settle();
+    EXPECT_THAT(observer->paths(), testing::Contains(folder.path()));
+    EXPECT_THAT(warnings, ElementsAre(testing::HasSubstr("faster than they could be taken in")));
+    EXPECT_EQ(reportsOf([&] { folder.makeFolder("unseen/deep/x"); }), Paths{folder.path("unseen/deep")});
+}
+
+TEST_F(FolderChanges, FoldersDeeperThanAPathCanBeHarmNobody) {
+    const std::string name(200, 'x');
+    watch(folder.path());
+    platform::FileDescriptor deepest(open(folder.path().c_str(), O_RDONLY | O_DIRECTORY));
+    for (int i = 0; i < 30; ++i) {
+        ASSERT_EQ(mkdirat(deepest.number(), name.c_str(), 0700), 0);
+        deepest = platform::FileDescriptor(openat(deepest.number(), name.c_str(), O_RDONLY | O_DIRECTORY));
+    }
+    settle();
+    EXPECT_EQ(follower().watchedFolders().size(),
+              1 + (PATH_MAX - 1 - folder.path().size()) / (name.size() + 1));
+    EXPECT_EQ(reportsOf([&] { fs::rename(folder.path(name), folder.path("moved")); }).count(folder.path()),
+              1u);
+    fs::remove_all(folder.path("moved"));
+    settle();
     EXPECT_THAT(follower().watchedFolders(), ElementsAre(folder.path()));
 }

@@ -168,3 +168,97 @@ TEST(RandomWalk, OnAFakeDiskEveryChangeIsReportedAndEveryFolderWatched) {
         walker.check();
     }
 }
+
+namespace {
+
+Picture pictureOfDisk(const std::string& folder) {
+    Picture picture;
+    std::vector<std::string> open{""};
+    while (!open.empty()) {
+        const std::string next = open.back();
+        open.pop_back();
+        auto& entries = picture[next];
+        for (const auto& entry : fs::directory_iterator(path::appending(folder, next))) {
+            struct stat status {};
+            if (lstat(entry.path().c_str(), &status) != 0)
+                continue;
+            const bool isFolder = S_ISDIR(status.st_mode);
+            const std::string name = entry.path().filename();
+            entries[name] = {status.st_ino, static_cast<std::uint64_t>(status.st_size), isFolder};
+            if (isFolder)
+                open.push_back(path::appending(next, name));
+        }
+    }
+    return picture;
+}
+
+// One change; impossible ones do nothing.
+void changeDisk(const std::string& folder, const std::string& outside, RandomSource& random) {
+    std::error_code impossible;
+    const std::string place = randomPathBelow(folder, random);
+    switch (random.below(8)) {
+        case 0:
+        case 1:
+            fs::create_directories(place, impossible);
+            break;
+        case 2:
+            fs::create_directory(place, impossible);
+            break;
+        case 3:
+        case 4:
+            if (!fs::is_directory(place, impossible))
+                std::ofstream(place, std::ios::app) << "more";
+            break;
+        case 5:
+            fs::remove_all(place, impossible);
+            break;
+        case 6:
+            fs::rename(place, randomPathBelow(random.oneIn(4) ? outside : folder, random), impossible);
+            break;
+        default:
+            fs::rename(randomPathBelow(outside, random), place, impossible);
+    }
+}
+
+class RandomWalkOnDisk : public WatcherTest {
+  protected:
+    // Changes on a thread of their own, while this one takes the watcher's steps.
+    void walk(std::size_t changes) {
+        std::atomic<bool> isOver = false;
+        std::thread walker([&] {
+            for (std::size_t i = 0; i < changes; ++i)
+                changeDisk(movies, outside.path(), random);
+            isOver = true;
+        });
+        while (!isOver)
+            step(std::chrono::milliseconds(1));
+        walker.join();
+        settle();
+    }
+
+    void check(const Picture& before) {
+        const Picture after = pictureOfDisk(movies);
+        const auto watched = follower().watchedFolders();
+        EXPECT_EQ(relativeTo(movies, {watched.begin(), watched.end()}), foldersOf(after));
+        EXPECT_EQ(watched.size(), after.size()) << "a folder is watched twice";
+        expectReports(before, after, relativeTo(movies, observer->paths()));
+    }
+
+    RandomSource random;
+    const TemporaryFolder outside;
+    const std::string movies = folder.makeFolder("Movies");
+};
+
+}  // namespace
+
+TEST_F(RandomWalkOnDisk, EveryChangeIsReportedAndEveryFolderWatched) {
+    SCOPED_TRACE("VEXO_TEST_SEED=" + std::to_string(random.seed()));
+    watch(movies);
+    for (int i = 0; i < 20 && !HasFailure(); ++i) {
+        SCOPED_TRACE("walk " + std::to_string(i));
+        const Picture before = pictureOfDisk(movies);
+        observer->calls.clear();
+        walk(random.below(400));
+        check(before);
+    }
+}
