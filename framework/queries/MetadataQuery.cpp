@@ -131,7 +131,7 @@ void MetadataQuery::lookAtTree(const std::string& path, const platform::Date& no
 }
 
 void MetadataQuery::lookAt(const std::string& path, const platform::Date& now, Results& results) const {
-    if (results.contains(path) || !expression_.matches(*metadata_.propertiesForFile(path), now))
+    if (!expression_.matches(*metadata_.propertiesForFile(path), now))
         return;
     if (const auto state = stateOf(path))
         results.emplace(path, *state);

@@ -202,14 +202,16 @@ TEST_F(LiveQueriesTest, ARegistrationOfTheSameFoldersReportsNothing) {
 
 TEST_F(LiveQueriesTest, OtherQueriesAndOtherObserversAreRegistrationsOfTheirOwn) {
     const auto other = std::make_shared<Listener>();
-    watchF();
-    watch(scope_, "kMDItemFSName = 'a*'");
+    const std::string query = "kMDItemFSName = 'a*'";
+    watch(scope_);
     queries_.watchQuery(movieQuery, other, scope_, gatherThenReport);
+    queries_.watchQuery(query, other, scope_, gatherThenReport);
+    watch(scope_, query);
     run();
     write("F/a.mov");
     report({folder_});
     EXPECT_THAT(listener_->reports, ElementsAre("+a.mov", "+a.mov"));
-    EXPECT_THAT(other->reports, ElementsAre("+a.mov"));
+    EXPECT_THAT(other->reports, ElementsAre("+a.mov", "+a.mov"));
 }
 
 TEST_F(LiveQueriesTest, AFolderThatIsAddedToTheScopeIsWatchedAndGathered) {
@@ -249,12 +251,27 @@ TEST_F(LiveQueriesTest, AnObserverThatGoesDuringTheWorkIsNotCalled) {
     EXPECT_THAT(host_.diagnostics.warnings(), IsEmpty());
 }
 
+TEST_F(LiveQueriesTest, WorkForAnObserverThatIsGoneEndsAtTheNextChange) {
+    const WatchedMetadata metadata(metadata_, [&] {
+        listener_.reset();
+        queries_.changed({});
+    });
+    const HostServicesScope services({hostServices().pathWatcher, hostServices().imageManager, metadata,
+                                      hostServices().thumbnails, hostServices().diagnostics});
+    for (const char* name : {"F/a.mov", "F/b.mov", "F/c.mov"})
+        write(name);
+    watchF();
+    EXPECT_EQ(metadata.questions, 1);
+}
+
 TEST_F(LiveQueriesTest, AfterClosingNothingIsReported) {
     watchF();
     write("F/a.mov");
     queries_.changed({folder_});
     queries_.close();
     watch(scope_);
+    run();
+    write("F/b.mov");
     report({folder_});
     EXPECT_THAT(listener_->reports, IsEmpty());
 }

@@ -25,28 +25,6 @@ namespace {
 
 const QueryChange nothing;
 
-// Does something at the first question for properties, and at every one counts it.
-class WatchedMetadata final : public MetadataProvider {
-  public:
-    WatchedMetadata(const MetadataProvider& metadata, std::function<void()> atFirst)
-        : metadata_(metadata), atFirst_(std::move(atFirst)) {}
-
-    VXMetadataPropertiesRef propertiesForFile(const std::string& path) const override {
-        if (questions++ == 0)
-            atFirst_();
-        return metadata_.propertiesForFile(path);
-    }
-    bool supportedMovieFile(const std::string& path) const override {
-        return metadata_.supportedMovieFile(path);
-    }
-
-    mutable int questions = 0;
-
-  private:
-    const MetadataProvider& metadata_;
-    const std::function<void()> atFirst_;
-};
-
 class QueryOverFolders : public QueriesTest {
   protected:
     MetadataQuery query(const std::string& text, VXPathListRef scope) {
@@ -209,6 +187,16 @@ TEST_F(QueryOverFolders, ANewScopeTakesThePlaceOfTheOldOne) {
     query.setScope(pathList({home().path("G"), home().path("F/I")}));
     EXPECT_EQ(query.update({}, now_), (QueryChange{{b}, {}, {a}}));
     EXPECT_THAT(query.results(), ElementsAre(inner, b));
+}
+
+TEST_F(QueryOverFolders, AFolderThatLeavesTheScopeCountsAsWhatItIsToTheOthers) {
+    home().writeFile("F/.dot/G/a.mov");
+    const std::string b = home().writeFile("F/I/b.mov");
+    MetadataQuery query = movies({home().path("F"), home().path("F/.dot/G"), home().path("F/I")});
+    query.gather(now_);
+    query.setScope(pathList({home().path("F")}));
+    EXPECT_EQ(query.update({}, now_), (QueryChange{{}, {}, {home().path("F/.dot/G/a.mov")}}));
+    EXPECT_THAT(query.results(), ElementsAre(b));
 }
 
 TEST_F(QueryOverFolders, AVolumeIsKnownByItsNameWhileItIsMounted) {

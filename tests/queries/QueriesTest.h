@@ -5,6 +5,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -27,6 +28,28 @@ class UnwantedReader final : public vexo::MediaReader {
         return vexo::MediaFailure{"unwanted"};
     }
     vexo::MediaFrameAnswer frame(int, int) override { return vexo::MediaFailure{"unwanted"}; }
+};
+
+// Counts how often it is asked for the properties of a file, and does something at the first time.
+class WatchedMetadata final : public vexo::MetadataProvider {
+  public:
+    WatchedMetadata(const vexo::MetadataProvider& metadata, std::function<void()> atFirst)
+        : metadata_(metadata), atFirst_(std::move(atFirst)) {}
+
+    vexo::VXMetadataPropertiesRef propertiesForFile(const std::string& path) const override {
+        if (questions++ == 0)
+            atFirst_();
+        return metadata_.propertiesForFile(path);
+    }
+    bool supportedMovieFile(const std::string& path) const override {
+        return metadata_.supportedMovieFile(path);
+    }
+
+    mutable int questions = 0;
+
+  private:
+    const vexo::MetadataProvider& metadata_;
+    const std::function<void()> atFirst_;
 };
 
 inline vexo::QueryExpression expression(const std::string& text) {

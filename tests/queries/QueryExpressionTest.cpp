@@ -211,6 +211,7 @@ TEST_F(QueryTimes, MonthsAndYearsAreCountedByTheCalendar) {
     EXPECT_EQ(meaning("$time.this_month(-1)"), "2008-12-31T23:00:00Z");
     EXPECT_EQ(meaning("$time.this_month(-2)"), "2008-11-30T23:00:00Z");
     EXPECT_EQ(meaning("$time.this_month(-14)"), "2007-11-30T23:00:00Z");
+    EXPECT_EQ(meaning("$time.this_month(-24110)"), "-0001-11-30T23:00:00Z");
     EXPECT_EQ(meaning("$time.this_month(11)"), "2009-12-31T23:00:00Z");
     EXPECT_EQ(meaning("$time.this_year"), "2008-12-31T23:00:00Z");
     EXPECT_EQ(meaning("$time.this_year(-9)"), "1999-12-31T23:00:00Z");
@@ -350,7 +351,8 @@ INSTANTIATE_TEST_SUITE_P(
 
 INSTANTIATE_TEST_SUITE_P(
     Functions, QueryMistakes,
-    testing::Values(Mistake{"InRange(", "expected the name of a property at position 8"},
+    testing::Values(Mistake{"Range(a, 1, 2)", "expected an operator after 'Range' at position 5"},
+                    Mistake{"InRange(", "expected the name of a property at position 8"},
                     Mistake{"InRange(a)", "expected ',' at position 9"},
                     Mistake{"InRange(a,", "expected a value after ',' at position 10"},
                     Mistake{"InRange(a, 1)", "expected ',' at position 12"},
