@@ -28,8 +28,8 @@ class LiveQueries {
     // services.
     void watchQuery(const std::string& query, const VXPathObserverRef& observer, VXPathListRef queryScope,
                     unsigned queryRunMode) VX_EXCLUDES(mutex_);
-    // Something happened in these folders, or to these files; below a folder that is not watched any more, or
-    // where events were lost, anything may have. One call for what happens together costs least.
+    // Something happened in these folders, at any depth, or to these files. What happens together costs least
+    // in one call.
     void changed(const std::vector<std::string>& paths) VX_EXCLUDES(mutex_);
     // Ends all work. A report that is on its way may still arrive.
     void close() VX_EXCLUDES(mutex_);

@@ -1,31 +1,32 @@
 // A query over metadata properties, as a text that people and plug-ins write: read once, asked of many items.
 //
-//     query      = condition, which may be put together with others:
-//                    a || b      either; a is asked first, and b only where a does not decide
-//                    a && b      both; binds more tightly than ||
-//                    !a  (a)     not; and as a whole
+//     query      = a condition, or several of them put together:
+//                    a || b      either; b is asked only where a does not decide
+//                    a && b      both, in the same way; binds more tightly than ||
+//                    !a          the opposite of the one condition that follows
+//                    (a || b)    as a whole
 //     condition  = KEY OPERATOR value
 //                | InRange(KEY, value, value)    neither below the first value nor above the second
-//     KEY        = the name of a property, letters, digits, "_", "." and ":"; * means any property
+//     KEY        = the name of a property: letters, digits, "_", "." and ":"; * means any property
 //     OPERATOR   = == (or =), !=, <, >, <=, >=
 //     value      = text | number | truth | time
-//     text       = '…' or "…"; a backslash takes the next character as it is. * stands for any characters,
-//     none
-//                  included, where the operator is ==, = or !=. Right behind the closing quote may stand
+//     text       = '...' or "..."; a backslash takes the next character as it is, and * stands for any
+//                  characters, or none, where the operator is ==, = or !=. Right behind the closing quote
+//                  may stand
 //                    c   the case of letters counts for nothing
 //                    d   accents and the like count for nothing
-//                    w   the words of the text are compared: they stand side by side anywhere in the
-//                    property.
-//                        A word is letters and digits
+//                    w   words are compared, made of letters and digits: those of the text stand side by
+//                        side anywhere in the property
 //     number     = 12, -0.5, 1e9
 //     truth      = true, false, YES, NO, in any case of letters: the numbers 1 and 0
-//     time       = $time.now              or n seconds from now: $time.now(-3600)
-//                | $time.today            the beginning of the day, or of the n-th from it: $time.today(-7)
-//                | $time.yesterday        the same, counted from yesterday
-//                | $time.this_week        on Monday; n counts weeks, and so on with
-//                | $time.this_month  | $time.this_year
-//                | $time.iso(2008-12-31T23:59:59Z)    or with another zone (+01:00), or in local time without
-//                                         one, or the beginning of a day (2008-12-31)
+//     time       = $time.now           or n seconds from now: $time.now(-3600)
+//                | $time.today         the beginning of the day, or of the n-th from it: $time.today(-7)
+//                | $time.yesterday     the same, counted from yesterday
+//                | $time.this_week     on Monday, n counting weeks; and so on with months and years:
+//                | $time.this_month
+//                | $time.this_year
+//                | $time.iso(2008-12-31T23:59:59Z)    or with another zone (+01:00), or in local time
+//                                                     without one, or the beginning of a day (2008-12-31)
 //
 // Blanks and line ends may stand between all of these. A query has at most `longestQuery` bytes, and at most
 // `deepestQuery` levels of "(" and "!".
