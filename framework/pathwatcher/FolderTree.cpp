@@ -37,7 +37,8 @@ class FolderTree::Folder final : public EventListener {
 
     bool isFollowed() const { return watch >= 0 || pollReason; }
     bool isFollowedLike(const Folder& other) const {
-        return watch == other.watch && pollReason == other.pollReason && explanation == other.explanation;
+        return watch == other.watch && pollReason == other.pollReason && error == other.error &&
+               silentMount == other.silentMount;
     }
     void stopPolling() {
         if (polled)
@@ -56,7 +57,8 @@ class FolderTree::Folder final : public EventListener {
     // Either of the two, or neither for what can't be followed.
     int watch = -1;
     std::optional<PolledSubtree::Reason> pollReason;
-    std::string explanation;  // of the polling
+    std::string silentMount;  // in words for people, where one is to be polled
+    int error = 0;            // errno where watching failed
     bool couldNotBeListed = false;
     std::unique_ptr<PolledSubtree> polled;
 };
@@ -170,7 +172,10 @@ void FolderTree::explore(Folder& folder, Discovery discovery) {
     }
 }
 
+// A broken file system may list a name twice.
 void FolderTree::discover(Folder& parent, const std::string& name, std::vector<Folder*>& discovered) {
+    if (parent.children.contains(name))
+        return;
     auto folder = std::make_unique<Folder>(*this, &parent, name);
     follow(*folder);
     if (!folder->isFollowed())
@@ -188,15 +193,14 @@ int FolderTree::follow(Folder& folder) {
     if (const SilentMount* mount = folder.parent ? means_.mounts.silentMountAt(path) : nullptr) {
         if (mount->source == ChangeSource::polling)
             folder.pollReason = PolledSubtree::Reason::lasting;
-        folder.explanation = explanationOf(*mount);
+        folder.silentMount = explanationOf(*mount);
         return 0;
     }
     const WatchResult result = means_.watches.add(path, folder.parent ? folderKinds : topKinds, folder);
     folder.watch = result.watch;
-    if (result || isNatural(result.error))
-        return result.error;
-    folder.pollReason = PolledSubtree::Reason::passing;
-    folder.explanation = explanationOf(path, result.error);
+    folder.error = result.error;
+    if (!result && !isNatural(result.error))
+        folder.pollReason = PolledSubtree::Reason::passing;
     return result.error;
 }
 
@@ -205,8 +209,10 @@ void FolderTree::poll(Folder& folder) {
     PolledSubtree::Place place{pathBelow(path_, folder), pathBelow(reportedPath_, folder), std::nullopt};
     if (folder.package)
         place.package = pathBelow(reportedPath_, *folder.package);
-    folder.polled = std::make_unique<PolledSubtree>(means_, place, PolledPlace::Depth::tree,
-                                                    *folder.pollReason, folder.explanation);
+    if (folder.error != 0)
+        means_.warnOfFailure(place.path, folder.error);
+    folder.polled =
+        std::make_unique<PolledSubtree>(means_, place, PolledPlace::Depth::tree, *folder.pollReason);
     for (const std::uint64_t number : folder.polled->places())
         polledFolders_[number] = &folder;
 }
@@ -214,7 +220,7 @@ void FolderTree::poll(Folder& folder) {
 void FolderTree::pollInstead(Folder& folder, int error) {
     means_.watches.remove(std::exchange(folder.watch, -1), folder);
     folder.pollReason = PolledSubtree::Reason::passing;
-    folder.explanation = explanationOf(pathBelow(path_, folder), error);
+    folder.error = error;
     folder.couldNotBeListed = true;
     poll(folder);
 }
@@ -271,7 +277,9 @@ void FolderTree::retry(Folder& folder) {
 std::optional<std::string> FolderTree::whyPolled(const std::string& pathInTree) const {
     bool isExact = false;
     const Folder& folder = deepestKnown(pathInTree, isExact);
-    return folder.pollReason ? std::optional(folder.explanation) : std::nullopt;
+    if (!folder.pollReason)
+        return std::nullopt;
+    return folder.error == 0 ? folder.silentMount : explanationOf(pathBelow(path_, folder), folder.error);
 }
 
 std::vector<std::string> FolderTree::watchedFolders() const {

@@ -110,11 +110,13 @@ bool PathTrail::guard(const std::string& folder, const std::string& name) {
     const int error = guards_.back()->watch();
     if (error == 0)
         return true;
-    if (isNatural(error))
+    if (isNatural(error)) {
         hasBlindSpot_ = true;
-    else
-        explanation_ = explanationOf(folder, error);
-    return hasBlindSpot_;
+        return true;
+    }
+    explanation_ = explanationOf(folder, error);
+    means_.warnOfFailure(folder, error);
+    return false;
 }
 
 bool PathTrail::enter(std::string& folder, const std::string& child, Names& names) {

@@ -31,16 +31,13 @@ std::string limitReached(const std::optional<std::int64_t>& limit, std::string_v
 
 }  // namespace
 
-PolledSubtree::PolledSubtree(WatchMeans& means, const Place& place, PolledPlace::Depth depth, Reason reason,
-                             std::string explanation)
-    : means_(means), reason_(reason), explanation_(std::move(explanation)) {
+PolledSubtree::PolledSubtree(WatchMeans& means, const Place& place, PolledPlace::Depth depth, Reason reason)
+    : means_(means) {
     const auto nested = depth == PolledPlace::Depth::tree ? means.mounts.silentMountsBelow(place.path)
                                                           : std::vector<const SilentMount*>();
     places_.push_back(
         means_.polling.add({place.path, means.mounts.mountPointOf(place.path), depth, pathsOf(nested),
                             place.reportedPath, place.package, reason == Reason::passing}));
-    if (reason == Reason::passing)
-        means_.warn(fmt::format("{}; what is not watched is {}", explanation_, rhythmOf(means_.polling)));
     for (const SilentMount* mount : nested)
         if (mount->source == ChangeSource::polling)
             places_.push_back(means_.polling.add(

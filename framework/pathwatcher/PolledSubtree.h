@@ -24,25 +24,21 @@ class PolledSubtree {
     };
 
     // `means` must outlive the object.
-    PolledSubtree(WatchMeans& means, const Place& place, PolledPlace::Depth depth, Reason reason,
-                  std::string explanation);
+    PolledSubtree(WatchMeans& means, const Place& place, PolledPlace::Depth depth, Reason reason);
     ~PolledSubtree();
     PolledSubtree(const PolledSubtree&) = delete;
     PolledSubtree& operator=(const PolledSubtree&) = delete;
 
-    Reason reason() const { return reason_; }
-    // For people: "network file system (nfs)".
-    const std::string& explanation() const { return explanation_; }
+    // Also those below the place.
     const std::vector<std::uint64_t>& places() const { return places_; }
 
   private:
     WatchMeans& means_;
-    const Reason reason_;
-    const std::string explanation_;
     std::vector<std::uint64_t> places_;
 };
 
-// Why changes on a mount are not reported, and why a folder could not be watched; for people.
+// Why changes on a mount are not reported, and why a folder could not be watched; for people:
+// "network file system (nfs4)", "the limit of 8192 watched folders is reached".
 std::string explanationOf(const SilentMount& mount);
 std::string explanationOf(const std::string& folder, int error);
 

@@ -21,6 +21,8 @@ struct WatchMeans {
     // "/Volumes/<display name>/…" as the path of that volume; nil while there is none.
     std::function<std::optional<std::string>(const std::string& path)> resolvedPath;
     std::function<void(const std::string& warning)> warn;
+    // To be told of what is polled because it could not be watched, with errno.
+    std::function<void(const std::string& folder, int error)> warnOfFailure;
     MountKinds mounts = {};
 };
 

@@ -100,11 +100,9 @@ void WatchedPath::pollAsNeeded() {
     const PolledSubtree::Place place{trail().path(), path_, std::nullopt};
     if (end == End::failure || (end == End::silentMount && trail().isWorthPolling()))
         polled_ = std::make_unique<PolledSubtree>(means_, place, PolledPlace::Depth::tree,
-                                                  end == End::failure ? Reason::passing : Reason::lasting,
-                                                  trail().explanation());
+                                                  end == End::failure ? Reason::passing : Reason::lasting);
     else if (trail().hasBlindSpot() && end != End::silentMount)
-        polled_ = std::make_unique<PolledSubtree>(means_, place, PolledPlace::Depth::itself, Reason::lasting,
-                                                  trail().explanation());
+        polled_ = std::make_unique<PolledSubtree>(means_, place, PolledPlace::Depth::itself, Reason::lasting);
 }
 
 // What lies behind a silent mount is not looked at, so it may well exist.

@@ -1,5 +1,7 @@
 #include "framework/pathwatcher/WatchedPaths.h"
 
+#include <fmt/format.h>
+
 #include <utility>
 
 namespace vexo {
@@ -19,6 +21,7 @@ WatchedPaths::WatchedPaths(WatchSeams seams)
              burst_,
              seams_.resolvedPath,
              [this](const std::string& warning) { warn(warning); },
+             [this](const std::string& folder, int error) { warnOfFailure(folder, error); },
              seams_.mounts->table()} {}
 
 // All watches end at once, instead of one after the other as the paths go.
@@ -102,6 +105,13 @@ std::vector<std::string> WatchedPaths::takeWarnings() {
 void WatchedPaths::warn(const std::string& warning) {
     if (knownWarnings_.insert(warning).second)
         newWarnings_.push_back(warning);
+}
+
+// Thousands of folders may fail for one reason.
+void WatchedPaths::warnOfFailure(const std::string& folder, int error) {
+    if (knownFailures_.insert(error).second)
+        warn(fmt::format("{}; what is not watched is {}", explanationOf(folder, error),
+                         rhythmOf(*seams_.polling)));
 }
 
 WatchState WatchedPaths::stateOf(const std::string& watchedPath, const std::string& path) const {

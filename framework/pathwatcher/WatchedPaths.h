@@ -66,6 +66,7 @@ class WatchedPaths {
     void checkDoubts();
     void beginAnew();
     void warn(const std::string& warning);
+    void warnOfFailure(const std::string& folder, int error);
 
     WatchSeams seams_;
     Watches watches_;
@@ -73,6 +74,7 @@ class WatchedPaths {
     WatchMeans means_;
     std::set<std::string> knownWarnings_;
     std::vector<std::string> newWarnings_;
+    std::set<int> knownFailures_;  // errno
     std::map<std::string, std::unique_ptr<WatchedPath>> paths_;
 };
 

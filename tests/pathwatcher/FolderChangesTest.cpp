@@ -255,6 +255,21 @@ TEST_F(FolderChanges, WhenTheQueueRunsOverTheWatchedFolderIsReportedAndWatchedAn
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("unseen/deep/x"); }), Paths{folder.path("unseen/deep")});
 }
 
+// Giving up each of its folders is an event of its own.
+TEST_F(FolderChanges, WhatWaitsBehindAHugeFolderThatGoesIsNotLost) {
+    const TemporaryFolder elsewhere;
+    for (int i = 0; i < 5000; ++i)
+        folder.makeFolder("huge/" + std::to_string(i));
+    watch(folder.path());
+    renameAt(folder.path("huge"), elsewhere.path("huge"));
+    folder.makeFolder("late");
+    settle();
+    EXPECT_THAT(follower().watchedFolders(),
+                testing::UnorderedElementsAre(folder.path(), folder.path("late")));
+    EXPECT_EQ(reportsOf([&] { folder.makeFolder("late/x"); }), Paths{folder.path("late")});
+    EXPECT_THAT(warnings, ElementsAre());
+}
+
 TEST_F(FolderChanges, FoldersDeeperThanAPathCanBeHarmNobody) {
     const std::string name(200, 'x');
     watch(folder.path());

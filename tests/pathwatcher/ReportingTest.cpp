@@ -167,12 +167,11 @@ TEST_F(ReportingThread, NoQueueIsOpenedBeforeThereIsSomethingToFollow) {
     watcher.start();
     EXPECT_EQ(openQueues(), before + 1);
     watcher.watchPath(folder_.path("other"), observer_);
-    EXPECT_EQ(openQueues(), before + 1);
-    watcher.close();
-
     vexo::PathWatcher idle;
     idle.start();
-    EXPECT_EQ(openQueues(), before + 1);  // that of the closed one, until its thread has ended
-    dispatcher_.reset();
+    EXPECT_EQ(openQueues(), before + 1);
+
+    watcher.close();
+    dispatcher_.reset();  // waits for the thread
     EXPECT_EQ(openQueues(), before);
 }
