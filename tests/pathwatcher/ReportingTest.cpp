@@ -3,6 +3,7 @@
 #include <filesystem>
 #include <mutex>
 #include <stdexcept>
+#include <thread>
 
 #include "platform/linux/LinuxDispatcher.h"
 #include "tests/pathwatcher/WatcherTest.h"
@@ -135,6 +136,26 @@ TEST_F(Reporting, WhatComesWhileAnObserverIsToldIsToldInOneGo) {
     };
     settle();
     EXPECT_THAT(observer->calls, ElementsAre(folder.path(), folder.path()));
+    EXPECT_EQ(environment.dispatcher.requests().size(), 1u);
+}
+
+TEST_F(Reporting, AfterClosingWhatWaitsIsDropped) {
+    watch(folder.path());
+    folder.makeFolder("x");
+    do
+        follower().step(vexo::ChangeBurst::length);
+    while (follower().keepsChanges());
+    EXPECT_EQ(environment.dispatcher.pendingCount(), 1u);
+    watcher().close();
+    environment.dispatcher.runDueBlocks();
+    EXPECT_THAT(observer->calls, ElementsAre());
+}
+
+TEST_F(Reporting, AStepThatWaitsSeesAPathThatIsAddedMeanwhile) {
+    std::thread waiting([this, &follows = follower()] { follows.step(vexo::ChangeFollower::forever); });
+    watcher().watchPath(folder.path(), observer);
+    waiting.join();
+    EXPECT_EQ(reportsOf([&] { folder.makeFolder("x"); }), Paths{folder.path()});
 }
 
 TEST_F(Reporting, AfterClosingNobodyIsTold) {

@@ -15,7 +15,7 @@ namespace fs = std::filesystem;
 
 namespace {
 
-using WatchedPaths = WatcherTest;
+using PathsOnDisk = WatcherTest;
 
 std::string at(const vexo::WatchState& state) {
     using How = vexo::WatchState::How;
@@ -27,14 +27,14 @@ std::string at(const vexo::WatchState& state) {
 
 }  // namespace
 
-TEST_F(WatchedPaths, APathThatAppearsWithAllAboveItIsFound) {
+TEST_F(PathsOnDisk, APathThatAppearsWithAllAboveItIsFound) {
     const std::string path = folder.path("a/b/Movies");
     watch(path);
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("a/b/Movies/deep"); }), Paths{path});
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("a/b/Movies/deep/x"); }), Paths{path + "/deep"});
 }
 
-TEST_F(WatchedPaths, APathThatAppearsStepByStepIsFound) {
+TEST_F(PathsOnDisk, APathThatAppearsStepByStepIsFound) {
     const std::string path = folder.path("a/b/Movies");
     watch(path);
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("a"); }), Paths{});
@@ -42,7 +42,7 @@ TEST_F(WatchedPaths, APathThatAppearsStepByStepIsFound) {
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("a/b/Movies"); }), Paths{path});
 }
 
-TEST_F(WatchedPaths, AFolderThatVanishesAndComesBackIsReportedBothTimes) {
+TEST_F(PathsOnDisk, AFolderThatVanishesAndComesBackIsReportedBothTimes) {
     const std::string path = folder.makeFolder("Movies");
     folder.makeFolder("Movies/sub");
     watch(path);
@@ -51,7 +51,7 @@ TEST_F(WatchedPaths, AFolderThatVanishesAndComesBackIsReportedBothTimes) {
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("Movies/sub/x"); }), Paths{path + "/sub"});
 }
 
-TEST_F(WatchedPaths, AFolderThatIsReplacedAtOnceIsReported) {
+TEST_F(PathsOnDisk, AFolderThatIsReplacedAtOnceIsReported) {
     const std::string path = folder.makeFolder("Movies");
     folder.makeFolder("other/inOther");
     watch(path);
@@ -64,7 +64,7 @@ TEST_F(WatchedPaths, AFolderThatIsReplacedAtOnceIsReported) {
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("old/x"); }), Paths{});
 }
 
-TEST_F(WatchedPaths, AParentThatIsRenamedAwayAndBackTakesThePathAlong) {
+TEST_F(PathsOnDisk, AParentThatIsRenamedAwayAndBackTakesThePathAlong) {
     const std::string path = folder.makeFolder("a/b/Movies");
     watch(path);
     EXPECT_EQ(reportsOf([&] { fs::rename(folder.path("a"), folder.path("away")); }), Paths{path});
@@ -73,7 +73,7 @@ TEST_F(WatchedPaths, AParentThatIsRenamedAwayAndBackTakesThePathAlong) {
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("a/b/Movies/meanwhile/x"); }), Paths{path + "/meanwhile"});
 }
 
-TEST_F(WatchedPaths, WhatHappensWhileAParentIsAwayForAMomentIsReported) {
+TEST_F(PathsOnDisk, WhatHappensWhileAParentIsAwayForAMomentIsReported) {
     const std::string path = folder.makeFolder("a/b/Movies");
     watch(path);
     EXPECT_EQ(reportsOf([&] {
@@ -85,21 +85,21 @@ TEST_F(WatchedPaths, WhatHappensWhileAParentIsAwayForAMomentIsReported) {
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("a/b/Movies/meanwhile/x"); }), Paths{path + "/meanwhile"});
 }
 
-TEST_F(WatchedPaths, AParentThatIsDeletedTakesThePathAlong) {
+TEST_F(PathsOnDisk, AParentThatIsDeletedTakesThePathAlong) {
     const std::string path = folder.makeFolder("a/b/Movies");
     watch(path);
     EXPECT_THAT(reportsOf([&] { fs::remove_all(folder.path("a")); }), testing::Contains(path));
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("a/b/Movies"); }), Paths{path});
 }
 
-TEST_F(WatchedPaths, ReportsBelowALinkAreNamedByTheLink) {
+TEST_F(PathsOnDisk, ReportsBelowALinkAreNamedByTheLink) {
     const std::string target = folder.makeFolder("target/sub");
     const std::string link = folder.makeLink("Movies", folder.path("target"));
     watch(link);
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("target/sub/x"); }), Paths{link + "/sub"});
 }
 
-TEST_F(WatchedPaths, ALinkThatIsSetToAnotherFolderIsFollowedThere) {
+TEST_F(PathsOnDisk, ALinkThatIsSetToAnotherFolderIsFollowedThere) {
     folder.makeFolder("one");
     folder.makeFolder("two/sub");
     const std::string link = folder.makeLink("Movies", "one");
@@ -113,7 +113,7 @@ TEST_F(WatchedPaths, ALinkThatIsSetToAnotherFolderIsFollowedThere) {
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("two/sub/x"); }), Paths{link + "/sub"});
 }
 
-TEST_F(WatchedPaths, ALinkOnTheWayThatIsSetElsewhereIsFollowed) {
+TEST_F(PathsOnDisk, ALinkOnTheWayThatIsSetElsewhereIsFollowed) {
     folder.makeFolder("one/Movies");
     folder.makeFolder("two/Movies/sub");
     const std::string link =
@@ -129,13 +129,13 @@ TEST_F(WatchedPaths, ALinkOnTheWayThatIsSetElsewhereIsFollowed) {
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("two/Movies/sub/x"); }), Paths{path + "/sub"});
 }
 
-TEST_F(WatchedPaths, ALinkToNowhereIsFoundToLeadSomewhereOnceItDoes) {
+TEST_F(PathsOnDisk, ALinkToNowhereIsFoundToLeadSomewhereOnceItDoes) {
     const std::string link = folder.makeLink("Movies", folder.path("later/target"));
     watch(link);
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("later/target"); }), Paths{link});
 }
 
-TEST_F(WatchedPaths, LinksInACircleLeadNowhere) {
+TEST_F(PathsOnDisk, LinksInACircleLeadNowhere) {
     const std::string link = folder.makeLink("one", "two");
     folder.makeLink("two", "one");
     watch(link);
@@ -143,7 +143,7 @@ TEST_F(WatchedPaths, LinksInACircleLeadNowhere) {
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("two"); }), Paths{link});
 }
 
-TEST_F(WatchedPaths, AWatchedFileIsReportedForAllThatHappensToIt) {
+TEST_F(PathsOnDisk, AWatchedFileIsReportedForAllThatHappensToIt) {
     const std::string file = folder.writeFile("preferences/suite.plist", "a");
     const std::string other = folder.writeFile("preferences/other.plist", "a");
     watch(file);
@@ -155,21 +155,21 @@ TEST_F(WatchedPaths, AWatchedFileIsReportedForAllThatHappensToIt) {
     EXPECT_EQ(reportsOf([&] { std::ofstream(other, std::ios::app) << "more"; }), Paths{});
 }
 
-TEST_F(WatchedPaths, AWatchedFileIsFoundWhenItsFolderAppears) {
+TEST_F(PathsOnDisk, AWatchedFileIsFoundWhenItsFolderAppears) {
     const std::string file = folder.path("config/suite.plist");
     watch(file);
     EXPECT_EQ(reportsOf([&] { folder.writeFile("config/suite.plist", "a"); }), Paths{file});
     EXPECT_EQ(reportsOf([&] { std::ofstream(file, std::ios::app) << "more"; }), Paths{file});
 }
 
-TEST_F(WatchedPaths, TheTargetOfALinkToAFileIsTheFile) {
+TEST_F(PathsOnDisk, TheTargetOfALinkToAFileIsTheFile) {
     const std::string target = folder.writeFile("real/suite.plist", "a");
     const std::string link = folder.makeLink("suite.plist", target);
     watch(link);
     EXPECT_EQ(reportsOf([&] { std::ofstream(target, std::ios::app) << "more"; }), Paths{link});
 }
 
-TEST_F(WatchedPaths, AFolderThatBecomesAFileIsReportedAndThenWatchedAsOne) {
+TEST_F(PathsOnDisk, AFolderThatBecomesAFileIsReportedAndThenWatchedAsOne) {
     const std::string path = folder.makeFolder("Movies");
     watch(path);
     EXPECT_EQ(reportsOf([&] {
@@ -180,13 +180,13 @@ TEST_F(WatchedPaths, AFolderThatBecomesAFileIsReportedAndThenWatchedAsOne) {
     EXPECT_EQ(reportsOf([&] { std::ofstream(path, std::ios::app) << "more"; }), Paths{path});
 }
 
-TEST_F(WatchedPaths, TheAttributesOfTheFolderAreItsOwnChange) {
+TEST_F(PathsOnDisk, TheAttributesOfTheFolderAreItsOwnChange) {
     const std::string path = folder.makeFolder("Movies");
     watch(path);
     EXPECT_EQ(reportsOf([&] { chmod(path.c_str(), 0700); }), Paths{path});
 }
 
-TEST_F(WatchedPaths, AFolderThatMayNotBeReadIsWatchedOnceItMay) {
+TEST_F(PathsOnDisk, AFolderThatMayNotBeReadIsWatchedOnceItMay) {
     const std::string path = folder.makeFolder("Movies/sub");
     const OrdinaryUser user(folder.path());
     const std::string own = folder.makeFolder("Own/sub");
@@ -198,7 +198,7 @@ TEST_F(WatchedPaths, AFolderThatMayNotBeReadIsWatchedOnceItMay) {
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("Own/sub/x"); }), Paths{own});
 }
 
-TEST_F(WatchedPaths, AFolderBelowThatMayNotBeReadIsWatchedOnceItMay) {
+TEST_F(PathsOnDisk, AFolderBelowThatMayNotBeReadIsWatchedOnceItMay) {
     const OrdinaryUser user(folder.path());
     const std::string sub = folder.makeFolder("sub/deep");
     chmod(folder.path("sub").c_str(), 0000);
@@ -208,7 +208,7 @@ TEST_F(WatchedPaths, AFolderBelowThatMayNotBeReadIsWatchedOnceItMay) {
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("sub/deep/x"); }), Paths{sub});
 }
 
-TEST_F(WatchedPaths, APathBelowAFolderThatMayNotBeReadIsPolled) {
+TEST_F(PathsOnDisk, APathBelowAFolderThatMayNotBeReadIsPolled) {
     const OrdinaryUser user(folder.path());
     folder.makeFolder("dark");
     chmod(folder.path("dark").c_str(), 0300);
@@ -220,7 +220,7 @@ TEST_F(WatchedPaths, APathBelowAFolderThatMayNotBeReadIsPolled) {
     EXPECT_EQ(reportsOf([&] { fs::create_directory(path + "/sub/x"); }), Paths{path + "/sub"});
 }
 
-TEST_F(WatchedPaths, TwoPathsToOneFolderAreBothReported) {
+TEST_F(PathsOnDisk, TwoPathsToOneFolderAreBothReported) {
     const std::string path = folder.makeFolder("Movies");
     const std::string link = folder.makeLink("link", "Movies");
     watch(path);
@@ -230,7 +230,7 @@ TEST_F(WatchedPaths, TwoPathsToOneFolderAreBothReported) {
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("Movies/y"); }), Paths{path});
 }
 
-TEST_F(WatchedPaths, WhatSeveralRegistrationsCoverIsReportedOnce) {
+TEST_F(PathsOnDisk, WhatSeveralRegistrationsCoverIsReportedOnce) {
     const std::string path = folder.makeFolder("Movies/sub");
     watch(folder.path());
     watch(folder.path("Movies"));
@@ -240,13 +240,13 @@ TEST_F(WatchedPaths, WhatSeveralRegistrationsCoverIsReportedOnce) {
     EXPECT_THAT(observer->calls, ElementsAre(path));
 }
 
-TEST_F(WatchedPaths, PathsThatAreNotAbsoluteAreLeftAlone) {
+TEST_F(PathsOnDisk, PathsThatAreNotAbsoluteAreLeftAlone) {
     watch("XXX");
     watch("");
     EXPECT_EQ(at(watcher().watchStateOf("XXX")), "none: it is no absolute path");
 }
 
-TEST_F(WatchedPaths, TheStateOfAPathSaysHowItIsWatched) {
+TEST_F(PathsOnDisk, TheStateOfAPathSaysHowItIsWatched) {
     const std::string path = folder.makeFolder("Movies/sub");
     const std::string missing = folder.path("later/Movies"), file = folder.writeFile("suite.plist");
     watch(folder.path("Movies"));
@@ -261,7 +261,7 @@ TEST_F(WatchedPaths, TheStateOfAPathSaysHowItIsWatched) {
     EXPECT_EQ(at(watcher().watchStateOf(folder.path("other"))), "none: nobody watches it");
 }
 
-TEST_F(WatchedPaths, APathThatNobodyWantsAnyMoreIsGivenUp) {
+TEST_F(PathsOnDisk, APathThatNobodyWantsAnyMoreIsGivenUp) {
     const std::string path = folder.makeFolder("Movies");
     watch(path);
     EXPECT_THAT(follower().watchedFolders(), ElementsAre(path));

@@ -132,6 +132,31 @@ TEST_F(WatchedDisk, WhatIsMadeBetweenTheWatchAndTheListingIsReported) {
     EXPECT_THAT(paths().watchedFolders(), Contains("/home/Movies/new/newer"));
 }
 
+TEST_F(WatchedDisk, WhatWasMadeInAFolderWhileItWasAwayIsFound) {
+    watch("/home/Movies");
+    int looksTaken = 0;
+    disk.afterLook = [&] {
+        if (++looksTaken == 1)  // the folder was looked for where it had been, and is back
+            disk.rename("/home/Movies/a", "/tmp/a");
+        if (looksTaken == 2)  // the new one in it was looked for, and is not there
+            disk.rename("/tmp/a", "/home/Movies/a");
+    };
+    disk.rename("/home/Movies/a", "/tmp/a");
+    disk.makeFolder("/tmp/a/new");
+    disk.rename("/tmp/a", "/home/Movies/a");
+    changes();
+    EXPECT_THAT(paths().watchedFolders(), Contains("/home/Movies/a/new"));
+}
+
+TEST_F(WatchedDisk, WhatWasMadeInTheWatchedPathWhileItWasAwayIsFound) {
+    watch("/home/Movies");
+    disk.afterLook = [&] { disk.rename("/tmp/Movies", "/home/Movies"); };
+    disk.rename("/home/Movies", "/tmp/Movies");
+    disk.makeFolder("/tmp/Movies/new");
+    EXPECT_THAT(changes(), Contains("/home/Movies"));
+    EXPECT_THAT(paths().watchedFolders(), Contains("/home/Movies/new"));
+}
+
 TEST_F(WatchedDisk, AFolderThatIsReplacedByAnEmptyOneOfItsNameIsWatchedAnew) {
     watch("/home/Movies");
     disk.makeFolder("/home/Movies/c");
@@ -221,6 +246,7 @@ TEST_F(WatchedDisk, AFolderThatCantBeListedIsPolledUntilItCan) {
     looks.nothingNew();
     EXPECT_THAT(changes(), IsEmpty());
     EXPECT_THAT(looks.paths(), ElementsAre("/home/Movies/a"));
+    EXPECT_EQ(looks.lastPlace, 1u);  // what is known of it was not thrown away
     disk.listingFailures.clear();
     looks.nothingNew();
     changes();
@@ -232,6 +258,15 @@ TEST_F(WatchedDisk, ReportsOfPlacesThatAreNoLongerPolledAreIgnored) {
     watch("/home/Movies");
     looks.reports.push_back({4711, {"/home/Movies/b"}});
     EXPECT_THAT(changes(), IsEmpty());
+}
+
+TEST_F(WatchedDisk, AFileSystemBelowThatIsUnmountedIsAChangeOfTheFolderAroundIt) {
+    disk.makeFolder("/home/Movies/a/deep");
+    watch("/home/Movies");
+    disk.unmount("/home/Movies/a");
+    EXPECT_THAT(changes(), Contains("/home/Movies"));
+    EXPECT_THAT(paths().watchedFolders(), UnorderedElementsAre("/home/Movies", "/home/Movies/b"));
+    EXPECT_THAT(paths().takeWarnings(), IsEmpty());
 }
 
 TEST_F(WatchedDisk, AnUnmountedPathIsAWarning) {
