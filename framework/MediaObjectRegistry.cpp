@@ -1,6 +1,7 @@
 #include "framework/MediaObjectRegistry.h"
 
 #include <functional>
+#include <vector>
 
 #include "framework/TreeWalk.h"
 
@@ -14,12 +15,15 @@ std::size_t hashOf(const std::string& ID) {
 }  // namespace
 
 void MediaObjectRegistry::registerTree(const VXMediaGroupRef& root) {
-    platform::Locked lock(mutex_);
-    forgetVanished();
-    visitGroups(root, [this](const VXMediaGroupRef& group) VX_REQUIRES(mutex_) {
-        registerObjectsOf(*group);
+    std::vector<VXMediaGroupRef> groups;
+    visitGroups(root, [&groups](const VXMediaGroupRef& group) {
+        groups.push_back(group);
         return true;
     });
+    platform::Locked lock(mutex_);
+    forgetVanished();
+    for (const VXMediaGroupRef& group : groups)
+        registerObjectsOf(*group);
 }
 
 void MediaObjectRegistry::registerObjectsOf(const VXMediaGroup& group) {

@@ -28,7 +28,7 @@ std::optional<std::int64_t> durationOf(const AVFormatContext& format, const AVSt
         return track.duration;
     if (format.duration == AV_NOPTS_VALUE || format.duration <= 0)
         return std::nullopt;
-    return av_rescale_q(format.duration, AV_TIME_BASE_Q, track.time_base);
+    return av_rescale_q(format.duration, av_get_time_base_q(), track.time_base);
 }
 
 std::int64_t beginningOf(const AVStream& track) {
