@@ -277,8 +277,16 @@ void FolderTree::retry(Folder& folder) {
 std::optional<std::string> FolderTree::whyPolled(const std::string& pathInTree) const {
     bool isExact = false;
     const Folder& folder = deepestKnown(pathInTree, isExact);
-    if (!folder.pollReason)
+    return folder.pollReason ? std::optional(whyPolled(folder)) : std::nullopt;
+}
+
+std::optional<std::string> FolderTree::whyPartlyPolled() const {
+    if (polledFolders_.empty())
         return std::nullopt;
+    return whyPolled(*polledFolders_.begin()->second);
+}
+
+std::string FolderTree::whyPolled(const Folder& folder) const {
     return folder.error == 0 ? folder.silentMount : explanationOf(pathBelow(path_, folder), folder.error);
 }
 

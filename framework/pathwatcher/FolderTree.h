@@ -52,6 +52,8 @@ class FolderTree {
 
     // Why what is at a path in the tree is polled; nil when it isn't.
     std::optional<std::string> whyPolled(const std::string& pathInTree) const;
+    // Why some folder in the tree is polled; nil when none is.
+    std::optional<std::string> whyPartlyPolled() const;
     // The paths, as reported, of the folders that are watched through events.
     std::vector<std::string> watchedFolders() const;
 
@@ -77,6 +79,7 @@ class FolderTree {
     static void forget(std::unique_ptr<Folder> folder);
 
     void markChanged(Folder& folder);
+    std::string whyPolled(const Folder& folder) const;
     std::string pathBelow(const std::string& base, const Folder& folder) const;
     Folder& deepestKnown(const std::string& path, bool& isExact) const;
     template <typename Visit>

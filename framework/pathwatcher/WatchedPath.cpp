@@ -154,10 +154,12 @@ bool WatchedPath::take(const PollReport& pollReport) {
 WatchState WatchedPath::stateOf(const std::string& path) const {
     if (!tree_)
         return stateWithoutTree(path);
-    const auto why = tree_->whyPolled(tree_->path() + path.substr(path_.size()));
-    if (why)
-        return {How::polling, fmt::format("{}; {}", *why, rhythmOf(means_.polling))};
-    return {How::events, "watched through " + path_};
+    const std::string rhythm = rhythmOf(means_.polling), watched = "watched through " + path_;
+    if (const auto why = tree_->whyPolled(tree_->path() + path.substr(path_.size())))
+        return {How::polling, fmt::format("{}; {}", *why, rhythm)};
+    if (const auto why = path == path_ ? tree_->whyPartlyPolled() : std::nullopt)
+        return {How::events, fmt::format("{}; some folders below are {}: {}", watched, rhythm, *why)};
+    return {How::events, watched};
 }
 
 WatchState WatchedPath::stateWithoutTree(const std::string& path) const {

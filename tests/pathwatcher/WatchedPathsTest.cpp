@@ -192,7 +192,11 @@ TEST_F(WatchedDisk, FoldersBeyondTheLimitArePolledUntilThereIsRoom) {
     EXPECT_EQ(state.how, WatchState::How::polling);
     EXPECT_THAT(state.why, testing::MatchesRegex(
                                "the limit of [0-9]+ watched folders is reached; looked at every 10 s"));
-    EXPECT_EQ(paths().stateOf("/home/Movies", "/home/Movies/a").how, WatchState::How::events);
+    EXPECT_EQ(paths().stateOf("/home/Movies", "/home/Movies/a").why, "watched through /home/Movies");
+    EXPECT_THAT(
+        paths().stateOf("/home/Movies", "/home/Movies").why,
+        testing::MatchesRegex("watched through /home/Movies; some folders below are looked at every 10 s: "
+                              "the limit of [0-9]+ watched folders is reached"));
     EXPECT_THAT(paths().takeWarnings(), ElementsAre(testing::HasSubstr("watched folders is reached")));
 
     looks.reports.push_back({looks.lastPlace, {"/home/Movies/b/deep"}});
