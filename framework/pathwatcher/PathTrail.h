@@ -6,7 +6,6 @@
 
 #include <deque>
 #include <memory>
-#include <optional>
 #include <string>
 #include <vector>
 

@@ -15,7 +15,6 @@
 // closed, and what is written to a file by another of its hard links in an unwatched folder.
 #pragma once
 
-#include <chrono>
 #include <functional>
 #include <memory>
 #include <optional>

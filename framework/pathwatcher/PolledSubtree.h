@@ -2,7 +2,6 @@
 // which is polled for itself so that one whose server is gone holds up no other.
 #pragma once
 
-#include <functional>
 #include <optional>
 #include <string>
 #include <vector>

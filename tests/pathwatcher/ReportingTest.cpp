@@ -152,7 +152,7 @@ TEST_F(Reporting, AfterClosingWhatWaitsIsDropped) {
 }
 
 TEST_F(Reporting, AStepThatWaitsSeesAPathThatIsAddedMeanwhile) {
-    std::thread waiting([this, &follows = follower()] { follows.step(vexo::ChangeFollower::forever); });
+    std::thread waiting([&follows = follower()] { follows.step(vexo::ChangeFollower::forever); });
     watcher().watchPath(folder.path(), observer);
     waiting.join();
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("x"); }), Paths{folder.path()});
