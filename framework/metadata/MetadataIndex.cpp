@@ -6,9 +6,9 @@
 
 #include <chrono>
 #include <cstdio>
-#include <cstdlib>
 #include <filesystem>
 
+#include "framework/UserFolders.h"
 #include "framework/metadata/ReaderMessage.h"
 #include "platform/Path.h"
 #include "platform/linux/FileDescriptor.h"
@@ -76,11 +76,8 @@ MetadataIndex::~MetadataIndex() {
 }
 
 std::optional<std::string> MetadataIndex::defaultPath() {
-    // A relative XDG_CACHE_HOME is to be ignored.
-    if (const char* cache = std::getenv("XDG_CACHE_HOME"); cache && *cache == '/')
-        return platform::path::appending(cache, "vexo/metadata.sqlite");
-    if (const char* home = std::getenv("HOME"); home && *home)
-        return platform::path::appending(home, ".cache/vexo/metadata.sqlite");
+    if (const auto cache = userCacheFolder())
+        return platform::path::appending(*cache, "vexo/metadata.sqlite");
     return std::nullopt;
 }
 
