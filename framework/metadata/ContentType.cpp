@@ -1,15 +1,12 @@
 #include "framework/metadata/ContentType.h"
 
-#include <fcntl.h>
 #include <gio/gio.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <memory>
 #include <optional>
 
-#include "platform/linux/FileDescriptor.h"
+#include "platform/linux/PlainFile.h"
 
 namespace vexo {
 
@@ -58,19 +55,6 @@ std::optional<std::string> mimeByOtherBrands(std::string beginning) {
     return std::nullopt;
 }
 
-// Empty for what is no plain file: the flags keep a FIFO or a terminal that has taken a file's place from
-// doing harm.
-std::string beginningOfFile(const std::string& path) {
-    const platform::FileDescriptor file(open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
-    struct stat status;
-    if (!file || fstat(file.number(), &status) != 0 || !S_ISREG(status.st_mode))
-        return {};
-    std::string beginning(beginningBytes, '\0');
-    const ssize_t size = pread(file.number(), beginning.data(), beginning.size(), 0);
-    beginning.resize(static_cast<std::size_t>(std::max<ssize_t>(size, 0)));
-    return beginning;
-}
-
 }  // namespace
 
 const FileType* typeOfContent(std::string_view beginning) {
@@ -81,8 +65,8 @@ const FileType* typeOfContent(std::string_view beginning) {
 }
 
 const FileType* typeOfContentOfFile(const std::string& path) {
-    const std::string beginning = beginningOfFile(path);
-    return beginning.empty() ? nullptr : typeOfContent(beginning);
+    const auto beginning = platform::beginningOfPlainFile(path, beginningBytes);
+    return beginning && !beginning->empty() ? typeOfContent(*beginning) : nullptr;
 }
 
 }  // namespace vexo
