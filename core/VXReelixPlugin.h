@@ -159,10 +159,28 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     // validDiskFormat:
     static bool validDiskFormat(const std::string& path);
 
-    // --- Pasteboard (browser/PasteboardTypes.cpp) ----------------------------------------------------------
+    // --- Context menus (browser/ContextMenus.cpp) ----------------------------------------------------------
+
+    std::shared_ptr<platform::Menu> contextMenuForMediaObject(const Object& mediaObject,
+                                                              const Group& inMediaGroup) override;
+    std::shared_ptr<platform::Menu> contextMenuForMediaGroup(const Group& mediaGroup) override;
+    // contextMenuOpen: and contextMenuReveal:
+    void contextMenuOpen(const platform::MenuItem& sender);
+    void contextMenuReveal(const platform::MenuItem& sender);
+
+    // --- Pasteboard (browser/ProjectPasteboard.cpp) --------------------------------------------------------
 
     // A list that holds one list of one type. Receivers rely on the nesting.
     static platform::Array supportedPasteboardTypes();
+    bool writeMediaGroups(const Groups& mediaGroups, platform::Pasteboard& toPasteboard) override;
+    bool writeMediaObjects(const Objects& mediaObjects, platform::Pasteboard& toPasteboard) override;
+    // dictionaryWithProjects:
+    platform::Dictionary dictionaryWithProjects(const Groups& projects);
+    // projectGroupsForPaths:; in tree order, each as often as its path is among the paths.
+    Groups projectGroupsForPaths(const std::vector<std::string>& paths);
+    // projectGroupsForPaths:currentGroup:resultsArray:
+    void projectGroupsForPaths(const std::vector<std::string>& paths, const Group& currentGroup,
+                               Groups& resultsArray);
 
   protected:
     static constexpr std::chrono::seconds reloadDelay{5};
@@ -206,6 +224,8 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     std::map<std::string, platform::ImageRef> cachedIcons;
 
   private:
+    void writeProjects(const Groups& projects, platform::Pasteboard& toPasteboard);
+
     struct ScannedClip;
     struct EventYears;
     using YearGroups = std::map<double, Group>;  // the year groups of one event library by their years

@@ -3,6 +3,8 @@
 #include <atomic>
 #include <stdexcept>
 
+#include "framework/BundleStrings.h"
+#include "framework/FrameworkResources.h"
 #include "framework/MetadataProvider.h"
 #include "host/VXMediaBrowserImageManager.h"
 #include "host/VXMediaBrowserUtilities.h"
@@ -34,6 +36,10 @@ VXPathWatcher& VXPathWatcher::sharedPathWatcher() {
 
 VXMediaBrowserImageManager& VXMediaBrowserImageManager::sharedInstance() {
     return hostServices().imageManager;
+}
+
+std::string VXMediaBrowserUtilities::localizedStringForKey(std::string_view key, std::string_view value) {
+    return frameworkStrings().stringForKey(key).value_or(std::string(value));
 }
 
 bool VXMediaBrowserUtilities::supportedMovieFile(const std::string& path) {

@@ -60,6 +60,11 @@ inline constexpr std::string_view VXReelixProjectRepresentative =  // boolean, s
 inline constexpr std::string_view VXPluginDefaultLoadingStringKey = "VXPluginDefaultLoadingStringKey";
 inline constexpr std::string_view VXPluginDefaultNoDataStringKey = "VXPluginDefaultNoDataStringKey";
 
+// Posted on the default notification centre by a plug-in, as its object, when it is about to switch the user
+// to another application. Its text is the one that the suite's programs post.
+inline constexpr std::string_view willOpenOrRevealInSourceNotification =
+    "willOpenOrRevealInSourceNotification";
+
 // The preference domain that the suite's applications share, and its file.
 inline constexpr std::string_view VXSuitePrefsDomainName = "com.vexo.suite";
 inline constexpr std::string_view VXSuitePrefsPath = "~/.config/vexo/com.vexo.suite.plist";

@@ -81,13 +81,16 @@ class VXMediaManager : public VXPathObserver, public std::enable_shared_from_thi
     virtual std::shared_ptr<platform::Menu> contextMenuForMediaGroup(const VXMediaGroupRef& mediaGroup);
 
     // writeMediaGroups:toPasteboard: and writeMediaObjects:toPasteboard:; whether anything was written. The
-    // base writes the paths as "text/uri-list" and "text/plain".
+    // base writes the files as "text/uri-list", "x-special/gnome-copied-files" and "text/plain", with the
+    // paths that other programs know them by.
     virtual bool writeMediaGroups(const std::vector<VXMediaGroupRef>& mediaGroups,
                                   platform::Pasteboard& toPasteboard);
     virtual bool writeMediaObjects(const std::vector<VXMediaObjectRef>& mediaObjects,
                                    platform::Pasteboard& toPasteboard);
 
-    // thumbnailOverlayForMediaObject:inMediaGroups:atSize:; nil for no overlay, as the base answers.
+    // thumbnailOverlayForMediaObject:inMediaGroups:atSize:; an image of that size in points to draw over the
+    // item's thumbnail, nil for none. The base answers a badge with the item's duration, where that is known
+    // and there is room for it.
     virtual platform::ImageRef thumbnailOverlayForMediaObject(
         const VXMediaObjectRef& mediaObject, const std::vector<VXMediaGroupRef>& inMediaGroups,
         platform::Size atSize);

@@ -1,5 +1,7 @@
 #include "platform/Text.h"
 
+#include <fmt/printf.h>
+
 #include <algorithm>
 
 #include <unicode/unistr.h>
@@ -80,6 +82,12 @@ bool isValidUTF8(std::string_view text) {
             return false;
     }
     return true;
+}
+
+std::string stringWithFormat(const std::string& format, long first, long second) try {
+    return fmt::sprintf(format, first, second);
+} catch (const fmt::format_error&) {
+    return format;
 }
 
 }  // namespace platform

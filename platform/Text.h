@@ -22,4 +22,8 @@ std::string validUTF8(std::string_view text);
 // Whether the text is well-formed UTF-8.
 bool isValidUTF8(std::string_view text);
 
+// stringWithFormat: with two numbers for a format of the printf function, "%ld:%02ld" say. A format that asks
+// for other values or for more of them is answered as it is.
+std::string stringWithFormat(const std::string& format, long first, long second);
+
 }  // namespace platform

@@ -5,7 +5,9 @@
 
 #include <algorithm>
 #include <charconv>
+#include <cmath>
 #include <cstdlib>
+#include <limits>
 
 namespace platform {
 
@@ -48,6 +50,30 @@ double leadingNumber(std::string_view text) {
         text.remove_prefix(1);
     const double magnitude = unsignedLeadingNumber(text);
     return isNegative ? -magnitude : magnitude;
+}
+
+// The smallest or the largest number for one beyond the type.
+std::int64_t leadingWholeNumber(std::string_view text) {
+    text = withoutLeadingWhitespace(text);
+    const bool isNegative = text.starts_with('-');
+    if (text.starts_with("+") && !text.starts_with("+-"))
+        text.remove_prefix(1);
+    std::int64_t number = 0;
+    const auto error = std::from_chars(text.begin(), text.end(), number).ec;
+    if (error == std::errc::result_out_of_range)
+        return isNegative ? std::numeric_limits<std::int64_t>::min()
+                          : std::numeric_limits<std::int64_t>::max();
+    return number;
+}
+
+// Nothing that is no number is a whole one: not-a-number gives 0.
+std::int64_t wholeNumber(double number) {
+    constexpr double beyond = 0x1p63;
+    if (number >= beyond)
+        return std::numeric_limits<std::int64_t>::max();
+    if (number < -beyond)
+        return std::numeric_limits<std::int64_t>::min();
+    return std::isnan(number) ? 0 : static_cast<std::int64_t>(number);
 }
 
 bool saysYes(std::string_view text) {
@@ -104,6 +130,15 @@ std::optional<double> Value::doubleValue() const {
     if (const std::string* text = string())
         return leadingNumber(*text);
     return std::nullopt;
+}
+
+std::optional<std::int64_t> Value::intValue() const {
+    if (const std::int64_t* number = integer())
+        return *number;
+    if (const std::string* text = string())
+        return leadingWholeNumber(*text);
+    const std::optional<double> number = doubleValue();
+    return number ? std::optional(wholeNumber(*number)) : std::nullopt;
 }
 
 std::optional<bool> Value::boolValue() const {

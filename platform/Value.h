@@ -64,6 +64,9 @@ class Value {
     // whitespace ("0.7abc" is 0.7, other text is 0.0, as the platform converts it); nil for every other kind.
     // Never depends on the locale.
     std::optional<double> doubleValue() const;
+    // The whole number of a boolean, an integer or a real, cut off toward zero, or the one that text begins
+    // with after whitespace ("7.9" is 7, other text is 0); kept within the type. nil for every other kind.
+    std::optional<std::int64_t> intValue() const;
     // The truth of a boolean or a number (not zero), or of text that begins with "y" or "t" in either case
     // (yes, true) or with a number other than zero; nil for every other kind.
     std::optional<bool> boolValue() const;

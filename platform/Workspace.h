@@ -1,6 +1,7 @@
 // What the desktop knows: mounted volumes and installed applications. Callable from any thread.
 #pragma once
 
+#include <cstdint>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -11,6 +12,9 @@
 #include "platform/URL.h"
 
 namespace platform {
+
+// The default way to launch: without waiting for the application.
+inline constexpr std::uint32_t NSWorkspaceLaunchAsync = 0x10000;
 
 // An application that the desktop has an entry for. It may have been removed since.
 struct ApplicationReference {
@@ -34,6 +38,15 @@ class Workspace {
     virtual std::string absolutePathForAppBundleWithIdentifier(std::string_view identifier) const = 0;
     // The icon of an application as its desktop entry names it; nil when there is none.
     virtual ImageRef iconForApplication(const ApplicationReference& application) const = 0;
+
+    // launchAppWithBundleIdentifier:options:additionalEventParamDescriptor:launchIdentifier:, without the two
+    // that are always nil. Brings the application up, starting it where it does not run; whether the desktop
+    // could be asked to. A failure also goes to the system log.
+    virtual bool launchAppWithBundleIdentifier(std::string_view identifier, std::uint32_t options) = 0;
+    // selectFile:inFileViewerRootedAtPath:; shows the item selected in the desktop's file manager, folders
+    // and packages too, or opens the folder around it where no file manager can do that; whether one of them
+    // worked. The root path is always empty. A failure also goes to the system log.
+    virtual bool selectFile(const std::string& path, const std::string& inFileViewerRootedAtPath) = 0;
 
     // Posts NSWorkspaceDidMountNotification.
     NotificationCenter& notificationCenter() { return notificationCenter_; }

@@ -1,11 +1,13 @@
 #include "platform/linux/LinuxWorkspace.h"
 
+#include <gio/gdesktopappinfo.h>
 #include <gio/gunixmounts.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <utility>
 
+#include "platform/Path.h"
 #include "platform/linux/IconLookup.h"
 
 namespace platform {
@@ -73,6 +75,21 @@ ImageRef LinuxWorkspace::iconForApplication(const ApplicationReference& applicat
     const auto path = pathOfIcon(application.icon, dataFolders_);
     auto picture = path ? pictureWithContentsOfFile(*path) : nullptr;
     return picture ? std::make_shared<Image>(std::move(picture), application.icon) : nullptr;
+}
+
+bool LinuxWorkspace::launchAppWithBundleIdentifier(std::string_view identifier, std::uint32_t) {
+    const std::string desktopID = std::string(identifier) + ".desktop";
+    GDesktopAppInfo* application = g_desktop_app_info_new(desktopID.c_str());
+    if (!application)
+        return false;
+    const bool isLaunched = g_app_info_launch(G_APP_INFO(application), nullptr, nullptr, nullptr);
+    g_object_unref(application);
+    return isLaunched;
+}
+
+bool LinuxWorkspace::selectFile(const std::string& path, const std::string&) {
+    const std::string folder = URL::fileURLWithPath(path::withoutLastComponent(path)).absoluteString();
+    return g_app_info_launch_default_for_uri(folder.c_str(), nullptr, nullptr);
 }
 
 void LinuxWorkspace::mountsChanged() {

@@ -35,6 +35,9 @@ class LinuxWorkspace final : public Workspace {
     std::string absolutePathForAppBundleWithIdentifier(std::string_view identifier) const override;
     ImageRef iconForApplication(const ApplicationReference& application) const override;
 
+    bool launchAppWithBundleIdentifier(std::string_view identifier, std::uint32_t options) override;
+    bool selectFile(const std::string& path, const std::string& inFileViewerRootedAtPath) override;
+
   private:
     void mountsChanged();
 

@@ -42,6 +42,8 @@ class StandInWorkspace final : public Workspace {
     std::optional<ApplicationReference> applicationForCreator(std::string_view) const override { return {}; }
     std::string absolutePathForAppBundleWithIdentifier(std::string_view) const override { return {}; }
     ImageRef iconForApplication(const ApplicationReference&) const override { return nullptr; }
+    bool launchAppWithBundleIdentifier(std::string_view, std::uint32_t) override { return false; }
+    bool selectFile(const std::string&, const std::string&) override { return false; }
 };
 
 class StandInUserDefaults final : public UserDefaults {

@@ -95,4 +95,21 @@ platform::ImageRef FakeWorkspace::iconForApplication(
     return found != icons_.end() ? found->second : nullptr;
 }
 
+bool FakeWorkspace::launchAppWithBundleIdentifier(std::string_view identifier, std::uint32_t options) {
+    Locked lock(mutex_);
+    requests_.push_back("launch " + std::string(identifier) + " " + std::to_string(options));
+    return true;
+}
+
+bool FakeWorkspace::selectFile(const std::string& path, const std::string& inFileViewerRootedAtPath) {
+    Locked lock(mutex_);
+    requests_.push_back("select " + path + " in '" + inFileViewerRootedAtPath + "'");
+    return true;
+}
+
+std::vector<std::string> FakeWorkspace::requests() const {
+    Locked lock(mutex_);
+    return requests_;
+}
+
 }  // namespace testing_support

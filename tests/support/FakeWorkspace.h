@@ -21,6 +21,9 @@ class FakeWorkspace final : public platform::Workspace {
     void setPathForIdentifier(std::string identifier, std::string path) VX_EXCLUDES(mutex_);
     void setIcon(std::string identifier, platform::ImageRef icon) VX_EXCLUDES(mutex_);
 
+    // What was launched and shown, in order; "launch com.norvale.ReelixApp 65536", "select /a/b in ''".
+    std::vector<std::string> requests() const VX_EXCLUDES(mutex_);
+
     // Adds a volume and posts that it was mounted, on the calling thread.
     void mount(const std::string& mountPoint) VX_EXCLUDES(mutex_);
 
@@ -37,6 +40,10 @@ class FakeWorkspace final : public platform::Workspace {
         VX_EXCLUDES(mutex_);
     platform::ImageRef iconForApplication(const platform::ApplicationReference& application) const override
         VX_EXCLUDES(mutex_);
+    bool launchAppWithBundleIdentifier(std::string_view identifier, std::uint32_t options) override
+        VX_EXCLUDES(mutex_);
+    bool selectFile(const std::string& path, const std::string& inFileViewerRootedAtPath) override
+        VX_EXCLUDES(mutex_);
 
   private:
     mutable platform::Mutex mutex_;
@@ -45,6 +52,7 @@ class FakeWorkspace final : public platform::Workspace {
     std::map<std::string, platform::ApplicationReference, std::less<>> applications_ VX_GUARDED_BY(mutex_);
     std::map<std::string, std::string, std::less<>> paths_ VX_GUARDED_BY(mutex_);
     std::map<std::string, platform::ImageRef, std::less<>> icons_ VX_GUARDED_BY(mutex_);
+    std::vector<std::string> requests_ VX_GUARDED_BY(mutex_);
     mutable int creatorLookups_ VX_GUARDED_BY(mutex_) = 0;
     mutable int identifierLookups_ VX_GUARDED_BY(mutex_) = 0;
     mutable int iconLookups_ VX_GUARDED_BY(mutex_) = 0;
