@@ -42,11 +42,21 @@ struct QueryOptions {
     bool watches = false;  // stays, and prints the results again after each change
 };
 
+// Of the items or of the groups; one of the lists is empty.
+struct CopyOptions {
+    std::vector<std::string> objects;  // IDs or URLs
+    std::vector<std::string> groups;
+    OutputFormat format = OutputFormat::text;
+    std::optional<std::string> type;        // whose bytes alone are written
+    std::optional<std::string> outputFile;  // nil for the output
+};
+
 Problems runTree(Host& host, const TreeOptions& options, std::ostream& out);
 Problems runInfo(Host& host, const InfoOptions& options, std::ostream& out);
 Problems runLocations(Host& host, OutputFormat format, std::ostream& out);
 // Requires: the host follows changes. Stays until SIGINT or SIGTERM, or until the time is over.
 Problems runWatch(Host& host, const WatchOptions& options, std::ostream& out);
+Problems runCopy(Host& host, const CopyOptions& options, std::ostream& out);
 // These need no plug-in.
 Problems runMetadata(Host& host, const std::vector<std::string>& files, OutputFormat format,
                      std::ostream& out);
