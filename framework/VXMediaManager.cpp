@@ -5,6 +5,7 @@
 #include <exception>
 
 #include "framework/Diagnostics.h"
+#include "framework/FilePasteboard.h"
 #include "framework/GuardedWork.h"
 #include "framework/HostServices.h"
 #include "framework/MediaObjectRegistry.h"
@@ -226,43 +227,14 @@ platform::ImageRef VXMediaManager::iconNamed(std::string_view name) const {
 
 // --- Pasteboard --------------------------------------------------------------------------------------------
 
-namespace {
-
-bool writePaths(const std::vector<std::string>& paths, platform::Pasteboard& pasteboard, const void* owner) {
-    if (paths.empty())
-        return false;
-    std::string uriList;
-    std::string plainText;
-    for (const std::string& path : paths) {
-        uriList += platform::URL::fileURLWithPath(path).absoluteString() + "\r\n";
-        plainText += (plainText.empty() ? "" : "\n") + path;
-    }
-    pasteboard.addTypes({"text/uri-list", "text/plain"}, owner);
-    pasteboard.setString(std::move(uriList), "text/uri-list");
-    pasteboard.setString(std::move(plainText), "text/plain");
-    return true;
-}
-
-}  // namespace
-
 bool VXMediaManager::writeMediaGroups(const std::vector<VXMediaGroupRef>& mediaGroups,
                                       platform::Pasteboard& toPasteboard) {
-    std::vector<std::string> paths;
-    for (const VXMediaGroupRef& group : mediaGroups) {
-        if (const auto path = group->path())
-            paths.push_back(VXMediaObject::aliasResolvedPath(*path));
-    }
-    return writePaths(paths, toPasteboard, this);
+    return writeFiles(filesOfMediaGroups(mediaGroups), toPasteboard, this);
 }
 
 bool VXMediaManager::writeMediaObjects(const std::vector<VXMediaObjectRef>& mediaObjects,
                                        platform::Pasteboard& toPasteboard) {
-    std::vector<std::string> paths;
-    for (const VXMediaObjectRef& mediaObject : mediaObjects) {
-        if (auto path = mediaObject->aliasResolvedPath())
-            paths.push_back(std::move(*path));
-    }
-    return writePaths(paths, toPasteboard, this);
+    return writeFiles(filesOfMediaObjects(mediaObjects), toPasteboard, this);
 }
 
 }  // namespace vexo
