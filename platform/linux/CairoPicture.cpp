@@ -1,13 +1,12 @@
-// Pictures drawn with Cairo: PNG by its own decoder, SVG by librsvg.
-#include <cairo.h>
+// Pictures of data, drawn with Cairo: PNG by its own decoder, SVG by librsvg.
 #include <librsvg/rsvg.h>
 
 #include <array>
 #include <cstring>
 #include <new>
 
-#include "platform/Image.h"
 #include "platform/ThreadSafety.h"
+#include "platform/linux/CairoCanvas.h"
 
 namespace platform {
 
@@ -16,43 +15,9 @@ namespace {
 using Bytes = std::span<const std::byte>;
 
 struct Free {
-    void operator()(cairo_surface_t* surface) const { cairo_surface_destroy(surface); }
-    void operator()(cairo_t* context) const { cairo_destroy(context); }
     void operator()(RsvgHandle* handle) const { g_object_unref(handle); }
 };
-using Surface = std::unique_ptr<cairo_surface_t, Free>;
-using Context = std::unique_ptr<cairo_t, Free>;
 using Handle = std::unique_ptr<RsvgHandle, Free>;
-
-bool isAllowedSize(double width, double height) {
-    constexpr double longestSide = 16384;
-    constexpr double largestArea = 64.0 * 1024 * 1024;
-    return width >= 1 && height >= 1 && width <= longestSide && height <= longestSide &&
-           width * height <= largestArea;
-}
-
-// A surface that shows the bitmap's own pixels. Cairo takes no const pixels; one that is only read from
-// leaves them alone.
-Surface surfaceOf(const Bitmap& bitmap) {
-    auto* pixels = reinterpret_cast<unsigned char*>(const_cast<std::uint32_t*>(bitmap.pixels.data()));
-    return Surface(cairo_image_surface_create_for_data(pixels, CAIRO_FORMAT_ARGB32, bitmap.width,
-                                                       bitmap.height, bitmap.width * 4));
-}
-
-// What `drawContent` draws on an area of `contentSize`, as a bitmap of the given pixels.
-template <typename DrawContent>
-std::optional<Bitmap> paint(int width, int height, Size contentSize, const DrawContent& drawContent) {
-    if (!isAllowedSize(width, height))
-        return std::nullopt;
-    Bitmap bitmap{width, height, std::vector<std::uint32_t>(std::size_t(width) * std::size_t(height))};
-    const Surface surface = surfaceOf(bitmap);
-    const Context context(cairo_create(surface.get()));
-    cairo_scale(context.get(), width / contentSize.width, height / contentSize.height);
-    if (!drawContent(context.get()) || cairo_status(context.get()) != CAIRO_STATUS_SUCCESS)
-        return std::nullopt;
-    cairo_surface_flush(surface.get());
-    return bitmap;
-}
 
 class UndrawablePicture final : public Picture {
   public:
@@ -71,7 +36,7 @@ class BitmapPicture final : public Picture {
         return paint(width, height, naturalSize(), [this](cairo_t* context) {
             // Cairo counts the users of a surface's pixels without a lock, so each call has a surface of its
             // own.
-            const Surface surface = surfaceOf(bitmap_);
+            const CairoSurface surface = surfaceOf(bitmap_);
             cairo_set_source_surface(context, surface.get(), 0, 0);
             // Without it the edges of an enlarged picture fade out.
             cairo_pattern_set_extend(cairo_get_source(context), CAIRO_EXTEND_PAD);
@@ -84,6 +49,33 @@ class BitmapPicture final : public Picture {
     const Bitmap bitmap_;
 };
 
+// The last few renderings of a picture. Drawing an icon from its shapes costs a hundred times what copying
+// its pixels does, and lists draw one icon at one size again and again.
+class Renderings {
+  public:
+    std::optional<Bitmap> find(int width, int height) const VX_EXCLUDES(mutex_) {
+        Locked lock(mutex_);
+        for (const Bitmap& bitmap : bitmaps_) {
+            if (bitmap.width == width && bitmap.height == height)
+                return bitmap;
+        }
+        return std::nullopt;
+    }
+    void keep(const Bitmap& bitmap) VX_EXCLUDES(mutex_) {
+        if (bitmap.pixels.size() > mostPixels)
+            return;
+        Locked lock(mutex_);
+        bitmaps_[next_++ % bitmaps_.size()] = bitmap;
+    }
+
+  private:
+    static constexpr std::size_t mostPixels = 128 * 128;
+
+    mutable Mutex mutex_;
+    std::array<Bitmap, 4> bitmaps_ VX_GUARDED_BY(mutex_);
+    std::size_t next_ VX_GUARDED_BY(mutex_) = 0;
+};
+
 class VectorPicture final : public Picture {
   public:
     VectorPicture(Handle handle, Size size) : handle_(std::move(handle)), size_(size) {}
@@ -91,7 +83,12 @@ class VectorPicture final : public Picture {
     Size naturalSize() const override { return size_; }
     bool isDrawable() const override { return true; }
     std::optional<Bitmap> draw(int width, int height) const override VX_EXCLUDES(mutex_) {
-        return paint(width, height, size_, [this](cairo_t* context) { return render(context); });
+        if (auto kept = renderings_.find(width, height))
+            return kept;
+        auto bitmap = paint(width, height, size_, [this](cairo_t* context) { return render(context); });
+        if (bitmap)
+            renderings_.keep(*bitmap);
+        return bitmap;
     }
 
   private:
@@ -104,6 +101,7 @@ class VectorPicture final : public Picture {
     mutable Mutex mutex_;
     const Handle handle_ VX_GUARDED_BY(mutex_);  // even drawing changes its state
     const Size size_;
+    mutable Renderings renderings_;
 };
 
 constexpr std::array<unsigned char, 8> pngSignature{0x89, 'P', 'N', 'G', '\r', '\n', 0x1a, '\n'};
@@ -123,7 +121,7 @@ std::uint32_t bigEndian(Bytes data, std::size_t offset) {
 bool declaresAllowedSize(Bytes png) {
     constexpr std::size_t widthOffset = 16, heightOffset = 20, headerEnd = 24;
     return png.size() >= headerEnd &&
-           isAllowedSize(bigEndian(png, widthOffset), bigEndian(png, heightOffset));
+           isDrawableSize(bigEndian(png, widthOffset), bigEndian(png, heightOffset));
 }
 
 cairo_status_t takeBytes(void* closure, unsigned char* buffer, unsigned int count) {
@@ -138,7 +136,7 @@ cairo_status_t takeBytes(void* closure, unsigned char* buffer, unsigned int coun
 std::optional<Bitmap> decodedPNG(Bytes data) {
     if (!declaresAllowedSize(data))
         return std::nullopt;
-    const Surface surface(cairo_image_surface_create_from_png_stream(takeBytes, &data));
+    const CairoSurface surface(cairo_image_surface_create_from_png_stream(takeBytes, &data));
     if (cairo_surface_status(surface.get()) != CAIRO_STATUS_SUCCESS)
         return std::nullopt;
     const int width = cairo_image_surface_get_width(surface.get());
@@ -192,7 +190,7 @@ cairo_status_t appendBytes(void* closure, const unsigned char* buffer, unsigned 
 }
 
 bool isWhole(const Bitmap& bitmap) {
-    return isAllowedSize(bitmap.width, bitmap.height) &&
+    return isDrawableSize(bitmap.width, bitmap.height) &&
            bitmap.pixels.size() == std::size_t(bitmap.width) * std::size_t(bitmap.height);
 }
 
@@ -206,7 +204,7 @@ std::shared_ptr<const Picture> pictureWithData(std::span<const std::byte> data) 
     }
     Handle handle = parsedSVG(data);
     const Size size = handle ? sizeOf(*handle) : Size{};
-    if (!isAllowedSize(size.width, size.height))
+    if (!isDrawableSize(size.width, size.height))
         return std::make_shared<UndrawablePicture>();
     return std::make_shared<VectorPicture>(std::move(handle), size);
 }
@@ -221,7 +219,7 @@ std::vector<std::byte> pngData(const Bitmap& bitmap) {
     std::vector<std::byte> bytes;
     if (!isWhole(bitmap))
         return bytes;
-    const Surface surface = surfaceOf(bitmap);
+    const CairoSurface surface = surfaceOf(bitmap);
     if (cairo_surface_write_to_png_stream(surface.get(), appendBytes, &bytes) != CAIRO_STATUS_SUCCESS)
         bytes.clear();
     return bytes;

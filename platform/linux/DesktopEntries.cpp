@@ -7,6 +7,7 @@
 #include <filesystem>
 #include <memory>
 #include <set>
+#include <tuple>
 
 #include "platform/Path.h"
 #include "platform/linux/LinuxFileManager.h"
@@ -81,7 +82,7 @@ std::optional<DesktopEntry> entryInFile(const std::string& identifier, const std
     const auto content = contentsOfPlainFile(path, largestEntryFile);
     auto entry = content ? desktopEntryWithData(*content) : std::nullopt;
     if (entry)
-        entry->identifier = identifier;
+        std::tie(entry->identifier, entry->path) = std::tie(identifier, path);
     return entry;
 }
 
@@ -118,6 +119,8 @@ std::optional<DesktopEntry> desktopEntryWithData(std::string_view data) {
     entry.tryExec = textForKey(file.get(), G_KEY_FILE_DESKTOP_KEY_TRY_EXEC);
     entry.icon = textForKey(file.get(), G_KEY_FILE_DESKTOP_KEY_ICON);
     entry.creatorCode = textForKey(file.get(), creatorCodeKey);
+    entry.isActivatedByBus = g_key_file_get_boolean(file.get(), G_KEY_FILE_DESKTOP_GROUP,
+                                                    G_KEY_FILE_DESKTOP_KEY_DBUS_ACTIVATABLE, nullptr);
     return entry;
 }
 

@@ -17,10 +17,12 @@ namespace platform {
 // What an entry of type Application says. Texts that it lacks are empty.
 struct DesktopEntry {
     std::string identifier;  // "com.norvale.ReelixApp", without ".desktop"
+    std::string path;        // of the entry's file
     std::string exec;        // a command line
     std::string tryExec;     // the program that tells whether the application is there
     std::string icon;
-    std::string creatorCode;  // key X-Vexo-CreatorCode
+    std::string creatorCode;        // key X-Vexo-CreatorCode
+    bool isActivatedByBus = false;  // a message to it on the session bus starts the application
 
     // The absolute path of the program: as the entry has it, whether it exists or not, or where PATH finds
     // its name; nil when PATH does not find it.
@@ -28,7 +30,7 @@ struct DesktopEntry {
 };
 
 // Reads the content of an entry file; nil when it describes no application or says it is removed. The
-// identifier stays empty.
+// identifier and the path stay empty.
 std::optional<DesktopEntry> desktopEntryWithData(std::string_view data);
 
 class DesktopEntries {

@@ -1,6 +1,5 @@
 #include "platform/linux/LinuxWorkspace.h"
 
-#include <gio/gdesktopappinfo.h>
 #include <gio/gunixmounts.h>
 #include <unistd.h>
 
@@ -8,6 +7,7 @@
 #include <utility>
 
 #include "platform/Path.h"
+#include "platform/linux/FileReveal.h"
 #include "platform/linux/IconLookup.h"
 
 namespace platform {
@@ -16,6 +16,10 @@ namespace {
 
 constexpr std::string_view reelixCreatorCode = "rlxm";
 constexpr std::string_view reelixIdentifier = "com.norvale.ReelixApp";
+
+bool isForTheBusAlone(const DesktopEntry& entry) {
+    return entry.isActivatedByBus && entry.exec.empty() && entry.tryExec.empty();
+}
 
 ApplicationReference referenceToApplication(const DesktopEntry& entry) {
     ApplicationReference application{entry.identifier, std::nullopt, entry.icon};
@@ -26,12 +30,14 @@ ApplicationReference referenceToApplication(const DesktopEntry& entry) {
 
 }  // namespace
 
-LinuxWorkspace::LinuxWorkspace(const MountTable& mountTable)
+LinuxWorkspace::LinuxWorkspace(const MountTable& mountTable, SystemLog& log)
     : mountTable_(mountTable),
+      log_(log),
       dataFolders_(desktopDataFolders()),
       entries_(dataFolders_),
       monitor_(g_unix_mount_monitor_get()),
-      knownVolumes_(mountedLocalVolumePaths()) {
+      knownVolumes_(mountedLocalVolumePaths()),
+      launcher_([this](const std::string& problem) { report(problem); }) {
     const auto changed =
         +[](GUnixMountMonitor*, gpointer self) { static_cast<LinuxWorkspace*>(self)->mountsChanged(); };
     monitorHandler_ = g_signal_connect(monitor_, "mounts-changed", G_CALLBACK(changed), this);
@@ -67,6 +73,8 @@ std::optional<ApplicationReference> LinuxWorkspace::applicationForCreator(
 
 std::string LinuxWorkspace::absolutePathForAppBundleWithIdentifier(std::string_view identifier) const {
     const auto entry = entries_.entryWithIdentifier(identifier);
+    if (entry && isForTheBusAlone(*entry))
+        return entry->path;
     const auto path = entry ? entry->programPath() : std::nullopt;
     return path && access(path->c_str(), X_OK) == 0 ? *path : "";
 }
@@ -77,19 +85,25 @@ ImageRef LinuxWorkspace::iconForApplication(const ApplicationReference& applicat
     return picture ? std::make_shared<Image>(std::move(picture), application.icon) : nullptr;
 }
 
-bool LinuxWorkspace::launchAppWithBundleIdentifier(std::string_view identifier, std::uint32_t) {
-    const std::string desktopID = std::string(identifier) + ".desktop";
-    GDesktopAppInfo* application = g_desktop_app_info_new(desktopID.c_str());
-    if (!application)
-        return false;
-    const bool isLaunched = g_app_info_launch(G_APP_INFO(application), nullptr, nullptr, nullptr);
-    g_object_unref(application);
-    return isLaunched;
+// The entry is the one whose path was answered before. The option is the default way, and there is no other.
+bool LinuxWorkspace::launchAppWithBundleIdentifier(std::string_view identifier, std::uint32_t /*options*/) {
+    if (const auto entry = entries_.entryWithIdentifier(identifier))
+        return launcher_.launch(entry->path);
+    report("cannot launch '" + std::string(identifier) + "': there is no such application");
+    return false;
 }
 
-bool LinuxWorkspace::selectFile(const std::string& path, const std::string&) {
-    const std::string folder = URL::fileURLWithPath(path::withoutLastComponent(path)).absoluteString();
-    return g_app_info_launch_default_for_uri(folder.c_str(), nullptr, nullptr);
+bool LinuxWorkspace::selectFile(const std::string& path, const std::string& /*inFileViewerRootedAtPath*/) {
+    const auto problem = showInFileManager(URL::fileURLWithPath(path));
+    if (!problem)
+        return true;
+    log_.log("cannot show '" + path + "' in a file manager, and opens its folder instead: " + *problem);
+    return launcher_.openFolder(URL::fileURLWithPath(path::withoutLastComponent(path)));
+}
+
+void LinuxWorkspace::report(const std::string& problem) {
+    log_.log(problem);
+    notificationCenter().post({std::string(VXWorkspaceDidFailNotification), this, {{"problem", problem}}});
 }
 
 void LinuxWorkspace::mountsChanged() {

@@ -1,4 +1,5 @@
-// Volumes from the mount table and applications from desktop entries.
+// Volumes from the mount table and applications from desktop entries, asked for and shown through the
+// desktop.
 //
 // The environment (XDG_DATA_HOME, XDG_DATA_DIRS) counts as it was when the workspace was made. Mounts are
 // posted on the main run loop.
@@ -10,7 +11,9 @@
 #include <string>
 #include <vector>
 
+#include "platform/SystemLog.h"
 #include "platform/Workspace.h"
+#include "platform/linux/ApplicationLauncher.h"
 #include "platform/linux/DesktopEntries.h"
 #include "platform/linux/MountTable.h"
 
@@ -21,8 +24,9 @@ namespace platform {
 // Made and destroyed on the main thread; otherwise callable from any thread.
 class LinuxWorkspace final : public Workspace {
   public:
-    // `mountTable` must outlive the workspace.
-    explicit LinuxWorkspace(const MountTable& mountTable);
+    // `mountTable` and `log` must outlive the workspace.
+    LinuxWorkspace(const MountTable& mountTable, SystemLog& log);
+    // Waits for applications that were launched and have not yet taken notice of it, some seconds at most.
     ~LinuxWorkspace() override;
 
     std::vector<std::string> mountedLocalVolumePaths() const override;
@@ -32,6 +36,7 @@ class LinuxWorkspace final : public Workspace {
     // application has no URL when its program is nowhere in PATH, and one that leads nowhere when the entry
     // gives a path where no file is left.
     std::optional<ApplicationReference> applicationForCreator(std::string_view creatorCode) const override;
+    // The program, or the entry of an application that only the session bus can start.
     std::string absolutePathForAppBundleWithIdentifier(std::string_view identifier) const override;
     ImageRef iconForApplication(const ApplicationReference& application) const override;
 
@@ -40,8 +45,10 @@ class LinuxWorkspace final : public Workspace {
 
   private:
     void mountsChanged();
+    void report(const std::string& problem);
 
     const MountTable& mountTable_;
+    SystemLog& log_;
     const std::vector<std::string> dataFolders_;
     const DesktopEntries entries_;
 
@@ -49,6 +56,8 @@ class LinuxWorkspace final : public Workspace {
     GUnixMountMonitor* const monitor_;
     gulong monitorHandler_;
     std::vector<std::string> knownVolumes_;
+
+    ApplicationLauncher launcher_;  // the last: it reports until it has gone
 };
 
 }  // namespace platform

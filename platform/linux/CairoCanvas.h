@@ -1,0 +1,42 @@
+// What everything that is drawn with Cairo begins with: a context on the pixels of a bitmap.
+#pragma once
+
+#include <cairo.h>
+
+#include <memory>
+#include <optional>
+
+#include "platform/Image.h"
+
+namespace platform {
+
+struct CairoRelease {
+    void operator()(cairo_surface_t* surface) const { cairo_surface_destroy(surface); }
+    void operator()(cairo_t* context) const { cairo_destroy(context); }
+};
+using CairoSurface = std::unique_ptr<cairo_surface_t, CairoRelease>;
+using CairoContext = std::unique_ptr<cairo_t, CairoRelease>;
+
+// Whether pictures of that size are drawn at all, in points or in pixels.
+bool isDrawableSize(double width, double height);
+
+// A surface that shows the bitmap's own pixels. Requires: the bitmap is whole and outlives the surface.
+CairoSurface surfaceOf(const Bitmap& bitmap);
+
+// What `drawContent` draws on an area of `contentSize`, as a bitmap of the given pixels; nil for a size that
+// is not drawn, or when `drawContent` answers NO. Requires: isDrawableSize(contentSize).
+template <typename DrawContent>
+std::optional<Bitmap> paint(int width, int height, Size contentSize, const DrawContent& drawContent) {
+    if (!isDrawableSize(width, height))
+        return std::nullopt;
+    Bitmap bitmap{width, height, std::vector<std::uint32_t>(std::size_t(width) * std::size_t(height))};
+    const CairoSurface surface = surfaceOf(bitmap);
+    const CairoContext context(cairo_create(surface.get()));
+    cairo_scale(context.get(), width / contentSize.width, height / contentSize.height);
+    if (!drawContent(context.get()) || cairo_status(context.get()) != CAIRO_STATUS_SUCCESS)
+        return std::nullopt;
+    cairo_surface_flush(surface.get());
+    return bitmap;
+}
+
+}  // namespace platform

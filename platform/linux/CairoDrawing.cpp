@@ -1,0 +1,209 @@
+// Drawings: what was said is recorded, and played back with Cairo and Pango.
+#include <algorithm>
+#include <cmath>
+#include <numbers>
+#include <variant>
+#include <vector>
+
+#include "platform/Drawing.h"
+#include "platform/linux/CairoCanvas.h"
+#include "platform/linux/TextLayout.h"
+
+namespace platform {
+namespace {
+
+struct FilledRect {
+    Rect rect;
+    Color color;
+};
+struct RoundedRect {
+    Rect rect;
+    double radius;
+    Color color;
+};
+struct DrawnImage {
+    std::shared_ptr<const Picture> picture;
+    Rect rect;
+};
+struct DrawnText {
+    AttributedString text;
+    Rect rect;
+};
+using Step = std::variant<FilledRect, RoundedRect, DrawnImage, DrawnText>;
+
+bool isEmpty(const Rect& rect) {
+    return !(rect.width > 0 && rect.height > 0);
+}
+
+// Empty where the rectangle lies outside, or isn't one. Cairo wraps numbers that are too large for it.
+Rect partInside(Size area, const Rect& rect) {
+    if (!std::isfinite(rect.x + rect.width) || !std::isfinite(rect.y + rect.height))
+        return {};
+    const double left = std::max(rect.x, 0.0), bottom = std::max(rect.y, 0.0);
+    return {left, bottom, std::min(rect.x + rect.width, area.width) - left,
+            std::min(rect.y + rect.height, area.height) - bottom};
+}
+
+// Plays steps back, on an area of `size` points that the context has scaled to pixels.
+class Player {
+  public:
+    Player(cairo_t* context, Size size) : context_(context), size_(size) {
+        cairo_user_to_device_distance(context, &pixelsPerPointX_, &pixelsPerPointY_);
+    }
+
+    void operator()(const FilledRect& step) const {
+        setColor(step.color);
+        cairo_set_operator(context_, CAIRO_OPERATOR_SOURCE);
+        addRectangle(partInside(size_, step.rect));
+        cairo_fill(context_);
+        cairo_set_operator(context_, CAIRO_OPERATOR_OVER);
+    }
+    void operator()(const RoundedRect& step) const {
+        const Rect rect = partInside(size_, step.rect);
+        if (isEmpty(rect))
+            return;
+        setColor(step.color);
+        addRoundedRectangle(rect, std::clamp(step.radius, 0.0, std::min(rect.width, rect.height) / 2));
+        cairo_fill(context_);
+    }
+    void operator()(const DrawnImage& step) const {
+        const double width = step.rect.width * pixelsPerPointX_;
+        const double height = step.rect.height * pixelsPerPointY_;
+        if (isEmpty(partInside(size_, step.rect)) || !isDrawableSize(width, height))
+            return;
+        const auto bitmap = step.picture->draw(int(std::lround(width)), int(std::lround(height)));
+        if (bitmap)
+            draw(*bitmap, step.rect);
+    }
+    void operator()(const DrawnText& step) const {
+        if (isEmpty(partInside(size_, step.rect)))
+            return;
+        PangoLayout* layout = layoutOf(step.text);
+        if (!layout)
+            return;
+        cairo_save(context_);
+        clipToPixelsOf(partInside(size_, step.rect));
+        setColor(step.text.color());
+        cairo_move_to(context_, step.rect.x, top(step.rect));
+        pango_cairo_show_layout(context_, layout);
+        cairo_restore(context_);
+    }
+
+  private:
+    // How far the rectangle is below the upper edge, where Cairo begins to count.
+    double top(const Rect& rect) const { return size_.height - rect.y - rect.height; }
+    void setColor(const Color& color) const {
+        cairo_set_source_rgba(context_, color.red, color.green, color.blue, color.alpha);
+    }
+    void addRectangle(const Rect& rect) const {
+        if (!isEmpty(rect))
+            cairo_rectangle(context_, rect.x, top(rect), rect.width, rect.height);
+    }
+    void addRoundedRectangle(const Rect& rect, double radius) const {
+        constexpr double quarter = std::numbers::pi / 2;
+        const double left = rect.x + radius, right = rect.x + rect.width - radius;
+        const double upper = top(rect) + radius, lower = top(rect) + rect.height - radius;
+        cairo_new_sub_path(context_);
+        cairo_arc(context_, right, upper, radius, -quarter, 0);
+        cairo_arc(context_, right, lower, radius, 0, quarter);
+        cairo_arc(context_, left, lower, radius, quarter, 2 * quarter);
+        cairo_arc(context_, left, upper, radius, 2 * quarter, 3 * quarter);
+        cairo_close_path(context_);
+    }
+    // In pixels, so that a bitmap of just the right size is copied and not filtered.
+    void draw(const Bitmap& bitmap, const Rect& rect) const {
+        const CairoSurface surface = surfaceOf(bitmap);
+        cairo_save(context_);
+        cairo_identity_matrix(context_);
+        cairo_translate(context_, rect.x * pixelsPerPointX_, top(rect) * pixelsPerPointY_);
+        cairo_scale(context_, rect.width * pixelsPerPointX_ / bitmap.width,
+                    rect.height * pixelsPerPointY_ / bitmap.height);
+        cairo_set_source_surface(context_, surface.get(), 0, 0);
+        cairo_paint(context_);
+        cairo_restore(context_);
+    }
+    // Whole pixels: the edge of a clip that cuts through some would be blurred, and drawing slow.
+    void clipToPixelsOf(const Rect& rect) const {
+        const double left = std::floor(rect.x * pixelsPerPointX_);
+        const double right = std::ceil((rect.x + rect.width) * pixelsPerPointX_);
+        const double upper = std::floor(top(rect) * pixelsPerPointY_);
+        const double lower = std::ceil((top(rect) + rect.height) * pixelsPerPointY_);
+        cairo_rectangle(context_, left / pixelsPerPointX_, upper / pixelsPerPointY_,
+                        (right - left) / pixelsPerPointX_, (lower - upper) / pixelsPerPointY_);
+        cairo_clip(context_);
+    }
+
+    cairo_t* const context_;
+    const Size size_;
+    double pixelsPerPointX_ = 1, pixelsPerPointY_ = 1;
+};
+
+}  // namespace
+
+// Not changed once it has become the picture of an image.
+class Drawing::Recording final : public Picture {
+  public:
+    explicit Recording(Size size) : size_(size) {}
+
+    void add(Step step) { steps_.push_back(std::move(step)); }
+
+    Size naturalSize() const override { return size_; }
+    bool isDrawable() const override { return isDrawableSize(size_.width, size_.height); }
+    std::optional<Bitmap> draw(int width, int height) const override {
+        if (!isDrawable())
+            return std::nullopt;
+        return paint(width, height, size_, [this](cairo_t* context) {
+            const Player player(context, size_);
+            for (const Step& step : steps_)
+                std::visit(player, step);
+            return true;
+        });
+    }
+
+  private:
+    const Size size_;
+    std::vector<Step> steps_;
+};
+
+Drawing::Drawing(Size size) : recording_(std::make_shared<Recording>(size)) {}
+
+Drawing::~Drawing() = default;
+
+Size Drawing::size() const {
+    return recording_->naturalSize();
+}
+
+void Drawing::fillRect(const Rect& rect) {
+    recording_->add(FilledRect{rect, color_});
+}
+
+void Drawing::fillRoundedRect(const Rect& rect, double radius) {
+    recording_->add(RoundedRect{rect, radius, color_});
+}
+
+void Drawing::drawImage(const Image& image, const Rect& inRect) {
+    if (image.isValid())
+        recording_->add(DrawnImage{image.picture(), inRect});
+}
+
+void Drawing::drawString(const AttributedString& text, const Rect& inRect) {
+    recording_->add(DrawnText{text, inRect});
+}
+
+ImageRef Drawing::image() {
+    return std::make_shared<Image>(std::move(recording_));
+}
+
+AttributedString::AttributedString(std::string text, Font font, Color color)
+    : text_(std::move(text)), font_(font), color_(color) {}
+
+Size AttributedString::size() const {
+    PangoLayout* layout = layoutOf(*this);
+    if (!layout)
+        return {};
+    int width = 0, height = 0;
+    pango_layout_get_size(layout, &width, &height);
+    return {width / double(PANGO_SCALE), height / double(PANGO_SCALE)};
+}
+
+}  // namespace platform
