@@ -32,9 +32,12 @@ struct PropertyListResult {
 PropertyListResult propertyListWithData(std::span<const std::byte> bytes);
 
 // dataWithPropertyList:format:options:error:. Reals are written as reals and integers as integers; sizes are
-// no property-list type and are written as their text. What is no UTF-8, and characters that XML cannot
-// carry, become U+FFFD. Dates are whole seconds of the years 1 to 9999 in XML. The bounds of reading are not
-// checked.
+// no property-list type and are written as their text. Dates are whole seconds of the years 1 to 9999 in XML.
+// The bounds of reading are not checked.
+//
+// Text that is no UTF-8, as a path may be, and text with characters that XML cannot carry is data in XML:
+// exactly its bytes, by which a reader still finds the file. In keys, and in the binary form what is no
+// UTF-8, becomes U+FFFD.
 std::vector<std::byte> dataWithPropertyList(const Value& propertyList, PropertyListFormat format);
 
 }  // namespace platform

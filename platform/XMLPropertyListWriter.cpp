@@ -34,7 +34,7 @@ std::string textOfDate(const Date& date) {
     return iso8601String(*Date::since1970(writable));
 }
 
-std::string textOfData(const Data& data) {
+std::string textOfData(std::span<const std::byte> data) {
     const std::unique_ptr<gchar, decltype(&g_free)> text(
         g_base64_encode(reinterpret_cast<const guchar*>(data.data()), data.size()), g_free);
     return text.get();
@@ -46,7 +46,16 @@ bool beginsWithNonCharacter(std::string_view text) {
 }
 
 bool isControl(char c) {
-    return static_cast<unsigned char>(c) < 0x20 && c != '\t' && c != '\n';
+    return static_cast<unsigned char>(c) < 0x20 && c != '\t' && c != '\n' && c != '\r';
+}
+
+// Whether XML can carry the text.
+bool isText(std::string_view text) {
+    for (std::size_t i = 0; i < text.size(); ++i) {
+        if (isControl(text[i]) || beginsWithNonCharacter(text.substr(i)))
+            return false;
+    }
+    return isValidUTF8(text);
 }
 
 class Writer {
@@ -60,6 +69,7 @@ class Writer {
     void putArray(const Array& array);
     void putDictionary(const Dictionary& dictionary);
     void putElement(std::string_view name, std::string_view content);
+    void putString(std::string_view text);
     void putText(std::string_view name, std::string_view text);
     void putLine(std::string_view line);
     std::string escaped(std::string_view text) const;
@@ -92,7 +102,7 @@ void Writer::putScalar(const Value& value) {
     else if (const double* real = value.real())
         putElement("real", textOfReal(*real));
     else if (const std::string* text = value.string())
-        putText("string", *text);
+        putString(*text);
     else if (const Size* size = value.size())
         putText("string", stringFromSize(*size));
     else if (const DateRef date = value.date())
@@ -123,6 +133,14 @@ void Writer::putDictionary(const Dictionary& dictionary) {
 
 void Writer::putElement(std::string_view name, std::string_view content) {
     putLine(fmt::format("<{}>{}</{}>", name, content, name));
+}
+
+// A path is bytes and need not be text. Without all of them its file could not be found.
+void Writer::putString(std::string_view text) {
+    if (isText(text))
+        putText("string", text);
+    else
+        putElement("data", textOfData(std::as_bytes(std::span(text))));
 }
 
 void Writer::putText(std::string_view name, std::string_view text) {

@@ -154,8 +154,7 @@ TEST_P(PropertyListInEachFormat, RealsReadBackExactlyAndAsReals) {
     EXPECT_TRUE(std::isnan(*again(Limits::quiet_NaN()).real()));
 }
 
-TEST_P(PropertyListInEachFormat, TextThatIsNoUTF8GetsReplacementCharacters) {
-    EXPECT_EQ(again("a\xFFz"), Value("a\uFFFDz"));
+TEST_P(PropertyListInEachFormat, KeysThatAreNoUTF8GetReplacementCharacters) {
     EXPECT_EQ(again(Dictionary{{"k\xC3", 1}}), Value(Dictionary{{"k\uFFFD", 1}}));
 }
 
@@ -222,6 +221,10 @@ TEST(BinaryPropertyList, ReadsEveryKindOfObject) {
 TEST(BinaryPropertyList, TextMarkedAsASCIIMayBeUTF8) {
     EXPECT_EQ(readFrom(binaryList({"\x52é"})), Value("é"));
     EXPECT_EQ(readFrom(binaryList({"\x51\xE9"})), Value("\uFFFD"));
+}
+
+TEST(BinaryPropertyList, TextThatIsNoUTF8IsWrittenWithReplacementCharacters) {
+    EXPECT_EQ(afterRoundTrip("a\xFFz", PropertyListFormat::binary), Value("a\uFFFDz"));
 }
 
 TEST(BinaryPropertyList, NullsAreLeftOut) {
@@ -350,9 +353,26 @@ TEST(XMLPropertyList, MarkupLongerThanAPieceIsRead) {
     EXPECT_EQ(readFrom(xmlList("<!--" + std::string(1000000, 'x') + "--><true/>")), Value(true));
 }
 
-TEST(XMLPropertyList, CharactersThatXMLCannotCarryBecomeReplacementCharacters) {
-    EXPECT_EQ(afterRoundTrip(std::string("a\0b\x1F\uFFFE\uFFFFz", 11), PropertyListFormat::xml),
-              Value("a\uFFFDb\uFFFD\uFFFD\uFFFDz"));
+TEST(XMLPropertyList, TextThatXMLCannotCarryIsDataOfItsBytes) {
+    const std::string texts[] = {"a\xFFz",   "\xED\xA0\x80", "\x01",     "a\x1F",
+                                 "x\uFFFEy", "\uFFFF",       "line\x0B", std::string("a\0b", 3)};
+    for (const std::string& text : texts) {
+        const std::span bytes = bytesOf(text);
+        EXPECT_EQ(afterRoundTrip(Array{text}, PropertyListFormat::xml),
+                  Value(Array{Data(bytes.begin(), bytes.end())}))
+            << testing::PrintToString(text);
+    }
+}
+
+TEST(XMLPropertyList, TextWithEveryCharacterThatXMLCarriesStaysText) {
+    for (const std::string text : {"\t", "\n", "\r", " ", "\x7F", "\u0085", "\uFFFD", "\uE000", "\U0010FFFF"})
+        EXPECT_EQ(afterRoundTrip(text, PropertyListFormat::xml), Value(text)) << testing::PrintToString(text);
+}
+
+TEST(XMLPropertyList, CharactersOfKeysThatXMLCannotCarryBecomeReplacementCharacters) {
+    const std::string key("a\0b\x1F\uFFFE\uFFFFz", 11);
+    EXPECT_EQ(afterRoundTrip(Dictionary{{key, 1}}, PropertyListFormat::xml),
+              Value(Dictionary{{"a\uFFFDb\uFFFD\uFFFD\uFFFDz", 1}}));
 }
 
 TEST(XMLPropertyList, IsWrittenWithoutADocumentType) {
