@@ -182,6 +182,11 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     void projectGroupsForPaths(const std::vector<std::string>& paths, const Group& currentGroup,
                                Groups& resultsArray);
 
+    // --- Thumbnail overlays (browser/ThumbnailOverlay.cpp) -------------------------------------------------
+
+    platform::ImageRef thumbnailOverlayForMediaObject(const Object& mediaObject, const Groups& inMediaGroups,
+                                                      platform::Size atSize) override;
+
   protected:
     static constexpr std::chrono::seconds reloadDelay{5};
 

@@ -5,6 +5,7 @@
 #include <exception>
 
 #include "framework/Diagnostics.h"
+#include "framework/DurationBadge.h"
 #include "framework/FilePasteboard.h"
 #include "framework/GuardedWork.h"
 #include "framework/HostServices.h"
@@ -54,10 +55,10 @@ std::shared_ptr<platform::Menu> VXMediaManager::contextMenuForMediaGroup(const V
     return nullptr;
 }
 
-platform::ImageRef VXMediaManager::thumbnailOverlayForMediaObject(const VXMediaObjectRef&,
+platform::ImageRef VXMediaManager::thumbnailOverlayForMediaObject(const VXMediaObjectRef& mediaObject,
                                                                   const std::vector<VXMediaGroupRef>&,
-                                                                  platform::Size) {
-    return nullptr;
+                                                                  platform::Size atSize) {
+    return durationBadge(mediaObject->duration(), atSize);
 }
 
 void VXMediaManager::watchedPathChanged(const std::string&, std::uint64_t) {}
