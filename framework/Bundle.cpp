@@ -91,11 +91,22 @@ std::optional<std::string> Bundle::localizedString(std::string_view key) const {
 }
 
 platform::ImageRef Bundle::iconNamed(std::string_view name) const {
-    if (!isFileName(std::string(name)))
-        return nullptr;
-    auto picture = platform::pictureWithContentsOfFile(path_ + "/Contents/Resources/Icons/" +
-                                                       std::string(name) + ".svg");
-    return picture ? std::make_shared<platform::Image>(std::move(picture), std::string(name)) : nullptr;
+    std::string iconName(name);
+    auto picture = isFileName(iconName) ? pictureOfIcon(iconName) : nullptr;
+    return picture ? std::make_shared<platform::Image>(std::move(picture), std::move(iconName)) : nullptr;
+}
+
+std::shared_ptr<const platform::Picture> Bundle::pictureOfIcon(const std::string& name) const {
+    {
+        platform::Locked lock(iconsMutex_);
+        if (const auto known = icons_.find(name); known != icons_.end())
+            return known->second;
+    }
+    auto picture = platform::pictureWithContentsOfFile(path_ + "/Contents/Resources/Icons/" + name + ".svg");
+    if (!picture || !picture->isDrawable())
+        return picture;
+    platform::Locked lock(iconsMutex_);
+    return icons_.emplace(name, std::move(picture)).first->second;
 }
 
 const VXPrincipalClass* Bundle::principalClass(std::string& error) const {

@@ -3,11 +3,13 @@
 // The descriptor is read without loading the code. The code of a bundle that was loaded stays in the process.
 #pragma once
 
+#include <map>
 #include <memory>
 #include <string>
 
 #include "framework/BundleStrings.h"
 #include "host/VXPlugin.h"
+#include "platform/ThreadSafety.h"
 
 namespace vexo {
 
@@ -29,7 +31,7 @@ class Bundle final : public VXBundle {
     const std::string& path() const override { return path_; }
     const std::string& identifier() const override { return identifier_; }
     std::optional<std::string> localizedString(std::string_view key) const override;
-    platform::ImageRef iconNamed(std::string_view name) const override;
+    platform::ImageRef iconNamed(std::string_view name) const override VX_EXCLUDES(iconsMutex_);
 
     // Loads the code; nil when that fails, and `error` says why. Callable from the main thread only.
     const VXPrincipalClass* principalClass(std::string& error) const;
@@ -38,12 +40,18 @@ class Bundle final : public VXBundle {
     Bundle(std::string path, const platform::Dictionary& descriptor);
 
     std::string modulePath() const;
+    std::shared_ptr<const platform::Picture> pictureOfIcon(const std::string& name) const
+        VX_EXCLUDES(iconsMutex_);
 
     const std::string path_;
     const std::string identifier_;
     const std::string executable_;
     const std::string principalClassName_;
     const BundleStrings strings_;
+
+    // What has been read and can be drawn; an icon that was missing or damaged is looked for again.
+    mutable platform::Mutex iconsMutex_;
+    mutable std::map<std::string, std::shared_ptr<const platform::Picture>> icons_ VX_GUARDED_BY(iconsMutex_);
 };
 
 }  // namespace vexo
