@@ -69,7 +69,7 @@ struct Services::State {
     platform::LinuxSystemLog log{"vexo-bench", platform::LinuxSystemLog::StandardError::silent};
     platform::SystemMountTable mounts;
     platform::LinuxFileManager files{std::nullopt, mounts, log, vexo::isPackageExtension};
-    platform::LinuxWorkspace workspace{mounts};
+    platform::LinuxWorkspace workspace{mounts, log};
     platform::LinuxUserDefaults userDefaults{"/nonexistent", "com.vexo.bench", &log};
     platform::NotificationCenter notifications;
     std::unique_ptr<platform::LinuxDispatcher> dispatcher = std::make_unique<platform::LinuxDispatcher>(log);

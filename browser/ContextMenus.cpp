@@ -47,7 +47,8 @@ platform::MenuItem revealItem(std::string title, std::shared_ptr<const void> rep
             .perform = sending(&VXReelixPlugin::contextMenuReveal, std::move(target))};
 }
 
-void postWillOpenOrReveal(const VXReelixPlugin& plugin) {
+// Observers know the sender as what the host made.
+void postWillOpenOrReveal(const vexo::VXMediaManager& plugin) {
     platform::services().notificationCenter.post(
         {std::string(vexo::willOpenOrRevealInSourceNotification), &plugin});
 }

@@ -68,7 +68,7 @@ struct Host::State {
                           ? platform::LinuxSystemLog::StandardError::copies
                           : platform::LinuxSystemLog::StandardError::silent),
           files(home, mounts, log, isPackageExtension),
-          workspace(mounts),
+          workspace(mounts, log),
           userDefaults(preferencesFolder(home), processDefaultsDomain, &log),
           diagnostics(log, options.verbosity),
           reader(newMediaReader()),

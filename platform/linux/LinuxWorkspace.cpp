@@ -93,6 +93,10 @@ bool LinuxWorkspace::launchAppWithBundleIdentifier(std::string_view identifier, 
     return false;
 }
 
+void LinuxWorkspace::waitUntilLaunched() {
+    launcher_.wait();
+}
+
 bool LinuxWorkspace::selectFile(const std::string& path, const std::string& /*inFileViewerRootedAtPath*/) {
     const auto problem = showInFileManager(URL::fileURLWithPath(path));
     if (!problem)

@@ -41,6 +41,7 @@ class LinuxWorkspace final : public Workspace {
     ImageRef iconForApplication(const ApplicationReference& application) const override;
 
     bool launchAppWithBundleIdentifier(std::string_view identifier, std::uint32_t options) override;
+    void waitUntilLaunched() override;
     bool selectFile(const std::string& path, const std::string& inFileViewerRootedAtPath) override;
 
   private:

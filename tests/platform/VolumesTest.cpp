@@ -190,7 +190,8 @@ TEST(Volumes, TheWorkspacePostsEachNewMount) {
     NEEDS_MOUNTS("ext4");
     const TemporaryFolder folder;
     const SystemMountTable table;
-    LinuxWorkspace workspace(table);
+    CollectedLog log;
+    LinuxWorkspace workspace(table, log);
     std::vector<std::string> posted;
     const auto observer = std::make_shared<int>();
     workspace.notificationCenter().addObserver(

@@ -36,7 +36,8 @@ class LinuxWorkspaceTest : public testing::Test {
     const ScopedEnvironment system_{"XDG_DATA_DIRS", folder_.path("system").c_str()};
     const ScopedEnvironment path_{"PATH", folder_.path("bin").c_str()};
     FakeMountTable mounts_;
-    const LinuxWorkspace workspace_{mounts_};
+    CollectedLog log_;
+    const LinuxWorkspace workspace_{mounts_, log_};
 };
 
 const std::string svg = R"(<svg xmlns="http://www.w3.org/2000/svg" width="8" height="8"/>)";
