@@ -30,6 +30,12 @@ struct Arguments {
     std::string expression;
     std::vector<std::string> folders;
     bool watchesQuery = false;
+    MenuOptions menu;
+    std::optional<std::string> menuEntry;
+    CopyOptions copy;
+    OverlayOptions overlay;
+    std::string overlaySize;
+    std::string overlayScale = "1";
     std::string demoFolder;
 };
 
@@ -57,6 +63,9 @@ struct Parser {
     void addLocations(Arguments& arguments);
     void addMetadata(Arguments& arguments);
     void addQuery(Arguments& arguments);
+    void addMenu(Arguments& arguments);
+    void addCopy(Arguments& arguments);
+    void addOverlay(Arguments& arguments);
     void addDemo(Arguments& arguments);
     CLI::App* addCommand(const std::string& name, const std::string& summary);
 };
@@ -80,13 +89,51 @@ std::string wholeNumber(const std::string& text) {
     return isWhole ? "" : "'" + text + "' is no whole number from 0 up";
 }
 
-// The same for a length of time, with or without decimals.
-std::string numberOfSeconds(const std::string& text) {
+// A number with or without decimals; nil for any other text and for what is not finite.
+std::optional<double> finiteNumber(std::string_view text) {
     double number = 0;
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
-    const bool isLength =
-        error == std::errc() && end == text.data() + text.size() && number >= 0 && std::isfinite(number);
-    return isLength ? "" : "'" + text + "' is no number of seconds";
+    const bool isNumber = error == std::errc() && end == text.data() + text.size() && std::isfinite(number);
+    return isNumber ? std::optional(number) : std::nullopt;
+}
+
+// The same for a length of time, with or without decimals.
+std::string numberOfSeconds(const std::string& text) {
+    return finiteNumber(text).value_or(-1) >= 0 ? "" : "'" + text + "' is no number of seconds";
+}
+
+// The same for the number of an entry. Any number will do: whether there is such an entry is seen later.
+std::string entryNumber(const std::string& text) {
+    const std::string digits = text.starts_with('-') ? text.substr(1) : text;
+    const bool isNumber = !digits.empty() && digits.find_first_not_of("0123456789") == std::string::npos;
+    return isNumber ? "" : "'" + text + "' is no number of an entry";
+}
+
+// 0, which no entry has, for a number beyond the type. Requires: the text is such a number.
+int entryWithNumber(const std::string& text) {
+    int number = 0;
+    std::from_chars(text.data(), text.data() + text.size(), number);
+    return number;
+}
+
+// "80x60.5" is a size, and so are those without an area.
+std::optional<platform::Size> sizeInPoints(std::string_view text) {
+    const std::size_t cross = text.find('x');
+    if (cross == std::string_view::npos)
+        return std::nullopt;
+    const auto width = finiteNumber(text.substr(0, cross));
+    const auto height = finiteNumber(text.substr(cross + 1));
+    return width && height ? std::optional(platform::Size{*width, *height}) : std::nullopt;
+}
+
+// The same for a size.
+std::string size(const std::string& text) {
+    return sizeInPoints(text) ? "" : "'" + text + "' is no size; give width and height, 128x72 say";
+}
+
+// The same for a scale.
+std::string scale(const std::string& text) {
+    return finiteNumber(text).value_or(0) > 0 ? "" : "'" + text + "' is no scale; give a number above 0";
 }
 
 // The same for a query.
@@ -94,6 +141,12 @@ std::string queryExpression(const std::string& text) {
     const auto result = QueryExpression::parse(text);
     const auto* error = std::get_if<QuerySyntaxError>(&result);
     return error ? error->description() : "";
+}
+
+// Options of which exactly one is to be given.
+void requireOneOf(const CLI::Option& one, const CLI::Option& other) {
+    if (one.empty() == other.empty())
+        throw CLI::RequiredError("exactly one of " + one.get_name() + " and " + other.get_name());
 }
 
 Parser::Parser(Arguments& arguments)
@@ -115,6 +168,9 @@ Parser::Parser(Arguments& arguments)
     addLocations(arguments);
     addMetadata(arguments);
     addQuery(arguments);
+    addMenu(arguments);
+    addCopy(arguments);
+    addOverlay(arguments);
     addDemo(arguments);
 }
 
@@ -199,6 +255,71 @@ void Parser::addQuery(Arguments& arguments) {
                                            std::cout);
                        },
                        {.followsChanges = arguments.watchesQuery}};
+    });
+}
+
+void Parser::addMenu(Arguments& arguments) {
+    CLI::App* menu =
+        addCommand("menu", "Print the menu of an item or a group, or perform one of its entries");
+    menu->add_flag("--json", arguments.json, "Print JSON");
+    CLI::Option* object =
+        menu->add_option("--object", arguments.menu.object, "The item, by its ID or URL")->option_text("ID");
+    CLI::Option* group =
+        menu->add_option("--group", arguments.menu.group, "The group, by its ID or URL")->option_text("ID");
+    menu->add_option("--choose", arguments.menuEntry, "Perform this entry, from 1, and print nothing")
+        ->option_text("N")
+        ->check(entryNumber);
+    menu->callback([this, &arguments, object, group] {
+        requireOneOf(*object, *group);
+        arguments.menu.format = format(arguments);
+        if (arguments.menuEntry)
+            arguments.menu.chosenEntry = entryWithNumber(*arguments.menuEntry);
+        hostCommand = {Needs::plugins,
+                       [&arguments](Host& host) { return runMenu(host, arguments.menu, std::cout); }};
+    });
+}
+
+void Parser::addCopy(Arguments& arguments) {
+    CLI::App* copy = addCommand("copy", "Print what a copy of items or groups puts on the pasteboard");
+    CLI::Option* json = copy->add_flag("--json", arguments.json, "Print JSON");
+    CLI::Option* objects =
+        copy->add_option("--object", arguments.copy.objects, "The items, by their IDs or URLs")
+            ->option_text("ID...");
+    CLI::Option* groups =
+        copy->add_option("--group", arguments.copy.groups, "The groups, by their IDs or URLs")
+            ->option_text("ID...");
+    copy->add_option("--type", arguments.copy.type, "Write the bytes of this type alone")
+        ->option_text("TYPE")
+        ->excludes(json);
+    copy->add_option("-o", arguments.copy.outputFile, "Write into this file")->option_text("FILE");
+    copy->callback([this, &arguments, objects, groups] {
+        requireOneOf(*objects, *groups);
+        arguments.copy.format = format(arguments);
+        hostCommand = {Needs::plugins,
+                       [&arguments](Host& host) { return runCopy(host, arguments.copy, std::cout); }};
+    });
+}
+
+void Parser::addOverlay(Arguments& arguments) {
+    CLI::App* overlay = addCommand("overlay", "Draw what lies over the thumbnail of an item, as PNG");
+    overlay->add_option("--object", arguments.overlay.object, "The item, by its ID or URL")
+        ->option_text("ID")
+        ->required();
+    overlay->add_option("--size", arguments.overlaySize, "The thumbnail's width and height in points")
+        ->option_text("WxH")
+        ->required()
+        ->check(size);
+    overlay->add_option("--scale", arguments.overlayScale, "Pixels a point, 1 unless given")
+        ->option_text("S")
+        ->check(scale);
+    overlay->add_option("-o", arguments.overlay.outputFile, "The file to write")
+        ->option_text("FILE.png")
+        ->required();
+    overlay->callback([this, &arguments] {
+        arguments.overlay.size = sizeInPoints(arguments.overlaySize).value();
+        arguments.overlay.scale = finiteNumber(arguments.overlayScale).value();
+        hostCommand = {Needs::plugins,
+                       [&arguments](Host& host) { return runOverlay(host, arguments.overlay); }};
     });
 }
 

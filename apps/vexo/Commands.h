@@ -9,6 +9,7 @@
 
 #include "framework/Host.h"
 #include "framework/queries/QueryExpression.h"
+#include "platform/Value.h"
 
 namespace vexo {
 
@@ -42,6 +43,20 @@ struct QueryOptions {
     bool watches = false;  // stays, and prints the results again after each change
 };
 
+struct MenuOptions {
+    std::optional<std::string> object;  // an ID or URL; of this one
+    std::optional<std::string> group;   // or that one
+    std::optional<int> chosenEntry;     // to perform, from 1; nil to print the menu
+    OutputFormat format = OutputFormat::text;
+};
+
+struct OverlayOptions {
+    std::string object;      // an ID or URL
+    platform::Size size;     // in points
+    double scale = 1;        // pixels a point
+    std::string outputFile;  // for the PNG
+};
+
 // Of the items or of the groups; one of the lists is empty.
 struct CopyOptions {
     std::vector<std::string> objects;  // IDs or URLs
@@ -56,6 +71,9 @@ Problems runInfo(Host& host, const InfoOptions& options, std::ostream& out);
 Problems runLocations(Host& host, OutputFormat format, std::ostream& out);
 // Requires: the host follows changes. Stays until SIGINT or SIGTERM, or until the time is over.
 Problems runWatch(Host& host, const WatchOptions& options, std::ostream& out);
+// Performing an entry prints nothing.
+Problems runMenu(Host& host, const MenuOptions& options, std::ostream& out);
+Problems runOverlay(Host& host, const OverlayOptions& options);
 Problems runCopy(Host& host, const CopyOptions& options, std::ostream& out);
 // These need no plug-in.
 Problems runMetadata(Host& host, const std::vector<std::string>& files, OutputFormat format,
