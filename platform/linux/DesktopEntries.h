@@ -17,12 +17,12 @@ namespace platform {
 // What an entry of type Application says. Texts that it lacks are empty.
 struct DesktopEntry {
     std::string identifier;  // "com.norvale.ReelixApp", without ".desktop"
-    std::string path;        // of the entry's file
     std::string exec;        // a command line
     std::string tryExec;     // the program that tells whether the application is there
     std::string icon;
     std::string creatorCode;        // key X-Vexo-CreatorCode
     bool isActivatedByBus = false;  // a message to it on the session bus starts the application
+    std::string path = {};          // of the file the entry is in
 
     // The absolute path of the program: as the entry has it, whether it exists or not, or where PATH finds
     // its name; nil when PATH does not find it.
