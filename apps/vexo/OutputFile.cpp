@@ -137,7 +137,7 @@ void HiddenFile::rename(const std::string& name) {
 // `previous` is what lies there; nil for nothing.
 Error replace(const std::string& path, const struct stat* previous, std::span<const std::byte> bytes) {
     // A file that may not be written may not be replaced either, even where its folder would allow it.
-    if (previous && access(path.c_str(), W_OK) != 0)
+    if (previous && faccessat(AT_FDCWD, path.c_str(), W_OK, AT_EACCESS) != 0)
         return errno;
     const DemoInterruption interruption;
     HiddenFile file(folderOf(path));
