@@ -44,6 +44,10 @@ Rect partInside(Size area, const Rect& rect) {
             std::min(rect.y + rect.height, area.height) - bottom};
 }
 
+bool holds(const Rect& rect, Size size) {
+    return size.width <= rect.width && size.height <= rect.height;
+}
+
 // Plays steps back, on an area of `size` points that the context has scaled to pixels.
 class Player {
   public:
@@ -78,11 +82,13 @@ class Player {
     void operator()(const DrawnText& step) const {
         if (isEmpty(partInside(size_, step.rect)))
             return;
+        const bool fits = holds(step.rect, step.text.size());
         PangoLayout* layout = layoutOf(step.text);
         if (!layout)
             return;
         cairo_save(context_);
-        clipToPixelsOf(partInside(size_, step.rect));
+        if (!fits)
+            clipToPixelsOf(partInside(size_, step.rect));
         setColor(step.text.color());
         cairo_move_to(context_, step.rect.x, top(step.rect));
         pango_cairo_show_layout(context_, layout);

@@ -19,7 +19,8 @@ using Owned = std::unique_ptr<T, Release>;
 // Advances that are not rounded to pixels make a text equally wide at every scale. Colour fringes would show
 // on what is laid over a picture.
 Owned<PangoContext> newContext() {
-    Owned<PangoContext> context(pango_font_map_create_context(pango_cairo_font_map_get_default()));
+    const Owned<PangoFontMap> fontMap(pango_cairo_font_map_new());
+    Owned<PangoContext> context(pango_font_map_create_context(fontMap.get()));
     const Owned<cairo_font_options_t> options(cairo_font_options_create());
     cairo_font_options_set_hint_metrics(options.get(), CAIRO_HINT_METRICS_OFF);
     cairo_font_options_set_hint_style(options.get(), CAIRO_HINT_STYLE_SLIGHT);

@@ -179,5 +179,18 @@ TEST(TextTest, RandomBytesBecomeValidOnce) {
     }
 }
 
+TEST(TextTest, AFormatTakesTwoNumbers) {
+    EXPECT_EQ(stringWithFormat("%ld:%02ld", 2, 5), "2:05");
+    EXPECT_EQ(stringWithFormat("%2$ld/%1$ld", 2, 5), "5/2");
+    EXPECT_EQ(stringWithFormat("%ld %%", -60, 5), "-60 %");
+    EXPECT_EQ(stringWithFormat("DurationString", 2, 5), "DurationString");
+    EXPECT_EQ(stringWithFormat("", 2, 5), "");
+}
+
+TEST(TextTest, AFormatThatAsksForOtherValuesIsAnsweredAsItIs) {
+    for (const std::string format : {"%s", "%ld:%02ld:%ld", "%ld%n", "%", "%3$ld", "%ld:%q"})
+        EXPECT_EQ(stringWithFormat(format, 2, 5), format);
+}
+
 }  // namespace
 }  // namespace platform
