@@ -5,6 +5,7 @@
 #include <sys/stat.h>
 
 #include <filesystem>
+#include <fstream>
 
 #include "framework/PluginSearch.h"
 #include "host/VXMediaManager.h"
@@ -70,6 +71,32 @@ TEST_F(BundleTest, TextsAndIconsComeFromItsResources) {
     EXPECT_NE(icon, result.bundle->iconNamed("Reelix-icon-event"));
     EXPECT_EQ(result.bundle->iconNamed("missing"), nullptr);
     EXPECT_EQ(result.bundle->iconNamed("../Icons/Reelix-icon-event"), nullptr);
+}
+
+TEST_F(BundleTest, EachIconIsReadOnceAndShownByImagesOfTheirOwn) {
+    const std::string bundlePath = copyOfBundle();
+    const BundleResult result = Bundle::open(bundlePath);
+    ASSERT_NE(result.bundle, nullptr) << result.error;
+    const auto first = result.bundle->iconNamed("Reelix-icon-event");
+    fs::remove_all(bundlePath + "/Contents/Resources/Icons");
+    const auto second = result.bundle->iconNamed("Reelix-icon-event");
+    ASSERT_NE(second, nullptr);
+    EXPECT_NE(first, second);
+    EXPECT_EQ(first->picture(), second->picture());
+    first->setSize({16, 16});
+    EXPECT_EQ(second->size(), (platform::Size{32, 32}));
+}
+
+TEST_F(BundleTest, AnIconThatWasMissingOrDamagedIsLookedForAgain) {
+    const std::string bundlePath = copyOfBundle();
+    const std::string icons = bundlePath + "/Contents/Resources/Icons/";
+    const BundleResult result = Bundle::open(bundlePath);
+    ASSERT_NE(result.bundle, nullptr) << result.error;
+    EXPECT_EQ(result.bundle->iconNamed("new"), nullptr);
+    std::ofstream(icons + "new.svg") << "<svg";
+    EXPECT_FALSE(result.bundle->iconNamed("new")->isValid());
+    fs::copy_file(icons + "Reelix-icon-event.svg", icons + "new.svg", fs::copy_options::overwrite_existing);
+    EXPECT_TRUE(result.bundle->iconNamed("new")->isValid());
 }
 
 TEST_F(BundleTest, AFolderThatIsNoBundleIsRefused) {

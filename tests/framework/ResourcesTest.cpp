@@ -9,6 +9,7 @@
 
 #include "framework/BundleStrings.h"
 #include "framework/FrameworkResources.h"
+#include "host/VXMediaBrowserUtilities.h"
 #include "platform/CalendarDate.h"
 #include "platform/Image.h"
 #include "tests/support/TemporaryFolder.h"
@@ -126,6 +127,14 @@ TEST(FrameworkResources, AreTheFilesOfTheSources) {
     }
     EXPECT_EQ(frameworkResource("icons/missing.svg"), std::nullopt);
     EXPECT_EQ(frameworkResource(""), std::nullopt);
+}
+
+TEST(FrameworkStrings, AreFoundByKeyElseTheGivenTextIsAnswered) {
+    const ScopedEnvironment language("LANGUAGE", "en");
+    EXPECT_EQ(VXMediaBrowserUtilities::localizedStringForKey("DurationString", "DurationString"),
+              "%ld:%02ld");
+    EXPECT_EQ(VXMediaBrowserUtilities::localizedStringForKey("missing", "the text"), "the text");
+    EXPECT_EQ(VXMediaBrowserUtilities::localizedStringForKey("", ""), "");
 }
 
 const std::set<std::string> languages{"de", "es", "fr", "it", "ja", "nl", "pt_BR"};

@@ -106,6 +106,20 @@ TEST(Picture, SVGIsCrispAtEverySize) {
     }
 }
 
+TEST(Picture, SVGIsTheSameWhenItIsDrawnAgain) {
+    const auto picture = pictureOf(twoColours());
+    std::map<std::pair<int, int>, Bitmap> drawn;
+    for (int repeat = 0; repeat < 3; ++repeat) {
+        for (const auto& [width, height] : {std::pair(4, 2), {8, 4}, {8, 2}, {4, 4}, {12, 6}, {400, 200}}) {
+            const Bitmap bitmap = picture->draw(width, height).value();
+            const auto known = drawn.emplace(std::pair(width, height), bitmap).first;
+            EXPECT_EQ(bitmap.width, width);
+            EXPECT_EQ(bitmap.height, height);
+            EXPECT_EQ(bitmap.pixels, known->second.pixels);
+        }
+    }
+}
+
 TEST(Picture, FillsSizesOfOtherProportionsWhole) {
     for (const auto& picture : {pictureOf(twoColours()), pngPictureOf(redBesideBlue())}) {
         const auto bitmap = picture->draw(2, 12);

@@ -75,6 +75,34 @@ TEST(Value, OnlyNumbersAndTextHaveANumericValue) {
     }
 }
 
+TEST(Value, WholeNumbersAreCutOffTowardZero) {
+    EXPECT_EQ(Value(7.9).intValue(), 7);
+    EXPECT_EQ(Value(-7.9).intValue(), -7);
+    EXPECT_EQ(Value(true).intValue(), 1);
+    EXPECT_EQ(Value("7.9").intValue(), 7);
+    EXPECT_EQ(Value(" \t+7abc").intValue(), 7);
+    EXPECT_EQ(Value("-7").intValue(), -7);
+    for (const char* text : {"", "abc", "+", "-", "+-7", "- 7", ".7"})
+        EXPECT_EQ(Value(text).intValue(), 0) << text;
+}
+
+TEST(Value, WholeNumbersAreKeptWithinTheirType) {
+    constexpr auto least = std::numeric_limits<std::int64_t>::min();
+    constexpr auto largest = std::numeric_limits<std::int64_t>::max();
+    EXPECT_EQ(Value(largest).intValue(), largest);
+    EXPECT_EQ(Value("9223372036854775807").intValue(), largest);
+    EXPECT_EQ(Value("9223372036854775808").intValue(), largest);
+    EXPECT_EQ(Value("-9223372036854775809").intValue(), least);
+    EXPECT_EQ(Value(1e300).intValue(), largest);
+    EXPECT_EQ(Value(-1e300).intValue(), least);
+    EXPECT_EQ(Value(std::nan("")).intValue(), 0);
+}
+
+TEST(Value, OnlyNumbersAndTextHaveAWholeNumber) {
+    EXPECT_EQ(Value(Array{7}).intValue(), std::nullopt);
+    EXPECT_EQ(Value(Size{7, 7}).intValue(), std::nullopt);
+}
+
 TEST(Value, TruthComesFromNumbersAndFromTextThatAffirms) {
     for (const Value& value : {Value(true), Value(2), Value(-0.5), Value("YES"), Value("y"), Value(" true"),
                                Value("T"), Value("1"), Value("0.5"), Value("-1")})
