@@ -72,20 +72,20 @@ VXReelixPlugin::Group VXReelixPlugin::performLoadData() {
 void VXReelixPlugin::_setMediaObjectsForRootMediaGroup(const Group& rootMediaGroup) {
     if (!rootMediaGroup)
         return;
-    vexo::VXMediaObjectList mediaObjects;
+    Objects mediaObjects;
     for (const Group& child : rootMediaGroup->childGroups()) {
         const auto& type = child->typeIdentifier();
         if (type == vexo::VXReelixProjectLibraryGroupTypeIdentifier)
             continue;
         if (type == vexo::VXReelixProjectGroupTypeIdentifier) {
             if (const Object representative = _representingMediaObjectForProject(child))
-                mediaObjects = mediaObjects.appending(representative);
+                mediaObjects.push_back(representative);
             continue;
         }
-        for (const Object& mediaObject : child->mediaObjects())
-            mediaObjects = mediaObjects.appending(mediaObject);
+        const vexo::VXMediaObjectList ofChild = child->mediaObjects();
+        mediaObjects.insert(mediaObjects.end(), ofChild.begin(), ofChild.end());
     }
-    rootMediaGroup->setMediaObjects(mediaObjects);
+    rootMediaGroup->setMediaObjects(vexo::VXMediaObjectList(std::move(mediaObjects)));
 }
 
 bool VXReelixPlugin::canLoadData() {

@@ -1,7 +1,6 @@
 #include "framework/MediaObjectRegistry.h"
 
 #include <functional>
-#include <vector>
 
 #include "framework/TreeWalk.h"
 
@@ -15,39 +14,34 @@ std::size_t hashOf(const std::string& ID) {
 }  // namespace
 
 void MediaObjectRegistry::registerTree(const VXMediaGroupRef& root) {
-    std::vector<VXMediaGroupRef> groups;
-    visitGroups(root, [&groups](const VXMediaGroupRef& group) {
-        groups.push_back(group);
+    forgetVanished();
+    visitGroups(root, [this](const VXMediaGroupRef& group) {
+        for (const VXMediaObjectRef& mediaObject : group->ownMediaObjects().value_or(VXMediaObjectList()))
+            registerObject(mediaObject);
         return true;
     });
-    platform::Locked lock(mutex_);
-    forgetVanished();
-    for (const VXMediaGroupRef& group : groups)
-        registerObjectsOf(*group);
-}
-
-void MediaObjectRegistry::registerObjectsOf(const VXMediaGroup& group) {
-    if (const auto mediaObjects = group.ownMediaObjects())
-        for (const VXMediaObjectRef& mediaObject : *mediaObjects)
-            registerObject(mediaObject);
 }
 
 VXMediaObjectRef MediaObjectRegistry::objectForID(const std::string& ID) const {
+    const std::size_t hash = hashOf(ID);
     platform::Locked lock(mutex_);
-    return find(ID);
+    return find(ID, hash);
 }
 
 void MediaObjectRegistry::registerObject(const VXMediaObjectRef& mediaObject) {
-    if (!find(mediaObject->ID()))
-        objects_.emplace(hashOf(mediaObject->ID()), mediaObject);
+    const std::size_t hash = hashOf(mediaObject->ID());
+    platform::Locked lock(mutex_);
+    if (!find(mediaObject->ID(), hash))
+        objects_.emplace(hash, mediaObject);
 }
 
 void MediaObjectRegistry::forgetVanished() {
+    platform::Locked lock(mutex_);
     std::erase_if(objects_, [](const auto& entry) { return entry.second.expired(); });
 }
 
-VXMediaObjectRef MediaObjectRegistry::find(const std::string& ID) const {
-    const auto [first, last] = objects_.equal_range(hashOf(ID));
+VXMediaObjectRef MediaObjectRegistry::find(const std::string& ID, std::size_t hash) const {
+    const auto [first, last] = objects_.equal_range(hash);
     for (auto entry = first; entry != last; ++entry) {
         VXMediaObjectRef mediaObject = entry->second.lock();
         if (mediaObject && mediaObject->ID() == ID)

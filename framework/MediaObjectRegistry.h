@@ -14,16 +14,17 @@ namespace vexo {
 
 class MediaObjectRegistry {
   public:
-    // Registers every item of a tree, a group's own items before those of its children.
+    // Registers every item of a tree, a group's own items before those of its children. Whoever asks for an
+    // item meanwhile doesn't wait for the whole tree.
     void registerTree(const VXMediaGroupRef& root) VX_EXCLUDES(mutex_);
+    // Gives up the memory of items that have gone: a weak reference keeps it.
+    void forgetVanished() VX_EXCLUDES(mutex_);
     // nil when there is none, or when it has gone.
     VXMediaObjectRef objectForID(const std::string& ID) const VX_EXCLUDES(mutex_);
 
   private:
-    void registerObjectsOf(const VXMediaGroup& group) VX_REQUIRES(mutex_);
-    void registerObject(const VXMediaObjectRef& mediaObject) VX_REQUIRES(mutex_);
-    void forgetVanished() VX_REQUIRES(mutex_);
-    VXMediaObjectRef find(const std::string& ID) const VX_REQUIRES(mutex_);
+    void registerObject(const VXMediaObjectRef& mediaObject) VX_EXCLUDES(mutex_);
+    VXMediaObjectRef find(const std::string& ID, std::size_t hash) const VX_REQUIRES(mutex_);
 
     mutable platform::Mutex mutex_;
     // By the hash of the ID, so that no ID is stored twice.

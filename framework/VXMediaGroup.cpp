@@ -1,5 +1,7 @@
 #include "host/VXMediaGroup.h"
 
+#include <vector>
+
 #include "platform/FileManager.h"
 #include "platform/Services.h"
 
@@ -77,12 +79,25 @@ void VXMediaGroup::addChildGroups(const VXMediaGroupList& childGroups) {
 VXMediaObjectList VXMediaGroup::mediaObjects() const {
     if (std::optional<VXMediaObjectList> own = ownMediaObjects())
         return *own;
-    VXMediaObjectList gathered;
+    std::vector<VXMediaObjectList> lists;
+    addListsOfChildren(lists);
+    std::size_t count = 0;
+    for (const VXMediaObjectList& list : lists)
+        count += list.size();
+    std::vector<VXMediaObjectRef> gathered;
+    gathered.reserve(count);
+    for (const VXMediaObjectList& list : lists)
+        gathered.insert(gathered.end(), list.begin(), list.end());
+    return VXMediaObjectList(std::move(gathered));
+}
+
+void VXMediaGroup::addListsOfChildren(std::vector<VXMediaObjectList>& lists) const {
     for (const VXMediaGroupRef& childGroup : childGroups()) {
-        for (const VXMediaObjectRef& mediaObject : childGroup->mediaObjects())
-            gathered = gathered.appending(mediaObject);
+        if (std::optional<VXMediaObjectList> own = childGroup->ownMediaObjects())
+            lists.push_back(std::move(*own));
+        else
+            childGroup->addListsOfChildren(lists);
     }
-    return gathered;
 }
 
 void VXMediaGroup::setMediaObjects(VXMediaObjectList mediaObjects) {

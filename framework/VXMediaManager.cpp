@@ -197,6 +197,10 @@ void VXMediaManager::setRootMediaGroup(VXMediaGroupRef group) {
         Locked lock(state_->mutex);
         state_->root.swap(previous);
     }
+    if (previous != group) {
+        previous = nullptr;
+        state_->registry.forgetVanished();
+    }
     state_->observers.notify(group);
 }
 

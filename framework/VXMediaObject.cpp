@@ -1,5 +1,8 @@
 #include "host/VXMediaObject.h"
 
+#include <set>
+#include <utility>
+
 #include "framework/HostServices.h"
 #include "framework/MetadataProvider.h"
 #include "framework/ThumbnailProvider.h"
@@ -12,6 +15,25 @@ namespace {
 
 using platform::Locked;
 
+// The texts of keys, each once for all items. Keys are names that programs use, so they are few.
+class KeyTexts {
+  public:
+    std::string_view lasting(std::string_view key) VX_EXCLUDES(mutex_) {
+        Locked lock(mutex_);
+        const auto known = texts_.find(key);
+        return known != texts_.end() ? *known : *texts_.emplace(key).first;
+    }
+
+  private:
+    platform::Mutex mutex_;
+    std::set<std::string, std::less<>> texts_ VX_GUARDED_BY(mutex_);
+};
+
+std::string_view lastingText(std::string_view key) {
+    static auto& texts = *new KeyTexts;  // never freed: items may outlive everything else
+    return texts.lasting(key);
+}
+
 std::optional<platform::Size> resolutionOf(const VXMetadataProperties& properties) {
     const auto width = properties.valueForKey(kMDItemPixelWidth);
     const auto height = properties.valueForKey(kMDItemPixelHeight);
@@ -23,7 +45,7 @@ std::optional<platform::Size> resolutionOf(const VXMetadataProperties& propertie
 }  // namespace
 
 VXMediaObject::VXMediaObject(int mediaType, std::string name, std::string objectID)
-    : mediaType_(mediaType), ID_(std::move(objectID)), name_(std::move(name)) {}
+    : ID_(std::move(objectID)), mediaType_(mediaType), name_(std::move(name)) {}
 
 std::string VXMediaObject::name() const {
     Locked lock(mutex_);
@@ -37,12 +59,17 @@ void VXMediaObject::setName(std::string name) {
 
 std::optional<std::string> VXMediaObject::path() const {
     Locked lock(mutex_);
-    return path_;
+    if (otherPath_)
+        return *otherPath_;
+    return pathIsID_ ? std::optional(ID_) : std::nullopt;
 }
 
 void VXMediaObject::setPath(std::string path) {
+    const bool isID = path == ID_;
+    auto other = isID ? nullptr : std::make_unique<const std::string>(std::move(path));
     Locked lock(mutex_);
-    path_ = std::move(path);
+    pathIsID_ = isID;
+    otherPath_.swap(other);
 }
 
 std::optional<platform::URL> VXMediaObject::URL() const {
@@ -78,13 +105,14 @@ void VXMediaObject::setIcon(platform::ImageRef icon) {
 }
 
 platform::ImageRef VXMediaObject::thumbnailImage() const {
-    std::optional<std::string> file;
     {
         Locked lock(mutex_);
-        if (thumbnailImage_ || !path_)
+        if (thumbnailImage_)
             return thumbnailImage_;
-        file = path_;
     }
+    const std::optional<std::string> file = path();
+    if (!file)
+        return nullptr;
     const platform::ImageRef image = hostServices().thumbnails.thumbnailOfFile(*file);
     Locked lock(mutex_);
     if (!thumbnailImage_)  // else another thread was first
@@ -106,8 +134,8 @@ void VXMediaObject::setThumbnailImage(platform::ImageRef image) {
 std::optional<platform::Value> VXMediaObject::attributeForKey(std::string_view key) const {
     {
         Locked lock(mutex_);
-        if (const platform::Value* value = platform::find(attributes_, key))
-            return *value;
+        if (const Attribute* attribute = findAttribute(key))
+            return attribute->value;
     }
     return metadataAttributeForKey(key);
 }
@@ -130,22 +158,46 @@ std::optional<platform::Value> VXMediaObject::metadataAttributeForKey(std::strin
 }
 
 void VXMediaObject::setAttribute(platform::Value attribute, std::string_view forKey) {
+    const std::string_view key = lastingText(forKey);
     Locked lock(mutex_);
-    attributes_.insert_or_assign(std::string(forKey), std::move(attribute));
+    std::erase_if(attributes_, [key](const Attribute& each) { return each.key == key; });
+    attributes_.push_back({key, std::move(attribute)});
+}
+
+const VXMediaObject::Attribute* VXMediaObject::findAttribute(std::string_view key) const {
+    for (const Attribute& attribute : attributes_) {
+        if (attribute.key == key)
+            return &attribute;
+    }
+    return nullptr;
 }
 
 platform::Dictionary VXMediaObject::attributes() const {
+    platform::Dictionary attributes;
     Locked lock(mutex_);
-    return attributes_;
+    for (const auto& [key, value] : attributes_)
+        attributes.emplace(key, value);
+    return attributes;
 }
 
 void VXMediaObject::setSpotlightProperties(VXMetadataPropertiesRef properties) {
+    const bool areOfID = properties && hostServices().metadata.areUnreadPropertiesOfFile(*properties, ID_);
+    VXMetadataPropertiesRef kept = areOfID ? nullptr : properties;
     Locked lock(mutex_);
-    spotlightProperties_.swap(properties);
+    propertiesAreOfID_ = areOfID;
+    spotlightProperties_.swap(kept);
 }
 
 VXMetadataPropertiesRef VXMediaObject::spotlightProperties() const {
+    {
+        Locked lock(mutex_);
+        if (!propertiesAreOfID_)
+            return spotlightProperties_;
+    }
+    VXMetadataPropertiesRef ofID = spotlightProperties(ID_);
     Locked lock(mutex_);
+    if (std::exchange(propertiesAreOfID_, false))  // else another thread was first
+        spotlightProperties_.swap(ofID);
     return spotlightProperties_;
 }
 

@@ -7,6 +7,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <vector>
 
 #include "host/VXConstants.h"
 #include "host/VXMediaObject.h"
@@ -70,6 +71,8 @@ class VXMediaGroup final {
     VXMediaGroupRef copy() const VX_EXCLUDES(mutex_);
 
   private:
+    void addListsOfChildren(std::vector<VXMediaObjectList>& lists) const VX_EXCLUDES(mutex_);
+
     // Everything a copy shares with its original.
     struct Fields {
         std::optional<std::string> name;

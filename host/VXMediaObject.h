@@ -2,17 +2,21 @@
 //
 // Items have identity and are shared. Every operation is callable from any thread; a reader sees either the
 // old or the new value of a field that is being set.
+//
+// A library holds hundreds of thousands of them, so an item is small: what follows from its ID is not stored
+// a second time.
 #pragma once
 
 #include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "host/VXMetadata.h"
 #include "platform/Image.h"
+#include "platform/SmallMutex.h"
 #include "platform/SnapshotList.h"
-#include "platform/ThreadSafety.h"
 #include "platform/URL.h"
 #include "platform/Value.h"
 
@@ -57,9 +61,11 @@ class VXMediaObject final {
     // What was set, without the fallback.
     platform::Dictionary attributes() const VX_EXCLUDES(mutex_);
 
-    // setSpotlightProperties:
+    // setSpotlightProperties:; properties of the file that the ID names are made anew when they are asked
+    // for, if nothing of them was read yet.
     void setSpotlightProperties(VXMetadataPropertiesRef properties) VX_EXCLUDES(mutex_);
-    VXMetadataPropertiesRef spotlightProperties() const VX_EXCLUDES(mutex_);  // nil when none were set
+    // nil when none were set; else the same object each time.
+    VXMetadataPropertiesRef spotlightProperties() const VX_EXCLUDES(mutex_);
     // spotlightProperties:; the properties of the file at `path`, never nil.
     static VXMetadataPropertiesRef spotlightProperties(const std::string& path);
 
@@ -71,19 +77,28 @@ class VXMediaObject final {
     static std::string aliasResolvedPath(const std::string& path);
 
   private:
+    struct Attribute {
+        std::string_view key;  // lives as long as the process
+        platform::Value value;
+    };
+
     std::optional<platform::Value> metadataAttributeForKey(std::string_view key) const;
+    const Attribute* findAttribute(std::string_view key) const VX_REQUIRES(mutex_);
 
-    const int mediaType_;
     const std::string ID_;
+    const int mediaType_;
 
-    mutable platform::Mutex mutex_;
+    mutable platform::SmallMutex mutex_;
+    int mediaSourceType_ VX_GUARDED_BY(mutex_) = 0;
+    bool pathIsID_ VX_GUARDED_BY(mutex_) = false;
+    // Whether the properties are those of the file that the ID names, until somebody asks for them.
+    mutable bool propertiesAreOfID_ VX_GUARDED_BY(mutex_) = false;
     std::string name_ VX_GUARDED_BY(mutex_);
-    std::optional<std::string> path_ VX_GUARDED_BY(mutex_);
-    platform::Dictionary attributes_ VX_GUARDED_BY(mutex_);
+    std::unique_ptr<const std::string> otherPath_ VX_GUARDED_BY(mutex_);  // nil when the path is the ID
+    std::vector<Attribute> attributes_ VX_GUARDED_BY(mutex_);             // as they came: they are few
     platform::ImageRef icon_ VX_GUARDED_BY(mutex_);
     mutable platform::ImageRef thumbnailImage_ VX_GUARDED_BY(mutex_);  // made when first asked for
-    VXMetadataPropertiesRef spotlightProperties_ VX_GUARDED_BY(mutex_);
-    int mediaSourceType_ VX_GUARDED_BY(mutex_) = 0;
+    mutable VXMetadataPropertiesRef spotlightProperties_ VX_GUARDED_BY(mutex_);
 };
 
 using VXMediaObjectList = platform::SnapshotList<VXMediaObjectRef>;

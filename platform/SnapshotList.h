@@ -13,7 +13,6 @@
 #include <atomic>
 #include <cstddef>
 #include <initializer_list>
-#include <iterator>
 #include <memory>
 #include <utility>
 #include <vector>
@@ -28,22 +27,21 @@ class SnapshotList {
 
     SnapshotList() = default;
     SnapshotList(std::initializer_list<T> elements) : SnapshotList(elements.begin(), elements.end()) {}
-    explicit SnapshotList(const std::vector<T>& elements) : SnapshotList(elements.begin(), elements.end()) {}
-
-    template <typename Iterator>
-    SnapshotList(Iterator first, Iterator last)
-        : buffer_(std::make_shared<Buffer>(static_cast<std::size_t>(std::distance(first, last)))),
-          count_(buffer_->capacity) {
-        std::copy(first, last, buffer_->slots.get());
+    // Takes the elements over without copying one.
+    explicit SnapshotList(std::vector<T> elements)
+        : buffer_(std::make_shared<Buffer>(std::move(elements))), count_(buffer_->slots.size()) {
         buffer_->filled = count_;
     }
+
+    template <typename Iterator>
+    SnapshotList(Iterator first, Iterator last) : SnapshotList(std::vector<T>(first, last)) {}
 
     std::size_t size() const { return count_; }
     bool empty() const { return count_ == 0; }
     const T& operator[](std::size_t index) const { return buffer_->slots[index]; }
     const T& front() const { return (*this)[0]; }
     const T& back() const { return (*this)[count_ - 1]; }
-    const_iterator begin() const { return buffer_ ? buffer_->slots.get() : nullptr; }
+    const_iterator begin() const { return buffer_ ? buffer_->slots.data() : nullptr; }
     const_iterator end() const { return begin() + count_; }
 
     void swap(SnapshotList& other) noexcept {
@@ -60,22 +58,22 @@ class SnapshotList {
 
   private:
     struct Buffer {
-        explicit Buffer(std::size_t room) : capacity(room), slots(std::make_unique<T[]>(room)) {}
-        const std::size_t capacity;
+        explicit Buffer(std::size_t room) : slots(room) {}
+        explicit Buffer(std::vector<T> elements) : slots(std::move(elements)) {}
+        std::vector<T> slots;  // never grows
         std::atomic<std::size_t> filled{0};
-        std::unique_ptr<T[]> slots;
     };
 
     // The same elements, in a buffer whose next slot belongs to the caller alone.
     SnapshotList withRoomForOneMore() const {
         std::size_t expected = count_;
-        if (buffer_ && count_ < buffer_->capacity &&
+        if (buffer_ && count_ < buffer_->slots.size() &&
             buffer_->filled.compare_exchange_strong(expected, count_ + 1, std::memory_order_acq_rel))
             return *this;
 
         SnapshotList copy;
         copy.buffer_ = std::make_shared<Buffer>(count_ == 0 ? 1 : 2 * count_);
-        std::copy(begin(), end(), copy.buffer_->slots.get());
+        std::copy(begin(), end(), copy.buffer_->slots.begin());
         copy.buffer_->filled = count_ + 1;
         copy.count_ = count_;
         return copy;

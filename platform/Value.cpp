@@ -100,6 +100,11 @@ std::string stringFromSize(const Size& size) {
     return fmt::format("{{{}, {}}}", size.width, size.height);
 }
 
+const std::string* Value::string() const {
+    const auto* text = std::get_if<std::shared_ptr<const std::string>>(&content_);
+    return text ? text->get() : nullptr;
+}
+
 DateRef Value::date() const {
     const DateRef* date = std::get_if<DateRef>(&content_);
     return date ? *date : nullptr;

@@ -1,7 +1,7 @@
 // The values that attributes, metadata properties, preferences and property lists are made of.
 //
-// A Value is immutable once made and cheap to copy: containers are shared. Absence is not a value; use
-// std::optional<Value>.
+// A Value is immutable once made and cheap to copy: texts and containers are shared. Absence is not a value;
+// use std::optional<Value>.
 #pragma once
 
 #include <cstddef>
@@ -40,9 +40,9 @@ class Value {
     Value(int number) : content_(std::int64_t{number}) {}
     Value(std::int64_t number) : content_(number) {}
     Value(double number) : content_(number) {}
-    Value(std::string text) : content_(std::move(text)) {}
-    Value(std::string_view text) : content_(std::string(text)) {}
-    Value(const char* text) : content_(std::string(text)) {}
+    Value(std::string text) : content_(std::make_shared<const std::string>(std::move(text))) {}
+    Value(std::string_view text) : Value(std::string(text)) {}
+    Value(const char* text) : Value(std::string(text)) {}
     Value(DateRef date) : content_(std::move(date)) {}  // Requires: date is not nil.
     Value(Size size) : content_(size) {}
     Value(Data data) : content_(std::make_shared<const Data>(std::move(data))) {}
@@ -53,7 +53,7 @@ class Value {
     const bool* boolean() const { return std::get_if<bool>(&content_); }
     const std::int64_t* integer() const { return std::get_if<std::int64_t>(&content_); }
     const double* real() const { return std::get_if<double>(&content_); }
-    const std::string* string() const { return std::get_if<std::string>(&content_); }
+    const std::string* string() const;
     const Size* size() const { return std::get_if<Size>(&content_); }
     DateRef date() const;
     const Data* data() const;
@@ -75,8 +75,8 @@ class Value {
     bool operator==(const Value& other) const;
 
   private:
-    std::variant<bool, std::int64_t, double, std::string, DateRef, Size, std::shared_ptr<const Data>,
-                 std::shared_ptr<const Array>, std::shared_ptr<const Dictionary>>
+    std::variant<bool, std::int64_t, double, std::shared_ptr<const std::string>, DateRef, Size,
+                 std::shared_ptr<const Data>, std::shared_ptr<const Array>, std::shared_ptr<const Dictionary>>
         content_;
 };
 

@@ -175,7 +175,8 @@ std::optional<std::string> problemWith(const MediaReaderAnswer& answer) {
 
 const MediaProperties nothing;
 
-// One for each item of a tree, so it is small: the content's properties are held apart, once they are known.
+// Items of a tree hold one each, once somebody asked for it, so it is small: the content's properties are
+// held apart, once they are known.
 class FileMetadata final : public VXMetadataProperties {
   public:
     FileMetadata(std::weak_ptr<MetadataCache> cache, std::string path)
@@ -183,6 +184,10 @@ class FileMetadata final : public VXMetadataProperties {
     ~FileMetadata() override { dispose(media_); }
     FileMetadata(const FileMetadata&) = delete;
     FileMetadata& operator=(const FileMetadata&) = delete;
+
+    bool isUnread(const std::shared_ptr<MetadataCache>& cache, std::string_view path) const {
+        return !media_ && path_ == path && cache_.lock() == cache;
+    }
 
     std::optional<Value> valueForKey(std::string_view key) const override {
         const Dictionary values = isMediaKey(key) ? mediaValues(media()) : fileValues(key);
@@ -257,6 +262,12 @@ MetadataStore::~MetadataStore() = default;
 
 VXMetadataPropertiesRef MetadataStore::propertiesForFile(const std::string& path) const {
     return std::make_shared<FileMetadata>(cache_, path);
+}
+
+bool MetadataStore::areUnreadPropertiesOfFile(const VXMetadataProperties& properties,
+                                              std::string_view path) const {
+    const auto* own = dynamic_cast<const FileMetadata*>(&properties);
+    return own && own->isUnread(cache_, path);
 }
 
 bool MetadataStore::supportedMovieFile(const std::string& path) const {

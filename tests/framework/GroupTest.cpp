@@ -58,6 +58,22 @@ TEST(GroupTest, AGroupThatWasGivenNoItemsReportsThoseOfItsChildren) {
     EXPECT_EQ(parent->ownMediaObjects(), std::nullopt);
 }
 
+TEST(GroupTest, ItemsAreGatheredThroughGroupsWithoutItemsAndNotBelowThoseWithSome) {
+    const auto root = group("root");
+    const auto middle = group("middle");
+    const auto empty = group("empty");
+    const auto below = group("below");
+    const auto last = group("last");
+    root->setChildGroups({middle, empty, group("without anything"), last});
+    middle->setChildGroups({last, last});
+    empty->setMediaObjects({});
+    empty->addChildGroup(below);
+    below->setMediaObjects({item("hidden")});
+    last->setMediaObjects({item("a"), item("b")});
+
+    EXPECT_EQ(IDs(root->mediaObjects()), (std::vector<std::string>{"a", "b", "a", "b", "a", "b"}));
+}
+
 TEST(GroupTest, AGroupThatWasGivenAnEmptyListReportsNone) {
     const auto parent = group("parent");
     const auto child = group("child");

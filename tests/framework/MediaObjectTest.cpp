@@ -1,7 +1,12 @@
 #include "host/VXMediaObject.h"
 
 #include <gtest/gtest.h>
+#include <malloc.h>
 
+#include <thread>
+
+#include "framework/HostServices.h"
+#include "framework/metadata/MetadataStore.h"
 #include "host/VXConstants.h"
 #include "tests/support/HostEnvironment.h"
 
@@ -55,6 +60,120 @@ TEST_F(MediaObjectTest, TheStoredAttributesLeaveOutTheMetadata) {
     environment.metadata.setMovie("/a.mov", {1920, 1080});
     const auto movie = movieAt("/a.mov");
     EXPECT_TRUE(movie->attributes().empty());
+}
+
+TEST_F(MediaObjectTest, AnAttributeThatIsSetAgainIsReplaced) {
+    const auto movie = movieAt("/a.mov");
+    movie->setAttribute(1, "second key");
+    movie->setAttribute(2, "key");
+    movie->setAttribute(3, "second key");
+    EXPECT_EQ(movie->attributes(), (platform::Dictionary{{"key", 2}, {"second key", 3}}));
+}
+
+TEST_F(MediaObjectTest, AKeyMayGoOnceItsAttributeIsSet) {
+    const auto movie = movieAt("/a.mov");
+    {
+        std::string key = "a key that nothing else names";
+        movie->setAttribute(7, key);
+        key.assign(key.size(), 'x');
+    }
+    EXPECT_EQ(movie->attributeForKey("a key that nothing else names"), platform::Value(7));
+}
+
+TEST_F(MediaObjectTest, ThePathIsTheLastThatWasSetWhetherItIsTheIDOrNot) {
+    VXMediaObject item(VXMediaTypeMovie, "name", "/id.mov");
+    EXPECT_EQ(item.path(), std::nullopt);
+    for (const std::string path : {"/id.mov", "/other.mov", "/third.mov", "/id.mov", ""}) {
+        item.setPath(path);
+        EXPECT_EQ(item.path(), path);
+        EXPECT_EQ(item.ID(), "/id.mov");
+    }
+}
+
+// The host's own metadata, of which items keep less than of any other.
+class StoredMetadataTest : public MediaObjectTest {
+  protected:
+    StoredMetadataTest() {
+        const HostServices& fake = hostServices();
+        scope.emplace(
+            HostServices{fake.pathWatcher, fake.imageManager, store, fake.thumbnails, fake.diagnostics});
+    }
+
+    std::optional<platform::Value> fileName(const VXMediaObject& item) {
+        return item.spotlightProperties()->valueForKey(kMDItemFSName);
+    }
+
+    // As a scan of an event makes one.
+    VXMediaObjectRef clipAt(const std::string& path, const platform::Value& event) {
+        auto clip = movieAt(path);
+        clip->setMediaSourceType(VXMediaSourceTypeFile);
+        clip->setAttribute(event, VXReelixProjectPathKey);
+        return clip;
+    }
+
+    MetadataStore store{std::nullopt, nullptr};
+    std::optional<HostServicesScope> scope;
+};
+
+TEST_F(StoredMetadataTest, PropertiesAreTheSameObjectEachTime) {
+    const auto movie = movieAt(environment.home.writeFile("a.mov"));
+    const auto properties = movie->spotlightProperties();
+    ASSERT_NE(properties, nullptr);
+    EXPECT_EQ(movie->spotlightProperties(), properties);
+    EXPECT_EQ(fileName(*movie), platform::Value("a.mov"));
+}
+
+TEST_F(StoredMetadataTest, PropertiesStayThoseOfTheirFileWhenThePathChanges) {
+    const auto movie = movieAt(environment.home.writeFile("a.mov"));
+    movie->setPath(environment.home.writeFile("b.mov"));
+    EXPECT_EQ(fileName(*movie), platform::Value("a.mov"));
+}
+
+TEST_F(StoredMetadataTest, PropertiesOfAFileThatTheIDDoesNotNameAreKept) {
+    const auto movie = movieAt(environment.home.writeFile("a.mov"));
+    const auto other = VXMediaObject::spotlightProperties(environment.home.writeFile("b.mov"));
+    movie->setSpotlightProperties(other);
+    EXPECT_EQ(movie->spotlightProperties(), other);
+    movie->setSpotlightProperties(nullptr);
+    EXPECT_EQ(movie->spotlightProperties(), nullptr);
+}
+
+TEST_F(StoredMetadataTest, ThreadsThatAskForPropertiesAtOnceGetTheSameObject) {
+    for (int round = 0; round < 100; ++round) {
+        const auto movie = movieAt("/a.mov");
+        VXMetadataPropertiesRef fromThread;
+        std::thread thread([&] { fromThread = movie->spotlightProperties(); });
+        const VXMetadataPropertiesRef properties = movie->spotlightProperties();
+        thread.join();
+        ASSERT_EQ(fromThread, properties);
+    }
+}
+
+std::size_t allocatedBytes() {
+    const struct mallinfo2 info = mallinfo2();
+    return info.uordblks + info.hblkhd;
+}
+
+TEST_F(StoredMetadataTest, AClipTakesLittleMoreThanItsPathAndItsName) {
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+    GTEST_SKIP() << "a sanitizer has an allocator of its own";
+#endif
+    const std::string folder = "/home/somebody/Movies/Reelix Events/A day at the lake";
+    const platform::Value event = folder;
+    std::vector<VXMediaObjectRef> clips;
+    constexpr int small = 1000;
+    constexpr int large = 11000;
+    clips.reserve(large);
+    const auto bytesWith = [&](int count) {
+        while (clips.size() < static_cast<std::size_t>(count))
+            clips.push_back(clipAt(folder + "/clip " + std::to_string(100'000 + clips.size()), event));
+        return allocatedBytes();
+    };
+    const std::size_t before = bytesWith(small);
+    const std::size_t bytes = (bytesWith(large) - before) / (large - small);
+    const std::size_t pathAndName = folder.size() + 2 * std::string("/clip 100000").size();
+    EXPECT_LE(bytes, pathAndName + 250);
+    EXPECT_EQ(clips.back()->attributeForKey(VXReelixProjectPathKey), event);
 }
 
 TEST_F(MediaObjectTest, AnItemWithoutAPathHasNoURL) {

@@ -88,6 +88,16 @@ TEST(SnapshotListTest, GrowingOneByOneMovesEachElementAFewTimesOnly) {
     EXPECT_LT(Counted::transfers, 4u * count);
 }
 
+TEST(SnapshotListTest, AVectorIsTakenOverAsItIs) {
+    std::vector<Counted> elements(10);
+    elements[7].value = 7;
+    Counted::transfers = 0;
+    const SnapshotList<Counted> list(std::move(elements));
+    EXPECT_EQ(list.size(), 10u);
+    EXPECT_EQ(list[7].value, 7);
+    EXPECT_EQ(Counted::transfers, 0u);
+}
+
 TEST(SnapshotListTest, AgreesWithPlainVectorsWhateverGrowsFromWhat) {
     std::mt19937 random(11);
     std::vector<Numbers> lists(1);
