@@ -173,9 +173,9 @@ TEST_F(ThumbnailOverlayTest, ABandBeginsBeyondFifty) {
         expectOverlay({width, 90}, 0, /*hasBand=*/true);
 }
 
-// Half a point makes the image half a pixel narrower than its bitmap, which blurs what is compared.
+// At two pixels a point, where half a point is a whole pixel.
 TEST_F(ThumbnailOverlayTest, HalfPointsCountAtBothWidths) {
-    EXPECT_EQ(pixel(drawn(overlay(newProjectMovie(0), {40.5, 40}), 2), 70, 79), 0u);
+    ASSERT_NE(overlay(newProjectMovie(125), {40.5, 40}), nullptr);
     expectAlikeOutside({}, drawn(overlay(newProjectMovie(125), {40.5, 40}), 2),
                        expectedOverlay({40.5, 40}, 2, /*hasBand=*/false, icon()));
     expectAlikeOutside({}, drawn(overlay(newProjectMovie(0), {50.5, 40}), 2),
