@@ -49,7 +49,7 @@ class BitmapPicture final : public Picture {
     const Bitmap bitmap_;
 };
 
-// The last few renderings of a picture. Drawing an icon from its shapes costs a hundred times what copying
+// The last few renderings of a picture. Drawing an icon from its shapes costs a thousand times what copying
 // its pixels does, and lists draw one icon at one size again and again.
 class Renderings {
   public:

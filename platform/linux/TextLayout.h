@@ -1,6 +1,6 @@
 // Lines of text laid out with Pango, in the desktop's usual font. One point is one unit of a Cairo context.
 //
-// Laying text out costs many times what drawing it does, so each thread keeps what it has laid out last.
+// Laying text out costs several times what drawing it does, so each thread keeps what it has laid out last.
 #pragma once
 
 #include <pango/pangocairo.h>
