@@ -52,14 +52,17 @@ class BareOverlay {
             reinterpret_cast<unsigned char*>(pixels.data()), CAIRO_FORMAT_ARGB32, width, height, width * 4);
         cairo_t* context = cairo_create(surface);
         cairo_set_source_rgba(context, 0, 0, 0, 0.5);
+        cairo_set_operator(context, CAIRO_OPERATOR_SOURCE);  // the quicker one
         cairo_rectangle(context, 0, height - bandHeight, width, bandHeight);
         cairo_fill(context);
+        cairo_set_operator(context, CAIRO_OPERATOR_OVER);
         cairo_set_source_surface(context, icon_, 2, height - iconSide + 1);
         cairo_paint(context);
         cairo_set_source_rgb(context, 1, 1, 1);
-        cairo_move_to(context, width - 3 - textWidth_ / double(PANGO_SCALE),
-                      height + 0.5 - textHeight_ / double(PANGO_SCALE));
-        pango_cairo_show_layout(context, layout_);
+        cairo_move_to(
+            context, width - 3 - textWidth_ / double(PANGO_SCALE),
+            height + 0.5 - (textHeight_ - pango_layout_get_baseline(layout_)) / double(PANGO_SCALE));
+        pango_cairo_show_layout_line(context, pango_layout_get_line_readonly(layout_, 0));
         cairo_destroy(context);
         cairo_surface_destroy(surface);
         return pixels;

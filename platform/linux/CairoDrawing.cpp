@@ -44,6 +44,10 @@ Rect partInside(Size area, const Rect& rect) {
             std::min(rect.y + rect.height, area.height) - bottom};
 }
 
+double points(int pangoUnits) {
+    return pangoUnits / double(PANGO_SCALE);
+}
+
 bool holds(const Rect& rect, Size size) {
     return size.width <= rect.width && size.height <= rect.height;
 }
@@ -90,8 +94,8 @@ class Player {
         if (!fits)
             clipToPixelsOf(partInside(size_, step.rect));
         setColor(step.text.color());
-        cairo_move_to(context_, step.rect.x, top(step.rect));
-        pango_cairo_show_layout(context_, layout);
+        cairo_move_to(context_, step.rect.x, top(step.rect) + points(pango_layout_get_baseline(layout)));
+        pango_cairo_show_layout_line(context_, pango_layout_get_line_readonly(layout, 0));
         cairo_restore(context_);
     }
 
@@ -209,7 +213,7 @@ Size AttributedString::size() const {
         return {};
     int width = 0, height = 0;
     pango_layout_get_size(layout, &width, &height);
-    return {width / double(PANGO_SCALE), height / double(PANGO_SCALE)};
+    return {points(width), points(height)};
 }
 
 }  // namespace platform
