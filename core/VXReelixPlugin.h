@@ -232,7 +232,9 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     void writeProjects(const Groups& projects, platform::Pasteboard& toPasteboard);
 
     struct ScannedClip;
+    struct ScannedEvent;
     struct EventYears;
+    class EventLibraryScan;
     using YearGroups = std::map<double, Group>;  // the year groups of one event library by their years
 
     void scanProjectLibraries(Groups& libraries) VX_REQUIRES(_monitor);
@@ -247,8 +249,8 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     Group newYearGroup(const std::optional<platform::Value>& year);
 
     Group eventGroupForFolder(const std::string& folder, const std::string& libraryFolder);
-    void scanEventFolder(const Group& event, const std::vector<std::string>& names, EventYears& years);
-    std::optional<ScannedClip> clipForFile(const std::string& eventFolder, const std::string& name);
+    // Gives the event its clips; false when it has none.
+    bool finishEvent(const ScannedEvent& scanned);
     void writeEventAttributes(const Group& event, const EventYears& years);
 
     void scheduleProjectsReload();

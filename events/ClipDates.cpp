@@ -1,6 +1,5 @@
 #include "events/ClipDates.h"
 
-#include <array>
 #include <cstring>
 
 #include "core/VXReelixPlugin.h"
@@ -13,32 +12,41 @@ namespace reelix {
 
 namespace path = platform::path;
 
+ClipNameTexts::ClipNameTexts(const VXReelixPlugin& plugin)
+    : prefix(plugin.localizedString("ReelixClipNamePrefix").value_or("") + "-"),
+      format(plugin.localizedString("ReelixClipNameFormat").value_or("")),
+      displayFormat(plugin.localizedString("ReelixClipNameDisplayFormat").value_or("")) {}
+
 platform::CalendarDateRef PathDate::_vxMBCalendarDateFromFileName(const std::string& fileName,
                                                                   const VXReelixPlugin& plugin) {
-    const std::string prefix = plugin.localizedString("ReelixClipNamePrefix").value_or("") + "-";
+    return dateFromFileName(fileName, ClipNameTexts(plugin));
+}
+
+platform::CalendarDateRef PathDate::dateFromFileName(const std::string& fileName,
+                                                     const ClipNameTexts& texts) {
     const std::string stem = path::withoutExtension(fileName);
-    if (!stem.starts_with(prefix))
+    if (!stem.starts_with(texts.prefix))
         return nullptr;
-    const std::string format = plugin.localizedString("ReelixClipNameFormat").value_or("");
-    const auto date =
-        platform::CalendarDate::dateWithString(std::string_view(stem).substr(prefix.size()), format);
+    const auto date = platform::CalendarDate::dateWithString(
+        std::string_view(stem).substr(texts.prefix.size()), texts.format);
     const int year = date ? date->yearOfCommonEra() : 0;
     return 1900 <= year && year <= 2100 ? date : nullptr;
 }
 
-platform::CalendarDateRef VXReelixPlugin::_dateFromExtendedFileAttributeAtPath(const std::string& path) {
-    constexpr std::string_view attribute = "date";
-    const platform::FileManager& files = platform::services().fileManager;
-    if (files.extendedAttribute(path, attribute, {}) <= 0)
-        return nullptr;
-
-    // The last byte stays NUL, so a value without one, or too long for the buffer, simply fails to parse.
-    std::array<char, 201> buffer{};
-    files.extendedAttribute(path, attribute, std::span(buffer).first(200));
-    const std::string_view text(buffer.data(), std::strlen(buffer.data()));
+platform::CalendarDateRef ClipDateValue::date() const {
+    const std::string_view text(bytes_.data(), std::strlen(bytes_.data()));
     if (!platform::isValidUTF8(text))
         return nullptr;
     return platform::CalendarDate::dateWithString(text, "%Y-%m-%d %H;%M;%S");
+}
+
+platform::CalendarDateRef VXReelixPlugin::_dateFromExtendedFileAttributeAtPath(const std::string& path) {
+    const platform::FileManager& files = platform::services().fileManager;
+    if (files.extendedAttribute(path, clipDateAttribute, {}) <= 0)
+        return nullptr;
+    ClipDateValue value;
+    files.extendedAttribute(path, clipDateAttribute, value.room());
+    return value.date();
 }
 
 platform::DateRef VXReelixPlugin::_nonCalendarDateFromDate(const platform::DateRef& date) {

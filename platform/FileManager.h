@@ -33,6 +33,34 @@ struct FileAttributes {
     DateRef creationDate;      // nil when the file system tells neither birth nor modification time
 };
 
+// What one look at an entry of a folder tells.
+struct FolderEntry {
+    std::uint32_t flags = 0;         // as itemFlagsAtPath answers
+    bool isOnFoldersDevice = false;  // whether it is neither a link nor a mount point
+    // What follows is told of the file that a link leads to.
+    bool isPlainFile = false;
+    bool hasAttributes = false;          // whether attributesOfItemAtPath answers any
+    std::optional<double> creationTime;  // the creation date of those, in seconds from 1970; nil for none
+};
+
+// A folder that is gone through. Each question answers as the operation by path does and costs as few calls
+// to the system as can be, which is what scans are made of. A folder that is moved meanwhile stays the same
+// folder. It holds a file open, so whoever goes down a tree closes each folder before entering the next.
+//
+// Callable from any thread.
+class Folder {
+  public:
+    virtual ~Folder() = default;
+
+    // As contentsOfDirectoryAtPath answers.
+    virtual const std::vector<std::string>& names() const = 0;
+    // nil when there is no such item.
+    virtual std::optional<FolderEntry> entryNamed(const std::string& name) const = 0;
+    // FileManager::extendedAttribute of an item, of which `entry` was told.
+    virtual std::ptrdiff_t extendedAttribute(const std::string& name, const FolderEntry& entry,
+                                             std::string_view attribute, std::span<char> buffer) const = 0;
+};
+
 class FileManager {
   public:
     virtual ~FileManager() = default;
@@ -48,6 +76,9 @@ class FileManager {
     // nil when the folder can't be listed; the reason goes to the system log.
     virtual std::optional<std::vector<std::string>> contentsOfDirectoryAtPath(
         const std::string& path) const = 0;
+
+    // The same folder, to go through. nil where contentsOfDirectoryAtPath answers nil.
+    virtual std::unique_ptr<Folder> openFolderAtPath(const std::string& path) const = 0;
 
     // attributesOfItemAtPath:error:; links are followed. nil when they can't be read.
     virtual std::optional<FileAttributes> attributesOfItemAtPath(const std::string& path) const = 0;

@@ -37,10 +37,15 @@ NameSet namesInHiddenFile(std::string_view content) {
 }
 
 bool HiddenNames::contains(const std::string& folder, std::string_view name) const {
+    const auto names = ofFolder(folder);
+    return names && names->contains(name);
+}
+
+std::shared_ptr<const NameSet> HiddenNames::ofFolder(const std::string& folder) const {
     const std::string path = path::appending(folder, ".hidden");
     struct statx status {};
     if (statx(AT_FDCWD, path.c_str(), AT_NO_AUTOMOUNT, STATX_BASIC_STATS, &status) != 0)
-        return false;
+        return nullptr;
     const Version version{std::uint64_t{status.stx_dev_major} << 32 | status.stx_dev_minor, status.stx_ino,
                           status.stx_size, status.stx_ctime.tv_sec, status.stx_ctime.tv_nsec};
     auto names = keptNames(folder, version);
@@ -50,7 +55,7 @@ bool HiddenNames::contains(const std::string& folder, std::string_view name) con
         if (!wasChangedJustNow(version.seconds))
             keep(folder, {version, names});
     }
-    return names->contains(name);
+    return names;
 }
 
 std::shared_ptr<const NameSet> HiddenNames::keptNames(const std::string& folder,

@@ -23,6 +23,8 @@ NameSet namesInHiddenFile(std::string_view content);
 class HiddenNames {
   public:
     bool contains(const std::string& folder, std::string_view name) const VX_EXCLUDES(mutex_);
+    // All of them; nil when there are none.
+    std::shared_ptr<const NameSet> ofFolder(const std::string& folder) const VX_EXCLUDES(mutex_);
 
   private:
     // What changes whenever the file does.

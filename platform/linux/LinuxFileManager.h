@@ -12,6 +12,7 @@
 #include "platform/FileManager.h"
 #include "platform/SystemLog.h"
 #include "platform/linux/HiddenNames.h"
+#include "platform/linux/LinuxFolder.h"
 #include "platform/linux/MountTable.h"
 
 struct statx;
@@ -34,6 +35,7 @@ class LinuxFileManager final : public FileManager {
     std::optional<std::string> homeDirectory() const override { return homeDirectory_; }
     std::optional<FileKind> kindOfItemAtPath(const std::string& path) const override;
     std::optional<std::vector<std::string>> contentsOfDirectoryAtPath(const std::string& path) const override;
+    std::unique_ptr<Folder> openFolderAtPath(const std::string& path) const override;
     std::optional<FileAttributes> attributesOfItemAtPath(const std::string& path) const override;
     std::optional<std::uint32_t> itemFlagsAtPath(const std::string& path) const override;
     std::optional<std::string> displayNameAtPath(const std::string& path) const override;
@@ -55,6 +57,7 @@ class LinuxFileManager final : public FileManager {
     std::optional<struct ::statx> statusOfItem(const std::string& kernelPath, Links links) const;
     bool isInvisible(const std::string& kernelPath, const struct ::statx& status) const;
     std::optional<std::string> volumeNameAt(const std::string& mountPoint) const;
+    void logListingFailure(const std::string& path, int error) const;
     void logFailure(std::string_view operation, const std::string& path, int error) const;
 
     const std::optional<std::string> homeDirectory_;
@@ -63,6 +66,7 @@ class LinuxFileManager final : public FileManager {
     const PackageTest isPackageExtension_;
     const std::string volumesPrefix_;  // "/Volumes/"
     const HiddenNames hiddenNames_;
+    const LinuxFolder::Services folderServices_;
 };
 
 }  // namespace platform

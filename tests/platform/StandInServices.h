@@ -24,6 +24,7 @@ class StandInFileManager final : public FileManager {
     std::optional<std::vector<std::string>> contentsOfDirectoryAtPath(const std::string&) const override {
         return {};
     }
+    std::unique_ptr<Folder> openFolderAtPath(const std::string&) const override { return nullptr; }
     std::optional<FileAttributes> attributesOfItemAtPath(const std::string&) const override { return {}; }
     std::optional<std::uint32_t> itemFlagsAtPath(const std::string&) const override { return {}; }
     std::optional<std::string> displayNameAtPath(const std::string&) const override { return {}; }

@@ -12,6 +12,7 @@
 #include "platform/FileManager.h"
 #include "platform/Path.h"
 #include "platform/PropertyList.h"
+#include "tests/support/PathFolder.h"
 #include "tests/support/PluginTest.h"
 
 namespace testing_support {
@@ -50,6 +51,9 @@ class ScriptedFiles final : public platform::FileManager {
         if (names)
             std::sort(names->begin(), names->end());
         return names;
+    }
+    std::unique_ptr<platform::Folder> openFolderAtPath(const std::string& path) const override {
+        return PathFolder::open(*this, path);
     }
     std::optional<platform::FileAttributes> attributesOfItemAtPath(const std::string& path) const override {
         return real().attributesOfItemAtPath(path);

@@ -12,6 +12,7 @@
 #include "platform/FileManager.h"
 #include "platform/Services.h"
 #include "tests/support/HostEnvironment.h"
+#include "tests/support/PathFolder.h"
 
 namespace testing_support {
 
@@ -48,6 +49,9 @@ class ForwardingFiles final : public platform::FileManager {
         if (names)
             std::sort(names->begin(), names->end());
         return names;
+    }
+    std::unique_ptr<platform::Folder> openFolderAtPath(const std::string& path) const override {
+        return PathFolder::open(*this, path);
     }
     std::optional<platform::FileAttributes> attributesOfItemAtPath(const std::string& path) const override {
         const auto scripted = attributes.find(path);

@@ -1,0 +1,54 @@
+#include "platform/linux/FileStatus.h"
+
+#include <fcntl.h>
+
+#include <cerrno>
+
+#include "platform/FileManager.h"
+#include "platform/Path.h"
+
+namespace platform {
+
+namespace {
+
+double seconds(const statx_timestamp& time) {
+    return static_cast<double>(time.tv_sec) + time.tv_nsec * 1e-9;
+}
+
+}  // namespace
+
+std::optional<struct statx> statusOfFile(int folder, const char* path, int flags) {
+    struct statx status {};
+    if (statx(folder, path, flags | AT_NO_AUTOMOUNT, STATX_BASIC_STATS | STATX_BTIME, &status) != 0)
+        return std::nullopt;
+    return status;
+}
+
+bool meansMissing(int error) {
+    return error == ENOENT || error == ENOTDIR;
+}
+
+std::optional<double> modificationTime(const struct statx& status) {
+    return status.stx_mask & STATX_MTIME ? std::optional(seconds(status.stx_mtime)) : std::nullopt;
+}
+
+std::optional<double> creationTime(const struct statx& status) {
+    return status.stx_mask & STATX_BTIME ? std::optional(seconds(status.stx_btime))
+                                         : modificationTime(status);
+}
+
+std::uint32_t containerFlags(const struct statx& status, std::string_view name,
+                             const std::function<bool(std::string_view extension)>& isPackageExtension) {
+    if (!S_ISDIR(status.stx_mode))
+        return 0;
+    return isPackageExtension(path::extension(name)) ? itemIsContainer | itemIsPackage : itemIsContainer;
+}
+
+// File systems with Unix's flag for backups, all the usual ones, have no hidden flag; neither have links.
+// Knowing so without another call to the kernel is what keeps scans fast.
+bool mayHaveHiddenFlag(const struct statx& status) {
+    return !(status.stx_attributes_mask & STATX_ATTR_NODUMP) &&
+           (S_ISDIR(status.stx_mode) || S_ISREG(status.stx_mode));
+}
+
+}  // namespace platform
