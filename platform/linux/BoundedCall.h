@@ -1,8 +1,8 @@
 // Waits for an asynchronous operation of GIO, though not for ever.
 //
 //     BoundedCall call;
-//     g_bus_get(G_BUS_TYPE_SESSION, call.cancellable(), BoundedCall::finished, &call);
-//     connection = g_bus_get_finish(call.wait(5s), &error);
+//     g_app_info_launch_uris_async(app, uris, context, call.cancellable(), BoundedCall::finished, &call);
+//     g_app_info_launch_uris_finish(app, call.wait(5s), &error);
 //
 // Needs no main loop and runs nothing of anybody else's meanwhile. Belongs to the thread that made it; one at
 // a time for one operation.
