@@ -3,6 +3,7 @@
 #include <fmt/format.h>
 #include <sqlite3.h>
 
+#include "framework/metadata/AnswerColumns.h"
 #include "framework/metadata/ReaderMessage.h"
 
 namespace vexo {
@@ -10,27 +11,42 @@ namespace vexo {
 namespace {
 
 // Raised when the columns change or what answers mean does.
-constexpr int tableVersion = 2;
+constexpr int tableVersion = 3;
 constexpr int busyMilliseconds = 2000;
 // Uses are noted this coarsely, so that a library which is looked at daily is written to once a week.
 constexpr DayNumber daysOfOneNote = 7;
 
+// Where the answer begins, behind the key and the day, in the statements that write and read entries.
+constexpr int firstAnswerParameter = 6;
+constexpr int firstAnswerColumn = 4;
+
 // The index by day holds the keys as well, so pruning looks at nothing else to choose what goes.
-constexpr const char* creation =
-    "CREATE TABLE IF NOT EXISTS files ("
-    " device INTEGER NOT NULL, inode INTEGER NOT NULL, size INTEGER NOT NULL, modified INTEGER NOT NULL,"
-    " day INTEGER NOT NULL, answer TEXT NOT NULL, PRIMARY KEY (device, inode)) WITHOUT ROWID;"
-    "CREATE INDEX IF NOT EXISTS filesByDay ON files (day);"
-    "CREATE TABLE IF NOT EXISTS pruning (id INTEGER PRIMARY KEY, day INTEGER NOT NULL);"
-    "PRAGMA user_version = 2";  // tableVersion
+std::string creation() {
+    return fmt::format(
+        "CREATE TABLE IF NOT EXISTS files ("
+        " device INTEGER NOT NULL, inode INTEGER NOT NULL, size INTEGER NOT NULL, modified INTEGER NOT NULL,"
+        " day INTEGER NOT NULL, {}, PRIMARY KEY (device, inode)) WITHOUT ROWID;"
+        "CREATE INDEX IF NOT EXISTS filesByDay ON files (day);"
+        "CREATE TABLE IF NOT EXISTS pruning (id INTEGER PRIMARY KEY, day INTEGER NOT NULL);"
+        "PRAGMA user_version = {}",
+        answerColumnDefinitions, tableVersion);
+}
 constexpr const char* removal = "DROP TABLE IF EXISTS files; DROP TABLE IF EXISTS pruning";
 
-constexpr const char* selection =
-    "SELECT answer, day BETWEEN ?5 AND ?6 FROM files"
-    " WHERE device = ?1 AND inode = ?2 AND size = ?3 AND modified = ?4";
-constexpr const char* insertion =
-    "INSERT OR REPLACE INTO files (device, inode, size, modified, day, answer)"
-    " VALUES (?1, ?2, ?3, ?4, ?5, ?6)";
+std::string selection() {
+    return fmt::format(
+        "SELECT inode, size, modified, day BETWEEN ?4 AND ?5, {} FROM files"
+        " WHERE device = ?1 AND inode BETWEEN ?2 AND ?3 ORDER BY inode",
+        answerColumns);
+}
+
+std::string insertion() {
+    std::string parameters = "?1";
+    for (int i = 2; i <= firstAnswerParameter + answerColumnCount - 1; ++i)
+        parameters += fmt::format(", ?{}", i);
+    return fmt::format("INSERT OR REPLACE INTO files (device, inode, size, modified, day, {}) VALUES ({})",
+                       answerColumns, parameters);
+}
 constexpr const char* use =
     "UPDATE files SET day = ?5 WHERE device = ?1 AND inode = ?2 AND size = ?3 AND modified = ?4";
 
@@ -77,9 +93,9 @@ void bindKey(sqlite3_stmt* statement, const FileKey& key) {
     sqlite3_bind_int64(statement, 4, key.modificationTime);
 }
 
-std::string textOf(sqlite3_stmt* statement) {
-    const auto* bytes = static_cast<const char*>(sqlite3_column_blob(statement, 0));
-    return std::string(bytes ? bytes : "", static_cast<std::size_t>(sqlite3_column_bytes(statement, 0)));
+FileKey keyInRow(sqlite3_stmt* row, std::uint64_t device) {
+    return {device, static_cast<std::uint64_t>(sqlite3_column_int64(row, 0)),
+            static_cast<std::uint64_t>(sqlite3_column_int64(row, 1)), sqlite3_column_int64(row, 2)};
 }
 
 // Runs a statement that answers nothing, and makes it ready for the next time.
@@ -139,7 +155,7 @@ int makeTable(sqlite3* database) {
             return result;
         if (version != 0)
             result = execute(database, removal);
-        return result == SQLITE_OK ? execute(database, creation) : result;
+        return result == SQLITE_OK ? execute(database, creation()) : result;
     });
 }
 
@@ -170,9 +186,9 @@ int IndexTable::prepare(const std::string& path) {
     if (result == SQLITE_OK)
         result = configure();
     if (result == SQLITE_OK)
-        result = prepareStatement(selection, find_);
+        result = prepareStatement(selection(), find_);
     if (result == SQLITE_OK)
-        result = prepareStatement(insertion, store_);
+        result = prepareStatement(insertion(), store_);
     if (result == SQLITE_OK)
         result = prepareStatement(use, use_);
     return result;
@@ -196,29 +212,35 @@ int IndexTable::configure() {
     return version == tableVersion ? SQLITE_OK : makeTable(database);
 }
 
-int IndexTable::prepareStatement(const char* sql, Statement& statement) {
+int IndexTable::prepareStatement(const std::string& sql, Statement& statement) {
     sqlite3_stmt* prepared = nullptr;
     const int result =
-        sqlite3_prepare_v3(database_.get(), sql, -1, SQLITE_PREPARE_PERSISTENT, &prepared, nullptr);
+        sqlite3_prepare_v3(database_.get(), sql.c_str(), -1, SQLITE_PREPARE_PERSISTENT, &prepared, nullptr);
     statement.reset(prepared);
     return result;
 }
 
-IndexTable::Outcome IndexTable::find(const FileKey& key, DayNumber today, Entry& entry) {
-    bindKey(find_.get(), key);
-    sqlite3_bind_int64(find_.get(), 5, today - daysOfOneNote + 1);
-    sqlite3_bind_int64(find_.get(), 6, today);
-    const int result = sqlite3_step(find_.get());
-    if (result == SQLITE_ROW)
-        entry = {textOf(find_.get()), sqlite3_column_int(find_.get(), 1) != 0};
-    sqlite3_reset(find_.get());
-    return result == SQLITE_DONE ? Outcome::missing : outcomeOf(result);
+IndexTable::Outcome IndexTable::find(std::uint64_t device, std::uint64_t firstInode, std::uint64_t lastInode,
+                                     DayNumber today, Entries& entries) {
+    sqlite3_stmt* const row = find_.get();
+    sqlite3_bind_int64(row, 1, bits(device));
+    sqlite3_bind_int64(row, 2, bits(firstInode));
+    sqlite3_bind_int64(row, 3, bits(lastInode));
+    sqlite3_bind_int64(row, 4, today - daysOfOneNote + 1);
+    sqlite3_bind_int64(row, 5, today);
+    int result = sqlite3_step(row);
+    for (; result == SQLITE_ROW; result = sqlite3_step(row)) {
+        if (auto answer = answerInRow(row, firstAnswerColumn))
+            entries.push_back({keyInRow(row, device), *std::move(answer), sqlite3_column_int(row, 3) != 0});
+    }
+    sqlite3_reset(row);
+    return outcomeOf(result);
 }
 
-IndexTable::Outcome IndexTable::store(const FileKey& key, const std::string& answer, DayNumber today) {
+IndexTable::Outcome IndexTable::store(const FileKey& key, const MediaReaderAnswer& answer, DayNumber today) {
     bindKey(store_.get(), key);
     sqlite3_bind_int64(store_.get(), 5, today);
-    sqlite3_bind_text(store_.get(), 6, answer.data(), static_cast<int>(answer.size()), SQLITE_STATIC);
+    bindAnswer(store_.get(), firstAnswerParameter, answer);
     const int result = run(store_.get());
     sqlite3_clear_bindings(store_.get());
     return outcomeOf(result);

@@ -9,6 +9,8 @@
 #include <string>
 #include <vector>
 
+#include "framework/metadata/MediaProperties.h"
+
 struct sqlite3;
 struct sqlite3_stmt;
 
@@ -41,15 +43,16 @@ class IndexTable {
   public:
     enum class Outcome {
         done,
-        missing,      // there is no such entry
         damaged,      // the file is no index, or one of a newer version
         unavailable,  // locked for long, unreadable, disk full
     };
 
     struct Entry {
-        std::string answer;
+        FileKey key;
+        MediaReaderAnswer answer;
         bool isNewlyUsed = false;  // no need to note that it is used today
     };
+    using Entries = std::vector<Entry>;
 
     // Opens the table, making it where there is none; ":memory:" makes one that lives as long as the object.
     // One of an older version is emptied. `table` is nil unless the outcome is `done`.
@@ -58,10 +61,12 @@ class IndexTable {
     IndexTable(const IndexTable&) = delete;
     IndexTable& operator=(const IndexTable&) = delete;
 
-    // `entry` is set when the outcome is `done`.
-    [[nodiscard]] Outcome find(const FileKey& key, DayNumber today, Entry& entry);
+    // Appends the entries of a device whose inodes lie from `firstInode` to `lastInode`, by inode. Those that
+    // make no sense are left out.
+    [[nodiscard]] Outcome find(std::uint64_t device, std::uint64_t firstInode, std::uint64_t lastInode,
+                               DayNumber today, Entries& entries);
     // An answer for an earlier state of the file is replaced.
-    [[nodiscard]] Outcome store(const FileKey& key, const std::string& answer, DayNumber today);
+    [[nodiscard]] Outcome store(const FileKey& key, const MediaReaderAnswer& answer, DayNumber today);
 
     // These two only tidy up: they do not wait for another process, but are unavailable while it writes.
 
@@ -85,7 +90,7 @@ class IndexTable {
 
     int prepare(const std::string& path);
     int configure();
-    int prepareStatement(const char* sql, Statement& statement);
+    int prepareStatement(const std::string& sql, Statement& statement);
 
     std::unique_ptr<sqlite3, Closer> database_;
     Statement find_;

@@ -1,4 +1,5 @@
 #include "framework/metadata/MediaReader.h"
+#include "framework/metadata/MediaLimits.h"
 
 #include <sys/stat.h>
 

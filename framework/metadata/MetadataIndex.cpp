@@ -9,7 +9,6 @@
 #include <filesystem>
 
 #include "framework/UserFolders.h"
-#include "framework/metadata/ReaderMessage.h"
 #include "platform/Path.h"
 #include "platform/linux/FileDescriptor.h"
 
@@ -154,14 +153,26 @@ std::optional<MediaReaderAnswer> MetadataIndex::find(const FileKey& key) {
     platform::Locked lock(mutex_);
     if (!table_)
         return std::nullopt;
-    IndexTable::Entry entry;
-    const Outcome outcome = table_->find(key, today_(), entry);
-    recoverFrom(outcome);
-    if (outcome != Outcome::done)
+    const IndexTable::Entry* entry = readAhead_.find(key);
+    if (!entry) {
+        readAround(key);
+        entry = readAhead_.find(key);
+    }
+    if (!entry)
         return std::nullopt;
-    if (!entry.isNewlyUsed)
+    if (!entry->isNewlyUsed)
         noteUse(key);
-    return decodeAnswer(entry.answer);
+    return entry->answer;
+}
+
+void MetadataIndex::readAround(const FileKey& key) {
+    IndexTable::Entries entries;
+    const auto [first, last] = ReadAhead::inodesAround(key);
+    const Outcome outcome = table_->find(key.device, first, last, today_(), entries);
+    if (outcome == Outcome::done)
+        readAhead_.put(key, std::move(entries));
+    else
+        recoverFrom(outcome);
 }
 
 void MetadataIndex::store(const FileKey& key, const MediaReaderAnswer& answer) {
@@ -171,8 +182,9 @@ void MetadataIndex::store(const FileKey& key, const MediaReaderAnswer& answer) {
     platform::Locked lock(mutex_);
     if (table_)
         reopenIfDisplaced();
+    readAhead_.drop(key);
     if (table_)
-        recoverFrom(table_->store(key, encodeAnswer(answer), today_()));
+        recoverFrom(table_->store(key, answer, today_()));
 }
 
 }  // namespace vexo

@@ -16,6 +16,7 @@
 
 #include "framework/metadata/IndexTable.h"
 #include "framework/metadata/MediaProperties.h"
+#include "framework/metadata/ReadAhead.h"
 #include "platform/ThreadSafety.h"
 
 namespace vexo {
@@ -52,6 +53,8 @@ class MetadataIndex {
     void recoverFrom(IndexTable::Outcome outcome) VX_REQUIRES(mutex_);
     // Follows the path when somebody deleted or replaced the file.
     void reopenIfDisplaced() VX_REQUIRES(mutex_);
+    // Reads the entries of the files that were made shortly before and after this one.
+    void readAround(const FileKey& key) VX_REQUIRES(mutex_);
     void noteUse(const FileKey& key) VX_REQUIRES(mutex_);
     void writeUses() VX_REQUIRES(mutex_);
 
@@ -60,6 +63,7 @@ class MetadataIndex {
     mutable platform::Mutex mutex_;
     std::string path_ VX_GUARDED_BY(mutex_);
     std::unique_ptr<IndexTable> table_ VX_GUARDED_BY(mutex_);  // nil only when memory is short
+    ReadAhead readAhead_ VX_GUARDED_BY(mutex_);
     // Found, but not yet noted as used. Losing them makes entries look older, no more.
     std::vector<FileKey> used_ VX_GUARDED_BY(mutex_);
 };

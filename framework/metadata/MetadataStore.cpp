@@ -23,17 +23,6 @@ namespace {
 using platform::Dictionary;
 using platform::Value;
 
-constexpr std::array mediaKeys{
-    kMDItemMediaTypes,       kMDItemPixelWidth,          kMDItemPixelHeight,    kMDItemDurationSeconds,
-    kMDItemCodecs,           kMDItemContentCreationDate, kMDItemVideoFrameRate, kMDItemAudioChannelCount,
-    kMDItemAudioSampleRate,  kMDItemTotalBitRate,        kMDItemTitle,          kMDItemAcquisitionMake,
-    kMDItemAcquisitionModel,
-};
-
-bool isMediaKey(std::string_view key) {
-    return std::find(mediaKeys.begin(), mediaKeys.end(), key) != mediaKeys.end();
-}
-
 constexpr std::array typeKeys{kMDItemContentType, kMDItemContentTypeTree, kMDItemKind};
 
 bool isTypeKey(std::string_view key) {
@@ -126,38 +115,59 @@ Dictionary statusValues(const FoundFile& file) {
 }
 
 template <typename Content>
-void put(Dictionary& values, std::string_view key, const std::optional<Content>& content) {
-    if (content)
-        values.emplace(key, *content);
+std::optional<Value> valueOf(const std::optional<Content>& content) {
+    return content ? std::optional<Value>(*content) : std::nullopt;
 }
 
-void put(Dictionary& values, std::string_view key, const std::vector<std::string>& texts) {
-    if (!texts.empty())
-        values.emplace(key, arrayOf(texts));
+std::optional<Value> valueOf(const std::vector<std::string>& texts) {
+    return texts.empty() ? std::nullopt : std::optional(arrayOf(texts));
 }
 
-std::optional<platform::DateRef> dateOf(const std::optional<double>& secondsSince1970) {
-    if (!secondsSince1970)
-        return std::nullopt;
-    return platform::Date::since1970(*secondsSince1970);
+template <auto Member>
+std::optional<Value> valueIn(const MediaProperties& properties) {
+    return valueOf(properties.*Member);
+}
+
+std::optional<Value> contentCreationDateIn(const MediaProperties& properties) {
+    const std::optional<double>& seconds = properties.contentCreationDate;
+    return seconds ? std::optional<Value>(platform::Date::since1970(*seconds)) : std::nullopt;
+}
+
+// A property that a file's content tells.
+struct MediaKey {
+    std::string_view key;
+    std::optional<Value> (*valueIn)(const MediaProperties& properties);
+};
+
+constexpr std::array mediaKeys{
+    MediaKey{kMDItemMediaTypes, valueIn<&MediaProperties::mediaTypes>},
+    MediaKey{kMDItemCodecs, valueIn<&MediaProperties::codecs>},
+    MediaKey{kMDItemPixelWidth, valueIn<&MediaProperties::pixelWidth>},
+    MediaKey{kMDItemPixelHeight, valueIn<&MediaProperties::pixelHeight>},
+    MediaKey{kMDItemDurationSeconds, valueIn<&MediaProperties::durationSeconds>},
+    MediaKey{kMDItemContentCreationDate, contentCreationDateIn},
+    MediaKey{kMDItemVideoFrameRate, valueIn<&MediaProperties::frameRate>},
+    MediaKey{kMDItemAudioChannelCount, valueIn<&MediaProperties::audioChannelCount>},
+    MediaKey{kMDItemAudioSampleRate, valueIn<&MediaProperties::audioSampleRate>},
+    MediaKey{kMDItemTotalBitRate, valueIn<&MediaProperties::totalBitRate>},
+    MediaKey{kMDItemTitle, valueIn<&MediaProperties::title>},
+    MediaKey{kMDItemAcquisitionMake, valueIn<&MediaProperties::acquisitionMake>},
+    MediaKey{kMDItemAcquisitionModel, valueIn<&MediaProperties::acquisitionModel>},
+};
+
+// nil for a key of another kind.
+const MediaKey* mediaKey(std::string_view key) {
+    const auto found = std::find_if(mediaKeys.begin(), mediaKeys.end(),
+                                    [key](const MediaKey& each) { return each.key == key; });
+    return found == mediaKeys.end() ? nullptr : &*found;
 }
 
 // From the file's content.
 Dictionary mediaValues(const MediaProperties& properties) {
     Dictionary values;
-    put(values, kMDItemMediaTypes, properties.mediaTypes);
-    put(values, kMDItemCodecs, properties.codecs);
-    put(values, kMDItemPixelWidth, properties.pixelWidth);
-    put(values, kMDItemPixelHeight, properties.pixelHeight);
-    put(values, kMDItemDurationSeconds, properties.durationSeconds);
-    put(values, kMDItemContentCreationDate, dateOf(properties.contentCreationDate));
-    put(values, kMDItemVideoFrameRate, properties.frameRate);
-    put(values, kMDItemAudioChannelCount, properties.audioChannelCount);
-    put(values, kMDItemAudioSampleRate, properties.audioSampleRate);
-    put(values, kMDItemTotalBitRate, properties.totalBitRate);
-    put(values, kMDItemTitle, properties.title);
-    put(values, kMDItemAcquisitionMake, properties.acquisitionMake);
-    put(values, kMDItemAcquisitionModel, properties.acquisitionModel);
+    for (const MediaKey& each : mediaKeys)
+        if (auto value = each.valueIn(properties))
+            values.emplace(each.key, *std::move(value));
     return values;
 }
 
@@ -190,9 +200,11 @@ class FileMetadata final : public VXMetadataProperties {
     }
 
     std::optional<Value> valueForKey(std::string_view key) const override {
-        const Dictionary values = isMediaKey(key) ? mediaValues(media()) : fileValues(key);
-        const auto found = values.find(key);
-        return found == values.end() ? std::nullopt : std::optional(found->second);
+        if (const MediaKey* found = mediaKey(key))
+            return found->valueIn(media());
+        const Dictionary values = fileValues(key);
+        const Value* value = platform::find(values, key);
+        return value ? std::optional(*value) : std::nullopt;
     }
 
     Dictionary allValues() const override {

@@ -4,32 +4,13 @@
 #include <cmath>
 #include <nlohmann/json.hpp>
 
+#include "framework/metadata/MediaLimits.h"
+
 namespace vexo {
 
 namespace {
 
 using Json = nlohmann::json;
-
-struct Range {
-    double least;
-    double greatest;
-
-    // False for what is no number.
-    bool contains(double number) const { return number >= least && number <= greatest; }
-};
-
-// So chosen that whatever is decoded fits into a message again, and any whole number into a double.
-constexpr std::size_t longestList = 16;
-constexpr std::size_t longestName = 48;
-constexpr std::size_t longestText = 900;
-constexpr Range pixelCounts{1, 1e6};
-constexpr Range durations{0, 1e9};       // seconds, some thirty years
-constexpr Range dates{-2.5e11, 2.5e11};  // seconds to the year 9999, either way
-constexpr Range frameRates{1e-6, 1e6};   // a second
-constexpr Range channelCounts{1, 1024};
-constexpr Range sampleRates{1, 1e8};              // hertz
-constexpr Range bitRates{1, 1e15};                // bits a second
-constexpr Range frameSides{1, largestFrameSide};  // pixels
 
 // Raised and caught in this file.
 struct NotUnderstood {};
@@ -165,8 +146,10 @@ std::vector<std::string> names(const Json& object, const char* key) {
         return {};
     require(found->is_array() && found->size() <= longestList);
     std::vector<std::string> list;
-    for (const Json& entry : *found)
+    for (const Json& entry : *found) {
         list.push_back(text(entry, longestName));
+        require(!hasControlCharacters(list.back()));
+    }
     return list;
 }
 
@@ -229,7 +212,7 @@ Json beginningOf(const std::vector<std::string>& names) {
     Json list = Json::array();
     for (const std::string& name : names)
         if (list.size() < longestList)
-            list.push_back(beginningOf(name, longestName));
+            list.push_back(withoutControlCharacters(beginningOf(name, longestName)));
     return list;
 }
 
@@ -312,14 +295,6 @@ bool isReplyTo(const ReaderRequest& request, const ReaderReply& reply) {
     if (!request.longestSide || !frame)
         return !request.longestSide && !frame;
     return std::max(frame->width, frame->height) <= *request.longestSide;
-}
-
-std::string encodeAnswer(const MediaReaderAnswer& answer) {
-    return printed(objectOf(answer));
-}
-
-std::optional<MediaReaderAnswer> decodeAnswer(std::string_view text) {
-    return decoded(text, [](const Json& object) { return answerIn(object); });
 }
 
 }  // namespace vexo

@@ -1,4 +1,4 @@
-// The messages between the host and the program that reads movies, and the form in which answers are kept.
+// The messages between the host and the program that reads movies.
 //
 // Each message is one packet of JSON of bounded size:
 //
@@ -34,7 +34,6 @@ inline constexpr std::size_t maximumMessageBytes = 16384;
 inline constexpr int readerProtocolVersion = 2;
 // The descriptor on which the reader finds its end of the channel, a SOCK_SEQPACKET socket.
 inline constexpr int readerChannelDescriptor = 3;
-inline constexpr int largestFrameSide = 1024;
 
 struct ReaderRequest {
     std::uint64_t number = 0;  // the reply carries the same
@@ -78,9 +77,5 @@ std::string encodeReply(const ReaderReply& reply);
 std::optional<ReaderReply> decodeReply(std::string_view message);
 // Whether the reply is one to this request: of its number, of the kind it asks for and within its bounds.
 bool isReplyTo(const ReaderRequest& request, const ReaderReply& reply);
-
-// An answer alone. A failure is decoded as one of the file's.
-std::string encodeAnswer(const MediaReaderAnswer& answer);
-std::optional<MediaReaderAnswer> decodeAnswer(std::string_view text);
 
 }  // namespace vexo

@@ -4,6 +4,7 @@
 #include <atomic>
 #include <thread>
 
+#include "framework/metadata/MediaLimits.h"
 #include "tests/framework/MediaReaderTest.h"
 #include "tests/framework/RawMovie.h"
 #include "tests/support/SampleMovie.h"

@@ -53,8 +53,9 @@ TEST_F(RealMediaReader, TellsWhatIsInAMovie) {
                                   {"contentCreationDate", 1230767999.0},
                                   {"frameRate", 5.0},
                                   {"audioChannelCount", 1},
-                                  {"audioSampleRate", 44100}};
-    EXPECT_EQ(nlohmann::json::parse(encodeAnswer(properties)), expected);
+                                  {"audioSampleRate", 44100},
+                                  {"request", 1}};
+    EXPECT_EQ(nlohmann::json::parse(encodeReply({1, properties})), expected);
 }
 
 TEST_F(RealMediaReader, TellsTheTitleAndTheCamera) {

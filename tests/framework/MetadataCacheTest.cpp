@@ -143,9 +143,8 @@ TEST_F(MetadataCacheOfFiles, AFileWhoseAnswerIsDamagedIsReadAgainOnce) {
     cache_.answerForFile(path);
     sqlite3* database = nullptr;
     ASSERT_EQ(sqlite3_open(cache_.indexPath().c_str(), &database), SQLITE_OK);
-    EXPECT_EQ(
-        sqlite3_exec(database, "UPDATE files SET answer = substr(answer, 9)", nullptr, nullptr, nullptr),
-        SQLITE_OK);
+    EXPECT_EQ(sqlite3_exec(database, "UPDATE files SET pixelWidth = -1", nullptr, nullptr, nullptr),
+              SQLITE_OK);
     sqlite3_close(database);
     EXPECT_EQ(cache_.answerForFile(path), movie);
     EXPECT_EQ(cache_.answerForFile(path), movie);

@@ -287,10 +287,50 @@ TEST_F(MetadataIndexFile, DamageThatShowsLaterBeginsTheIndexAnew) {
 
 TEST_F(MetadataIndexFile, AnAnswerThatMakesNoSenseCountsAsNone) {
     MetadataIndex(path_).store(key, movie);
-    runSql("UPDATE files SET answer = '{\"mediaTypes\": 7}'");
-    EXPECT_EQ(MetadataIndex(path_).find(key), std::nullopt);
-    runSql("UPDATE files SET answer = zeroblob(50000000)");
-    EXPECT_EQ(MetadataIndex(path_).find(key), std::nullopt);
+    for (const char* damage : {"mediaTypes = NULL", "mediaTypes = ''", "pixelWidth = -1",
+                               "pixelHeight = 'many'", "totalBitRate = 9e99", "durationSeconds = 'long'",
+                               "title = zeroblob(50000)", "failure = zeroblob(901)"}) {
+        MetadataIndex(path_).store(key, movie);
+        runSql(std::string("UPDATE files SET ") + damage);
+        EXPECT_EQ(MetadataIndex(path_).find(key), std::nullopt) << damage;
+    }
+}
+
+TEST_F(MetadataIndexFile, EveryPropertyReadsAsItWasWritten) {
+    const MediaProperties all{{"Video", "Sound"},
+                              1920,
+                              1080,
+                              12.5,
+                              {"h264", "aac"},
+                              -1230767999.5,
+                              23.976,
+                              2,
+                              48000,
+                              18'000'000,
+                              "R\u00e4der \"am\" Flu\u00df",
+                              "Camera",
+                              "CW 100"};
+    MetadataIndex(path_).store(key, all);
+    EXPECT_EQ(MetadataIndex(path_).find(key), MediaReaderAnswer(all));
+}
+
+TEST_F(MetadataIndexFile, FilesThatWereMadeTogetherAreReadTogether) {
+    fill(200);
+    MetadataIndex index(path_);
+    for (std::uint64_t i = 0; i < 200; ++i)
+        EXPECT_EQ(index.find({1, i, 3, 4}), movie) << i;
+    EXPECT_EQ(index.find({2, 7, 3, 4}), std::nullopt) << "on another device";
+    EXPECT_EQ(index.find({1, 7, 3, 5}), std::nullopt) << "changed since";
+}
+
+TEST_F(MetadataIndexFile, WhatIsStoredBesideWhatWasReadIsFound) {
+    fill(3);
+    MetadataIndex index(path_);
+    EXPECT_EQ(index.find({1, 0, 3, 4}), movie);
+    MetadataIndex(path_).store({1, 5, 3, 4}, movie);
+    EXPECT_EQ(index.find({1, 5, 3, 4}), movie) << "by another process";
+    index.store({1, 0, 3, 4}, failure);
+    EXPECT_EQ(index.find({1, 0, 3, 4}), failure) << "in place of what was read";
 }
 
 TEST_F(MetadataIndexFile, DamageAmongTheDaysIsFoundByPruning) {
@@ -417,7 +457,7 @@ TEST_F(MetadataIndexFile, MuchThatCanGoGoesByAndBy) {
     { const MetadataIndex index(path_, on(0)); }
     ASSERT_EQ(IndexTable::open(path_, table), IndexTable::Outcome::done);
     for (std::uint64_t i = 1; i <= 5; ++i)
-        ASSERT_EQ(table->store(keyOf(i), "{}", static_cast<DayNumber>(10 - i)), IndexTable::Outcome::done);
+        ASSERT_EQ(table->store(keyOf(i), movie, static_cast<DayNumber>(10 - i)), IndexTable::Outcome::done);
     const IndexLimits limits{.unusedDays = 10, .droppedAtOnce = 2};
     for (const char* left : {"1 2 3", "1", "", ""}) {
         ASSERT_EQ(table->prune(100, limits), IndexTable::Outcome::done);
@@ -430,7 +470,7 @@ TEST_F(MetadataIndexFile, BeyondTheNumberOfEntriesTheLongestUnusedGo) {
     { const MetadataIndex index(path_, on(0)); }
     ASSERT_EQ(IndexTable::open(path_, table), IndexTable::Outcome::done);
     for (std::uint64_t i = 1; i <= 6; ++i)
-        ASSERT_EQ(table->store(keyOf(i), "{}", i % 2 ? 50 : 60), IndexTable::Outcome::done);
+        ASSERT_EQ(table->store(keyOf(i), movie, i % 2 ? 50 : 60), IndexTable::Outcome::done);
     ASSERT_EQ(table->prune(60, {.entries = 3}), IndexTable::Outcome::done);
     EXPECT_EQ(entries(), "2 4 6");
 }
@@ -440,7 +480,7 @@ TEST_F(MetadataIndexFile, HoldsNoMoreThanItsLimit) {
     const std::string limit = std::to_string(IndexLimits().entries);
     runSql("WITH RECURSIVE numbers (i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM numbers WHERE i < 10 + " +
            limit +
-           ") INSERT INTO files (device, inode, size, modified, day, answer) SELECT 1, i, 3, 4, 0, '' FROM "
+           ") INSERT INTO files (device, inode, size, modified, day) SELECT 1, i, 3, 4, 0 FROM "
            "numbers");
     { const MetadataIndex index(path_, on(1)); }
     EXPECT_EQ(runSql("SELECT COUNT(*) FROM files"), limit);
