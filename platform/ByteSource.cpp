@@ -23,8 +23,12 @@ bool MemoryByteSource::read(std::uint64_t offset, std::span<std::byte> buffer) {
     return BorrowedByteSource(bytes_).read(offset, buffer);
 }
 
-PageCache::PageCache(ByteSource& source)
-    : source_(source), size_(source.size()), pages_(pageCount), latest_(&pages_.front()) {}
+// Pages come as they are needed: most documents are done with after one or two. Their room is there from the
+// beginning, so they stay where they are.
+PageCache::PageCache(ByteSource& source) : source_(source), size_(source.size()) {
+    pages_.reserve(pageCount);
+    latest_ = &pages_.emplace_back();
+}
 
 bool PageCache::read(std::uint64_t offset, std::span<std::byte> buffer) {
     if (!isInside(offset, buffer.size(), size_))
@@ -48,7 +52,12 @@ bool PageCache::fetch(std::uint64_t number) {
         return true;
     const auto known = std::ranges::find(pages_, number, &Page::number);
     const bool isKnown = known != pages_.end();
-    latest_ = isKnown ? &*known : &*std::ranges::min_element(pages_, {}, &Page::lastUse);
+    if (isKnown)
+        latest_ = &*known;
+    else if (pages_.size() < pageCount)
+        latest_ = &pages_.emplace_back();
+    else
+        latest_ = &*std::ranges::min_element(pages_, {}, &Page::lastUse);
     latest_->lastUse = ++uses_;
     return isKnown || load(*latest_, number);
 }

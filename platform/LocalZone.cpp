@@ -1,5 +1,7 @@
 #include "platform/LocalZone.h"
 
+#include <atomic>
+#include <cstdlib>
 #include <ctime>
 
 #include "platform/Date.h"
@@ -22,9 +24,16 @@ ZonedTime zoneAt(std::int64_t seconds) {
     return {seconds, static_cast<int>(fields.tm_gmtoff), fields.tm_zone ? fields.tm_zone : ""};
 }
 
-// localtime_r need not notice that the zone has changed.
+// localtime_r need not notice that the zone has changed. Without TZ each look is a call to the system, so
+// many dates in one second look once.
 void lookUpZone() {
-    tzset();
+    static std::atomic<std::time_t> lastLookWithoutTZ = -1;
+    timespec now{-1, 0};
+    if (!std::getenv("TZ"))
+        clock_gettime(CLOCK_MONOTONIC_COARSE, &now);
+    if (now.tv_sec < 0 || lastLookWithoutTZ != now.tv_sec)
+        tzset();
+    lastLookWithoutTZ = now.tv_sec;
 }
 
 bool clockShows(const ZonedTime& time, std::int64_t civilSeconds) {

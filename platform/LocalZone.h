@@ -1,4 +1,5 @@
 // The local time zone: what TZ, else the machine's own setting, says at the moment of the call.
+// Without TZ, a new setting of the machine's counts within a second.
 //
 // Callable from any thread, as long as no thread changes the environment meanwhile.
 #pragma once
