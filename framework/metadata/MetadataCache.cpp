@@ -56,13 +56,18 @@ FileLook lookAt(int descriptor) {
 }  // namespace
 
 MetadataCache::MetadataCache(const std::optional<std::string>& indexPath, std::shared_ptr<MediaReader> reader)
-    : reader_(std::move(reader)), index_(indexPath) {}
+    : reader_(std::move(reader)), indexPath_(indexPath) {}
+
+MetadataIndex& MetadataCache::index() {
+    std::call_once(indexOpened_, [this] { index_.emplace(indexPath_); });
+    return *index_;
+}
 
 MediaReaderAnswer MetadataCache::answerForFile(const std::string& path) {
     const FileLook look = lookAt(path);
     if (const auto* failure = std::get_if<MediaFailure>(&look))
         return *failure;
-    if (const auto known = index_.find(std::get<FileKey>(look)))
+    if (const auto known = index().find(std::get<FileKey>(look)))
         return *known;
 
     // What lies at the path now may be another thing than what was just looked at: the flags keep a FIFO or a
@@ -80,11 +85,11 @@ MediaReaderAnswer MetadataCache::read(int descriptor) {
     if (const auto* failure = std::get_if<MediaFailure>(&before))
         return *failure;
     const FileKey key = std::get<FileKey>(before);
-    if (const auto known = index_.find(key))
+    if (const auto known = index().find(key))
         return *known;
     const MediaReaderAnswer answer = reader_->read(descriptor);
     if (lookAt(descriptor) == before)
-        index_.store(key, answer);
+        index().store(key, answer);
     return answer;
 }
 

@@ -3,6 +3,7 @@
 #pragma once
 
 #include <memory>
+#include <mutex>
 #include <optional>
 #include <string>
 
@@ -23,13 +24,17 @@ class MetadataCache {
     // is given and not kept.
     MediaReaderAnswer answerForFile(const std::string& path) VX_EXCLUDES(reading_);
 
-    std::string indexPath() const { return index_.path(); }
+    std::string indexPath() { return index().path(); }
 
   private:
     MediaReaderAnswer read(int descriptor) VX_EXCLUDES(reading_);
+    // Opens it at the first call: many programs that have a store never ask it for what a movie says.
+    MetadataIndex& index();
 
     const std::shared_ptr<MediaReader> reader_;
-    MetadataIndex index_;
+    const std::optional<std::string> indexPath_;
+    std::once_flag indexOpened_;
+    std::optional<MetadataIndex> index_;  // use `index`
     // Held while a file is read, on purpose: whoever asks for the same file meanwhile finds it in the index.
     platform::Mutex reading_;
 };
