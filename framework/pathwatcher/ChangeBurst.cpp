@@ -4,11 +4,10 @@
 
 namespace vexo {
 
-void ChangeBurst::add(const std::string& watchedPath, const std::string& changedPath) {
+void ChangeBurst::add(const std::string& watchedPath, std::string changedPath) {
     if (!latest_ || latest_->first != watchedPath)
         latest_ = &*changes_.try_emplace(watchedPath).first;
-    if (!latest_->second.contains(changedPath))
-        latest_->second.insert(changedPath);
+    latest_->second.insert(std::move(changedPath));
 }
 
 void ChangeBurst::timeIs(Time now) {

@@ -22,7 +22,7 @@ class ChangeBurst {
 
     static constexpr std::chrono::milliseconds length{50};
 
-    void add(const std::string& watchedPath, const std::string& changedPath);
+    void add(const std::string& watchedPath, std::string changedPath);
     // To be told after changes were added: those that had no time yet happened now.
     void timeIs(Time now);
 

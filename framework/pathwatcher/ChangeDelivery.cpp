@@ -1,5 +1,10 @@
 #include "framework/pathwatcher/ChangeDelivery.h"
 
+#include <algorithm>
+#include <string>
+#include <utility>
+#include <vector>
+
 #include "platform/Dispatcher.h"
 #include "platform/Services.h"
 
@@ -10,6 +15,15 @@ using platform::Locked;
 namespace {
 
 constexpr double normalPriority = 0.5;
+
+std::vector<std::string> sorted(ChangeBurst::Paths paths) {
+    std::vector<std::string> list;
+    list.reserve(paths.size());
+    while (!paths.empty())
+        list.push_back(std::move(paths.extract(paths.begin()).value()));
+    std::sort(list.begin(), list.end());
+    return list;
+}
 
 }  // namespace
 
@@ -36,19 +50,17 @@ void ChangeDelivery::close() {
 }
 
 void ChangeDelivery::deliver() {
-    while (const auto report = takeNext())
-        report->first.hear({report->second.begin(), report->second.end()});
+    while (auto report = takeNext())
+        report.key().hear(sorted(std::move(report.mapped())));
 }
 
-std::optional<ChangeDelivery::Reports::value_type> ChangeDelivery::takeNext() {
+ChangeDelivery::Reports::node_type ChangeDelivery::takeNext() {
     Locked lock(mutex_);
     if (waiting_.empty()) {
         isDelivering_ = false;
-        return std::nullopt;
+        return {};
     }
-    Reports::value_type next = *waiting_.begin();
-    waiting_.erase(waiting_.begin());
-    return next;
+    return waiting_.extract(waiting_.begin());
 }
 
 }  // namespace vexo

@@ -5,10 +5,6 @@
 
 #include <map>
 #include <memory>
-#include <optional>
-#include <set>
-#include <string>
-#include <utility>
 
 #include "framework/pathwatcher/ChangeBurst.h"
 #include "framework/pathwatcher/Subscriber.h"
@@ -26,11 +22,11 @@ class ChangeDelivery : public std::enable_shared_from_this<ChangeDelivery> {
     void close() VX_EXCLUDES(mutex_);
 
   private:
-    using Reports = std::map<Subscriber, std::set<std::string>>;
+    using Reports = std::map<Subscriber, ChangeBurst::Paths>;
 
     void deliver() VX_EXCLUDES(mutex_);
-    // nil when nothing waits; the thread is then to end.
-    std::optional<Reports::value_type> takeNext() VX_EXCLUDES(mutex_);
+    // Empty when nothing waits; the thread is then to end.
+    Reports::node_type takeNext() VX_EXCLUDES(mutex_);
 
     platform::Mutex mutex_;
     Reports waiting_ VX_GUARDED_BY(mutex_);

@@ -2,6 +2,7 @@
 
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <utility>
@@ -15,15 +16,6 @@ constexpr std::size_t batchSize = 256 * 1024;
 // Each removal puts an event in the queue. Left there, those of one big folder would fill it.
 constexpr int mostRemovalsInQueue = 4096;
 constexpr int mostBatchesDrained = 16;
-
-// Appends what one read gives; false when nothing waits.
-bool readMore(int queue, std::vector<char>& bytes) {
-    const std::size_t size = bytes.size();
-    bytes.resize(size + batchSize);
-    const ssize_t count = read(queue, bytes.data() + size, batchSize);
-    bytes.resize(size + static_cast<std::size_t>(count > 0 ? count : 0));
-    return count > 0;
-}
 
 }  // namespace
 
@@ -44,9 +36,9 @@ void InotifyEvents::remove(int watch) {
 }
 
 std::optional<FileEvent> InotifyEvents::next() {
-    if (position_ == batch_.size() && !refill())
+    if (position_ == batch_.size && !refill())
         return std::nullopt;
-    const auto* const event = reinterpret_cast<const inotify_event*>(batch_.data() + position_);
+    const auto* const event = reinterpret_cast<const inotify_event*>(batch_.bytes.get() + position_);
     position_ += sizeof(inotify_event) + event->len;
     const std::string_view name(event->name, event->len > 0 ? strnlen(event->name, event->len) : 0);
     return FileEvent{event->wd, event->mask, name};
@@ -58,21 +50,33 @@ void InotifyEvents::reopen() {
 
 bool InotifyEvents::refill() {
     position_ = 0;
-    batch_.clear();
     if (!drained_.empty()) {
-        std::swap(batch_, drained_);
+        batch_ = std::move(drained_.front());
+        drained_.pop_front();
         return true;
     }
     removals_ = 0;
-    return queue_ && readMore(queue_.number(), batch_);
+    return readInto(batch_);
+}
+
+// False when nothing waits. The bytes are reused and never cleared, which would cost more than reading.
+bool InotifyEvents::readInto(Batch& batch) const {
+    if (!batch.bytes)
+        batch.bytes.reset(new char[batchSize]);
+    const ssize_t count = queue_ ? read(queue_.number(), batch.bytes.get(), batchSize) : 0;
+    batch.size = static_cast<std::size_t>(std::max<ssize_t>(count, 0));
+    return batch.size > 0;
 }
 
 // The batch stays as it is, because a name in it may be in use.
 void InotifyEvents::drain() {
     removals_ = 0;
-    for (int i = 0; i < mostBatchesDrained; ++i)
-        if (!readMore(queue_.number(), drained_))
+    for (int i = 0; i < mostBatchesDrained; ++i) {
+        Batch batch;
+        if (!readInto(batch))
             return;
+        drained_.push_back(std::move(batch));
+    }
 }
 
 }  // namespace vexo

@@ -3,7 +3,8 @@
 // Opened with the first folder, because a user may have few of them (max_user_instances).
 #pragma once
 
-#include <vector>
+#include <deque>
+#include <memory>
 
 #include "framework/pathwatcher/FileEvents.h"
 #include "platform/linux/FileDescriptor.h"
@@ -19,13 +20,18 @@ class InotifyEvents final : public FileEvents {
     void reopen() override;
 
   private:
+    struct Batch {
+        std::unique_ptr<char[]> bytes;
+        std::size_t size = 0;
+    };
     bool refill();
+    bool readInto(Batch& batch) const;
     void drain();
 
     platform::FileDescriptor queue_;
-    std::vector<char> batch_;  // what was read at once, of which `position_` bytes are handed out
+    Batch batch_;  // what was read at once, of which `position_` bytes are handed out
     std::size_t position_ = 0;
-    std::vector<char> drained_;  // what comes after the batch
+    std::deque<Batch> drained_;  // what comes after the batch
     int removals_ = 0;           // since the queue was last emptied
 };
 
