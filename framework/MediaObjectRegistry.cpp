@@ -14,7 +14,6 @@ std::size_t hashOf(const std::string& ID) {
 }  // namespace
 
 void MediaObjectRegistry::registerTree(const VXMediaGroupRef& root) {
-    forgetVanished();
     visitGroups(root, [this](const VXMediaGroupRef& group) {
         for (const VXMediaObjectRef& mediaObject : group->ownMediaObjects().value_or(VXMediaObjectList()))
             registerObject(mediaObject);
@@ -28,11 +27,16 @@ VXMediaObjectRef MediaObjectRegistry::objectForID(const std::string& ID) const {
     return find(ID, hash);
 }
 
+// Most items are in several lists, and most trees are those of before with a change.
 void MediaObjectRegistry::registerObject(const VXMediaObjectRef& mediaObject) {
+    if (mediaObject->registry_.load(std::memory_order_relaxed) == this)
+        return;
     const std::size_t hash = hashOf(mediaObject->ID());
     platform::Locked lock(mutex_);
-    if (!find(mediaObject->ID(), hash))
-        objects_.emplace(hash, mediaObject);
+    if (find(mediaObject->ID(), hash))
+        return;
+    objects_.emplace(hash, mediaObject);
+    mediaObject->registry_.store(this, std::memory_order_relaxed);
 }
 
 void MediaObjectRegistry::forgetVanished() {

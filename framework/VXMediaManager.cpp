@@ -197,10 +197,8 @@ void VXMediaManager::setRootMediaGroup(VXMediaGroupRef group) {
         Locked lock(state_->mutex);
         state_->root.swap(previous);
     }
-    if (previous != group) {
-        previous = nullptr;
-        state_->registry.forgetVanished();
-    }
+    previous = nullptr;
+    state_->registry.forgetVanished();
     state_->observers.notify(group);
 }
 

@@ -7,6 +7,7 @@
 // a second time.
 #pragma once
 
+#include <atomic>
 #include <memory>
 #include <optional>
 #include <string>
@@ -22,6 +23,7 @@
 
 namespace vexo {
 
+class MediaObjectRegistry;
 class VXMediaObject;
 using VXMediaObjectRef = std::shared_ptr<VXMediaObject>;
 
@@ -85,8 +87,12 @@ class VXMediaObject final {
     std::optional<platform::Value> metadataAttributeForKey(std::string_view key) const;
     const Attribute* findAttribute(std::string_view key) const VX_REQUIRES(mutex_);
 
+    friend class MediaObjectRegistry;
+
     const std::string ID_;
     const int mediaType_;
+    // The registry that answers this item for its ID, from then on and for as long as the item lives.
+    mutable std::atomic<const MediaObjectRegistry*> registry_ = nullptr;
 
     mutable platform::SmallMutex mutex_;
     int mediaSourceType_ VX_GUARDED_BY(mutex_) = 0;
