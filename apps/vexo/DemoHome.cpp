@@ -13,8 +13,8 @@
 #include <span>
 
 #include "apps/vexo/DemoDocument.h"
-#include "apps/vexo/DemoInterruption.h"
 #include "apps/vexo/DemoStaging.h"
+#include "apps/vexo/Interruption.h"
 
 namespace vexo {
 namespace {
@@ -121,7 +121,7 @@ void HomeWriter::addMovie(const std::string& path, const DemoMovie& movie) {
         return;
     problem_ = movies_.make(path, movie, tint_);
     // A terminal interrupts the helper as well, so its failure may be no news.
-    if (DemoInterruption::requested())
+    if (Interruption::requested())
         problem_ = "interrupted; nothing was made";
     if (problem_)
         return;
@@ -158,7 +158,7 @@ void HomeWriter::failAt(const std::string& path, int error) {
 }  // namespace
 
 DemoHomeResult makeDemoHome(const std::string& folder, const DemoMovieMaker& movies) {
-    const DemoInterruption interruption;
+    const Interruption interruption;
     const DemoStaging staging(folder);
     if (staging.problem())
         return {std::nullopt, *staging.problem()};

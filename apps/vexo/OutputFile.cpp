@@ -13,7 +13,7 @@
 #include <filesystem>
 #include <random>
 
-#include "apps/vexo/DemoInterruption.h"
+#include "apps/vexo/Interruption.h"
 
 namespace vexo {
 namespace {
@@ -123,7 +123,7 @@ void HiddenFile::setAccess(const struct stat& model) {
 }
 
 void HiddenFile::rename(const std::string& name) {
-    if (DemoInterruption::requested())
+    if (Interruption::requested())
         keep(EINTR);
     if (error_)
         return;
@@ -139,7 +139,7 @@ Error replace(const std::string& path, const struct stat* previous, std::span<co
     // A file that may not be written may not be replaced either, even where its folder would allow it.
     if (previous && faccessat(AT_FDCWD, path.c_str(), W_OK, AT_EACCESS) != 0)
         return errno;
-    const DemoInterruption interruption;
+    const Interruption interruption;
     HiddenFile file(folderOf(path));
     if (file.error())
         return file.error();

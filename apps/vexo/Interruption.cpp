@@ -1,4 +1,4 @@
-#include "apps/vexo/DemoInterruption.h"
+#include "apps/vexo/Interruption.h"
 
 #include <cstddef>
 
@@ -14,7 +14,7 @@ void note(int) {
 }  // namespace
 
 // A signal that is ignored stays so, as nohup wants it.
-DemoInterruption::DemoInterruption() {
+Interruption::Interruption() {
     wasRequested = 0;
     struct sigaction action {};
     action.sa_handler = note;
@@ -26,12 +26,12 @@ DemoInterruption::DemoInterruption() {
     }
 }
 
-DemoInterruption::~DemoInterruption() {
+Interruption::~Interruption() {
     for (std::size_t i = 0; i < signals.size(); ++i)
         sigaction(signals[i], &previous_[i], nullptr);
 }
 
-bool DemoInterruption::requested() {
+bool Interruption::requested() {
     return wasRequested != 0;
 }
 

@@ -8,12 +8,12 @@
 
 namespace vexo {
 
-class DemoInterruption {
+class Interruption {
   public:
-    DemoInterruption();
-    ~DemoInterruption();
-    DemoInterruption(const DemoInterruption&) = delete;
-    DemoInterruption& operator=(const DemoInterruption&) = delete;
+    Interruption();
+    ~Interruption();
+    Interruption(const Interruption&) = delete;
+    Interruption& operator=(const Interruption&) = delete;
 
     static bool requested();
 
