@@ -143,6 +143,13 @@ std::string queryExpression(const std::string& text) {
     return error ? error->description() : "";
 }
 
+// For an option of several values. By itself it takes a value in square brackets, as a folder may be named,
+// for a list of its own.
+void takeLiterally(CLI::Option* option) {
+    constexpr int mostValues = 1 << 20;
+    option->expected(1, mostValues)->allow_extra_args(false);
+}
+
 // Options of which exactly one is to be given.
 void requireOneOf(const CLI::Option& one, const CLI::Option& other) {
     if (one.empty() == other.empty())
@@ -157,7 +164,8 @@ Parser::Parser(Arguments& arguments)
     app.footer("Run 'vexo COMMAND --help' for the options of a command, 'man vexo' for the whole story.");
     app.add_option("--plugin", arguments.plugins,
                    "Load this plug-in bundle instead of those found; may be repeated")
-        ->option_text("BUNDLE");
+        ->option_text("BUNDLE")
+        ->allow_extra_args(false);
     app.add_option("--home", arguments.home, "Browse this home folder")->option_text("DIR");
     auto* quiet = app.add_flag("--quiet", arguments.quiet, "Print nothing but errors on standard error");
     app.add_flag("--verbose", arguments.verbose, "Print the host's log on standard error")->excludes(quiet);
@@ -242,9 +250,9 @@ void Parser::addQuery(Arguments& arguments) {
     query->add_option("EXPRESSION", arguments.expression, "What is asked, \"kMDItemPixelWidth >= 1920\" say")
         ->required()
         ->check(queryExpression);
-    query->add_option("--in", arguments.folders, "The folders to look through")
-        ->option_text("DIR...")
-        ->required();
+    takeLiterally(query->add_option("--in", arguments.folders, "The folders to look through")
+                      ->option_text("DIR... REQUIRED")
+                      ->required());
     query->callback([this, &arguments] {
         const auto expression = QueryExpression::parse(arguments.expression);
         hostCommand = {Needs::hostAlone,
@@ -288,6 +296,8 @@ void Parser::addCopy(Arguments& arguments) {
     CLI::Option* groups =
         copy->add_option("--group", arguments.copy.groups, "The groups, by their IDs or URLs")
             ->option_text("ID...");
+    takeLiterally(objects);
+    takeLiterally(groups);
     copy->add_option("--type", arguments.copy.type, "Write the bytes of this type alone")
         ->option_text("TYPE")
         ->excludes(json);
@@ -303,17 +313,17 @@ void Parser::addCopy(Arguments& arguments) {
 void Parser::addOverlay(Arguments& arguments) {
     CLI::App* overlay = addCommand("overlay", "Draw what lies over the thumbnail of an item, as PNG");
     overlay->add_option("--object", arguments.overlay.object, "The item, by its ID or URL")
-        ->option_text("ID")
+        ->option_text("ID REQUIRED")
         ->required();
     overlay->add_option("--size", arguments.overlaySize, "The thumbnail's width and height in points")
-        ->option_text("WxH")
+        ->option_text("WxH REQUIRED")
         ->required()
         ->check(size);
     overlay->add_option("--scale", arguments.overlayScale, "Pixels a point, 1 unless given")
         ->option_text("S")
         ->check(scale);
     overlay->add_option("-o", arguments.overlay.outputFile, "The file to write")
-        ->option_text("FILE.png")
+        ->option_text("FILE.png REQUIRED")
         ->required();
     overlay->callback([this, &arguments] {
         arguments.overlay.size = sizeInPoints(arguments.overlaySize).value();

@@ -6,20 +6,22 @@
 namespace vexo {
 namespace {
 
-// The first with a name keeps it.
+// The first with a name keeps it. An ID is mostly a path and its bytes may be no text: it can be given as it
+// is, which no other has, or as it was printed, which others may share.
 template <typename Found, typename Thing>
 void enter(std::unordered_map<std::string, Found>& names, const std::optional<std::string>& id,
            const Thing& thing, const Found& found) {
-    if (id)
+    if (id) {
+        names.try_emplace(*id, found);
         names.try_emplace(platform::validUTF8(*id), found);
+    }
     if (const auto url = thing.URL())
         names.try_emplace(url->absoluteString(), found);
 }
 
-// IDs are mostly paths. One whose bytes are no text can be given as they are or as they were printed.
 template <typename Found>
 const Found* find(const std::unordered_map<std::string, Found>& names, const std::string& id) {
-    const auto found = names.find(platform::validUTF8(id));
+    const auto found = names.find(id);
     return found != names.end() ? &found->second : nullptr;
 }
 

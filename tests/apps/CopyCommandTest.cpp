@@ -126,6 +126,19 @@ TEST_F(CopyCommandTest, AURLNamesWhatAnIDNames) {
     EXPECT_EQ(document({"--object", movie})["types"]["text/uri-list"], url + "\r\n");
 }
 
+TEST_F(CopyCommandTest, OfFilesThatArePrintedAlikeTheOneThatIsNamedIsCopied) {
+    const std::string one = makeMovie("Film", "\xFE.mov");
+    const std::string other = makeMovie("Film", "\xFF.mov");
+    EXPECT_THAT(copy({"--object", one, "--type", "text/uri-list"}).output, HasSubstr("%FE.mov"));
+    EXPECT_THAT(copy({"--object", other, "--type", "text/uri-list"}).output, HasSubstr("%FF.mov"));
+}
+
+TEST_F(CopyCommandTest, AnIDThatWasPrintedNamesTheFirstThatIsPrintedSo) {
+    makeMovie("Film", "\xFF.mov");
+    const Json answer = document({"--object", projectPath("Film") + "/Movies/\uFFFD.mov"});
+    EXPECT_THAT(answer["types"]["text/uri-list"].get<std::string>(), HasSubstr("%FF.mov"));
+}
+
 TEST_F(CopyCommandTest, AnEventClipLeavesAnEmptyListOfProjects) {
     const std::string clip = makeClip("Trip");
     const Json answer = document({"--object", clip});
@@ -236,6 +249,8 @@ TEST_F(CopyCommandTest, WhatIsNotThereIsNamedOnOneLine) {
     expectRefusal(copy({"--object", movie, "/no\nsuch"}), 1, "no item with the ID or URL '/no");
     expectRefusal(copy({"--group", "nosuch", "--json"}), 1, "no group with the ID or URL 'nosuch'");
     expectRefusal(copy({"--group", movie}), 1, "no group with");
+    expectRefusal(copy({"--object", "[a,b]"}), 1, "no item with the ID or URL '[a,b]'");
+    expectRefusal(copy({"--group", "[]"}), 1, "no group with the ID or URL '[]'");
     expectRefusal(copy({"--object", movie, "--type", "image/png\x1B"}), 1,
                   "the type 'image/png\u241B' is not among those copied: text/uri-list, ");
     makeClip("Trip");
