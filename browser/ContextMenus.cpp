@@ -29,22 +29,23 @@ std::function<void(const platform::MenuItem&)> sending(Action action, std::weak_
     };
 }
 
-platform::MenuItem openItem(std::string title, std::shared_ptr<const void> representedObject,
-                            std::weak_ptr<VXReelixPlugin> target) {
-    return {.title = std::move(title),
-            .action = "contextMenuOpen:",
-            .keyEquivalent = "",
-            .representedObject = std::move(representedObject),
-            .perform = sending(&VXReelixPlugin::contextMenuOpen, std::move(target))};
-}
+struct NamedAction {
+    const char* name;
+    Action action;
+};
+constexpr NamedAction openAction{"contextMenuOpen:", &VXReelixPlugin::contextMenuOpen};
+constexpr NamedAction revealAction{"contextMenuReveal:", &VXReelixPlugin::contextMenuReveal};
 
-platform::MenuItem revealItem(std::string title, std::shared_ptr<const void> representedObject,
-                              std::weak_ptr<VXReelixPlugin> target) {
-    return {.title = std::move(title),
-            .action = "contextMenuReveal:",
-            .keyEquivalent = "",
-            .representedObject = std::move(representedObject),
-            .perform = sending(&VXReelixPlugin::contextMenuReveal, std::move(target))};
+// A missing title leaves out its own item alone.
+void addItem(platform::Menu& menu, const std::optional<std::string>& title, const NamedAction& action,
+             std::shared_ptr<const void> representedObject, std::weak_ptr<VXReelixPlugin> target) {
+    if (!title)
+        return;
+    menu.items.push_back({.title = *title,
+                          .action = action.name,
+                          .keyEquivalent = "",
+                          .representedObject = std::move(representedObject),
+                          .perform = sending(action.action, std::move(target))});
 }
 
 // Observers know the sender as what the host made.
@@ -60,10 +61,8 @@ std::shared_ptr<platform::Menu> VXReelixPlugin::contextMenuForMediaObject(const 
     if (!mediaObject)
         return nullptr;
     auto menu = newMenu("Object Context Menu");
-    if (auto title = localizedString("OpenInReelix"))
-        menu->items.push_back(openItem(*std::move(title), mediaObject, self()));
-    if (auto title = localizedString("RevealInFinder"))
-        menu->items.push_back(revealItem(*std::move(title), mediaObject, self()));
+    addItem(*menu, localizedString("OpenInReelix"), openAction, mediaObject, self());
+    addItem(*menu, localizedString("RevealInFinder"), revealAction, mediaObject, self());
     return menu;
 }
 
@@ -74,8 +73,7 @@ std::shared_ptr<platform::Menu> VXReelixPlugin::contextMenuForMediaGroup(const G
     const bool isRoot = mediaGroup == rootMediaGroup();
     if (!isRoot && mediaGroup->typeIdentifier() == vexo::VXReelixOldReelixProjectsGroupTypeIdentifier)
         return menu;
-    if (auto title = localizedString(isRoot ? "OpenReelix" : "OpenInReelix"))
-        menu->items.push_back(openItem(*std::move(title), mediaGroup, self()));
+    addItem(*menu, localizedString(isRoot ? "OpenReelix" : "OpenInReelix"), openAction, mediaGroup, self());
     return menu;
 }
 
