@@ -58,6 +58,29 @@ bool isText(std::string_view text) {
     return isValidUTF8(text);
 }
 
+// Requires: the text is UTF-8.
+std::string escaped(std::string_view text) {
+    std::string result;
+    for (std::size_t i = 0; i < text.size(); ++i) {
+        const char c = text[i];
+        if (c == '&')
+            result += "&amp;";
+        else if (c == '<')
+            result += "&lt;";
+        else if (c == '>')
+            result += "&gt;";
+        else if (c == '\r')
+            result += "&#13;";  // written plainly, a reader would make it a line feed
+        else if (isControl(c))
+            result += replacementCharacter;
+        else if (beginsWithNonCharacter(text.substr(i)))
+            result += replacementCharacter, i += replacementCharacter.size() - 1;
+        else
+            result += c;
+    }
+    return result;
+}
+
 class Writer {
   public:
     void write(const Value& propertyList);
@@ -72,7 +95,6 @@ class Writer {
     void putString(std::string_view text);
     void putText(std::string_view name, std::string_view text);
     void putLine(std::string_view line);
-    std::string escaped(std::string_view text) const;
 
     std::string text_;
     std::size_t nesting_ = 0;
@@ -149,29 +171,6 @@ void Writer::putText(std::string_view name, std::string_view text) {
 
 void Writer::putLine(std::string_view line) {
     text_.append(nesting_, '\t').append(line).append("\n");
-}
-
-// Requires: the text is UTF-8.
-std::string Writer::escaped(std::string_view text) const {
-    std::string result;
-    for (std::size_t i = 0; i < text.size(); ++i) {
-        const char c = text[i];
-        if (c == '&')
-            result += "&amp;";
-        else if (c == '<')
-            result += "&lt;";
-        else if (c == '>')
-            result += "&gt;";
-        else if (c == '\r')
-            result += "&#13;";  // written plainly, a reader would make it a line feed
-        else if (isControl(c))
-            result += replacementCharacter;
-        else if (beginsWithNonCharacter(text.substr(i)))
-            result += replacementCharacter, i += replacementCharacter.size() - 1;
-        else
-            result += c;
-    }
-    return result;
 }
 
 }  // namespace
