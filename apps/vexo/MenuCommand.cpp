@@ -114,9 +114,7 @@ std::shared_ptr<ActionOutcome> observedOutcome() {
 // Why an action does nothing, and what there is to do about it.
 std::string reasonForNothing(const MenuItem& item) {
     if (item.action == "contextMenuOpen:")
-        return "no application for it is installed; install it, or see ENVIRONMENT in vexo(1) for where it "
-               "is "
-               "looked for";
+        return "no application for it is installed; install it, or see ENVIRONMENT in 'man vexo'";
     if (item.action == "contextMenuReveal:")
         return "where its file is is not known; see whether its volume is mounted";
     return "there was nothing to do";
