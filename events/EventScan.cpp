@@ -85,6 +85,11 @@ bool isMovieByMetadata(const vexo::VXMetadataProperties& properties) {
     return false;
 }
 
+bool isSupportedMovie(const std::string& clip, const platform::FolderEntry& entry) {
+    return entry.isPlainFile ? vexo::VXMediaBrowserUtilities::supportedPlainFile(clip)
+                             : vexo::VXMediaBrowserUtilities::supportedMovieFile(clip);
+}
+
 platform::CalendarDateRef dateInAttribute(const platform::Folder& folder, const std::string& name,
                                           const platform::FolderEntry& entry) {
     ClipDateValue value;
@@ -253,7 +258,7 @@ std::optional<VXReelixPlugin::ScannedClip> VXReelixPlugin::EventLibraryScan::cli
 
     const std::string clip = path::appending(*eventFolder.string(), name);
     Object mediaObject;
-    if (!vexo::VXMediaBrowserUtilities::supportedMovieFile(clip)) {
+    if (!isSupportedMovie(clip, *entry)) {
         if (!isMovieByMetadata(*vexo::VXMediaObject::spotlightProperties(clip)))
             return std::nullopt;
         mediaObject = newClip(name, clip);

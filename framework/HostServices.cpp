@@ -46,4 +46,8 @@ bool VXMediaBrowserUtilities::supportedMovieFile(const std::string& path) {
     return hostServices().metadata.supportedMovieFile(path);
 }
 
+bool VXMediaBrowserUtilities::supportedPlainFile(const std::string& path) {
+    return hostServices().metadata.supportedPlainFile(path);
+}
+
 }  // namespace vexo

@@ -23,6 +23,8 @@ class MetadataProvider {
     // Whether the file is a movie by its type. Reads no more than the beginning, where the name tells no
     // type.
     virtual bool supportedMovieFile(const std::string& path) const = 0;
+    // The same of what is known to be a plain file: its status need not be asked for again.
+    virtual bool supportedPlainFile(const std::string& path) const { return supportedMovieFile(path); }
 };
 
 }  // namespace vexo

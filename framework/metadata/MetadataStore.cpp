@@ -287,6 +287,12 @@ bool MetadataStore::supportedMovieFile(const std::string& path) const {
     return file && isPlainFile(*file) && typeOf(*file).isMovie;
 }
 
+bool MetadataStore::supportedPlainFile(const std::string& path) const {
+    const std::string name = platform::path::lastComponent(path);
+    return typeForExtension(platform::path::extension(name)) ? typeOfFile(name).isMovie
+                                                             : supportedMovieFile(path);
+}
+
 std::optional<std::string> MetadataStore::problemWithFile(const std::string& path) const {
     const auto file = foundFile(path);
     if (!file)

@@ -37,6 +37,7 @@ class MetadataStore final : public MetadataProvider {
     // Whether the file is a plain file of a movie type; links are followed. The extension decides, and where
     // it tells no type the beginning of the content: whether the rest can be read is not asked.
     bool supportedMovieFile(const std::string& path) const override;
+    bool supportedPlainFile(const std::string& path) const override;
 
     // Why the file is no movie that can be read, in words for people and without its path: "it is a folder",
     // "Plain text document, no movie", the reader's reason. nil for a movie whose content was read. Reads

@@ -7,6 +7,7 @@
 
 #include <atomic>
 
+#include "framework/metadata/MetadataStore.h"
 #include "tests/support/PluginTest.h"
 
 namespace {
@@ -51,10 +52,14 @@ class ScanCallsTest : public PluginTest {
     }
 
   private:
+    // The real one: what the host looks at counts as well.
+    const vexo::MetadataStore metadata_{std::nullopt, nullptr};
+    const vexo::HostServices& host_ = vexo::hostServices();
+    const vexo::HostServicesScope scope_{
+        {host_.pathWatcher, host_.imageManager, metadata_, host_.thumbnails, host_.diagnostics}};
     int clips_ = 0;
 };
 
-// The host's own look at a file that may be a movie is not the scan's.
 TEST_F(ScanCallsTest, AClipTakesOneLookAndOneReadOfItsAttribute) {
     addClips(100);
     const Calls few = callsOfAScan();

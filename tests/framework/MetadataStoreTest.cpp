@@ -379,6 +379,18 @@ TEST(SupportedMovieFile, IsAPlainFileOfAMovieType) {
     EXPECT_FALSE(store.supportedMovieFile(folder.writeFile(".mov")));
 }
 
+TEST(SupportedMovieFile, IsTheSameOfWhatIsKnownToBeAPlainFile) {
+    const MetadataStore store(std::nullopt, nullptr);
+    const TemporaryFolder folder;
+    for (const char* name :
+         {"a.mov", "A.M4V", "sound.m4a", "picture.jpg", "mov", ".mov", "project.qnproject"}) {
+        const std::string file = folder.writeFile(name);
+        EXPECT_EQ(store.supportedPlainFile(file), store.supportedMovieFile(file)) << name;
+    }
+    EXPECT_TRUE(store.supportedPlainFile(folder.writeFile("movie", movieContent)));
+    EXPECT_FALSE(store.supportedPlainFile(folder.writeFile("sound", soundContent)));
+}
+
 TEST(SupportedMovieFile, IsToldByTheContentWhereTheNameTellsNoType) {
     const MetadataStore store(std::nullopt, nullptr);
     const TemporaryFolder folder;
