@@ -37,10 +37,11 @@ Rect badgeAround(Size text, Size thumbnail) {
     return {thumbnail.width - margin - width, margin, width, height};
 }
 
-// No more than half of the thumbnail either way.
+// No more than two thirds of the thumbnail either way: a wide one of 80 points still has room for minutes.
 bool hasRoomFor(const Rect& badge, Size thumbnail) {
-    return badge.width + 2 * margin <= thumbnail.width / 2 &&
-           badge.height + 2 * margin <= thumbnail.height / 2;
+    constexpr double part = 2.0 / 3;
+    return badge.width + 2 * margin <= thumbnail.width * part &&
+           badge.height + 2 * margin <= thumbnail.height * part;
 }
 
 Rect centered(Size size, const Rect& rect) {

@@ -252,7 +252,7 @@ TEST_F(ThumbnailOverlayTest, IsTheHostsWithoutAFormatVersion) {
             EXPECT_EQ(drawn(image).pixels, drawn(hosts).pixels) << size.width;
         }
     }
-    EXPECT_NE(overlay(newClip(125), {160, 120}), nullptr);
+    EXPECT_NE(overlay(newClip(125), {80, 60}), nullptr);
 }
 
 TEST_F(ThumbnailOverlayTest, IsTheHostsWithoutAHeight) {

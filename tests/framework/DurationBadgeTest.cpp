@@ -90,9 +90,9 @@ TEST_F(DurationBadgeTest, IsNilForSizesThatAreNone) {
 
 TEST_F(DurationBadgeTest, IsNilWhereItWouldCoverMuchOfTheThumbnail) {
     EXPECT_EQ(durationBadge(125, {60, 120}), nullptr);
-    EXPECT_EQ(durationBadge(125, {160, 47.5}), nullptr);
-    EXPECT_NE(durationBadge(125, {160, 48}), nullptr);
-    EXPECT_NE(durationBadge(125, {96, 72}), nullptr);
+    EXPECT_EQ(durationBadge(125, {160, 35.5}), nullptr);
+    EXPECT_NE(durationBadge(125, {160, 36.5}), nullptr);
+    EXPECT_NE(durationBadge(599, {80, 45}), nullptr);
 }
 
 TEST_F(DurationBadgeTest, IsNilWhereItsTextIsTooLong) {
