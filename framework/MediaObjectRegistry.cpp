@@ -15,10 +15,19 @@ std::size_t hashOf(const std::string& ID) {
 
 void MediaObjectRegistry::registerTree(const VXMediaGroupRef& root) {
     visitGroups(root, [this](const VXMediaGroupRef& group) {
-        for (const VXMediaObjectRef& mediaObject : group->ownMediaObjects().value_or(VXMediaObjectList()))
+        const VXMediaObjectList mediaObjects = group->ownMediaObjects().value_or(VXMediaObjectList());
+        makeFirstRoom(mediaObjects.size());
+        for (const VXMediaObjectRef& mediaObject : mediaObjects)
             registerObject(mediaObject);
         return true;
     });
+}
+
+// A root lists nearly all items of its tree, so the table of the first one need not grow by and by.
+void MediaObjectRegistry::makeFirstRoom(std::size_t count) {
+    platform::Locked lock(mutex_);
+    if (objects_.empty())
+        objects_.reserve(count);
 }
 
 VXMediaObjectRef MediaObjectRegistry::objectForID(const std::string& ID) const {

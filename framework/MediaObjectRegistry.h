@@ -23,6 +23,7 @@ class MediaObjectRegistry {
     VXMediaObjectRef objectForID(const std::string& ID) const VX_EXCLUDES(mutex_);
 
   private:
+    void makeFirstRoom(std::size_t count) VX_EXCLUDES(mutex_);
     void registerObject(const VXMediaObjectRef& mediaObject) VX_EXCLUDES(mutex_);
     VXMediaObjectRef find(const std::string& ID, std::size_t hash) const VX_REQUIRES(mutex_);
 
