@@ -110,8 +110,10 @@ struct Host::State {
 Host::Host(const HostOptions& options) : state_(std::make_unique<State>(options)) {
     state_->pathWatcher.setWarningHandler(
         [&diagnostics = state_->diagnostics](const std::string& warning) { diagnostics.warn(warning); });
-    if (options.followsChanges)
+    if (options.followsChanges) {
+        state_->workspace.followMounts();
         state_->pathWatcher.start();
+    }
 }
 
 Host::~Host() {

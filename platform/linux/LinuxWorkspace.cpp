@@ -35,17 +35,21 @@ LinuxWorkspace::LinuxWorkspace(const MountTable& mountTable, SystemLog& log)
       log_(log),
       dataFolders_(desktopDataFolders()),
       entries_(dataFolders_),
-      monitor_(g_unix_mount_monitor_get()),
-      knownVolumes_(mountedLocalVolumePaths()),
-      launcher_([this](const std::string& problem) { report(problem); }) {
+      launcher_([this](const std::string& problem) { report(problem); }) {}
+
+LinuxWorkspace::~LinuxWorkspace() {
+    if (!monitor_)
+        return;
+    g_signal_handler_disconnect(monitor_, monitorHandler_);
+    g_object_unref(monitor_);
+}
+
+void LinuxWorkspace::followMounts() {
+    knownVolumes_ = mountedLocalVolumePaths();
+    monitor_ = g_unix_mount_monitor_get();
     const auto changed =
         +[](GUnixMountMonitor*, gpointer self) { static_cast<LinuxWorkspace*>(self)->mountsChanged(); };
     monitorHandler_ = g_signal_connect(monitor_, "mounts-changed", G_CALLBACK(changed), this);
-}
-
-LinuxWorkspace::~LinuxWorkspace() {
-    g_signal_handler_disconnect(monitor_, monitorHandler_);
-    g_object_unref(monitor_);
 }
 
 std::vector<std::string> LinuxWorkspace::mountedLocalVolumePaths() const {

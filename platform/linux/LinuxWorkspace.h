@@ -29,6 +29,11 @@ class LinuxWorkspace final : public Workspace {
     // Waits for applications that were launched and have not yet taken notice of it, some seconds at most.
     ~LinuxWorkspace() override;
 
+    // Posts each volume that is mounted from now on. A program that ends before anybody could mount one does
+    // without: the monitor's thread and types take longer than reading a small library. Called once, on the
+    // main thread.
+    void followMounts();
+
     std::vector<std::string> mountedLocalVolumePaths() const override;
     std::vector<std::string> mountedRemovableMedia() const override;
 
@@ -54,8 +59,8 @@ class LinuxWorkspace final : public Workspace {
     const DesktopEntries entries_;
 
     // The main thread's own.
-    GUnixMountMonitor* const monitor_;
-    gulong monitorHandler_;
+    GUnixMountMonitor* monitor_ = nullptr;  // nil until mounts are followed
+    gulong monitorHandler_ = 0;
     std::vector<std::string> knownVolumes_;
 
     ApplicationLauncher launcher_;  // the last: it reports until it has gone

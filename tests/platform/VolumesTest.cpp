@@ -192,6 +192,7 @@ TEST(Volumes, TheWorkspacePostsEachNewMount) {
     const SystemMountTable table;
     CollectedLog log;
     LinuxWorkspace workspace(table, log);
+    workspace.followMounts();
     std::vector<std::string> posted;
     const auto observer = std::make_shared<int>();
     workspace.notificationCenter().addObserver(
