@@ -188,6 +188,7 @@ TEST_F(ContextMenus, TheFileThatIsRevealedIsWhereOtherProgramsSeeIt) {
 
 TEST_F(ContextMenus, RevealingWithoutAPathDoesNothing) {
     choose(*menuOf(item("")), 2);
+    choose(*menuOf(item("/Volumes/Gone/a.mov")), 2);
     EXPECT_THAT(requests(), IsEmpty());
     EXPECT_THAT(senders, IsEmpty());
 }
