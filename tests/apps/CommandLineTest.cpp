@@ -16,13 +16,10 @@ using testing::EndsWith;
 using testing::HasSubstr;
 using testing::Not;
 using testing::StartsWith;
+using testing_support::isOneLine;
 using testing_support::Outcome;
 using testing_support::runVexo;
 using testing_support::TemporaryFolder;
-
-bool isOneLine(const std::string& text) {
-    return !text.empty() && text.find('\n') == text.size() - 1;
-}
 
 class CommandLineTest : public testing::Test {
   protected:

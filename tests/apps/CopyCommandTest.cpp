@@ -3,10 +3,9 @@
 #include <gtest/gtest.h>
 
 #include <filesystem>
-#include <fstream>
 #include <nlohmann/json.hpp>
-#include <sstream>
 
+#include "tests/support/FileContent.h"
 #include "tests/support/Program.h"
 #include "tests/support/SampleMovie.h"
 #include "tests/support/TemporaryFolder.h"
@@ -18,22 +17,13 @@ using testing::AllOf;
 using testing::HasSubstr;
 using testing::Not;
 using testing::StartsWith;
+using testing_support::contentOf;
+using testing_support::isOneLine;
 using testing_support::Outcome;
 
 using Arguments = std::vector<std::string>;
 
 constexpr const char* projectsType = "VXReelixProjectsPboardType";
-
-bool isOneLine(const std::string& text) {
-    return !text.empty() && text.find('\n') == text.size() - 1;
-}
-
-std::string contentOf(const std::string& path) {
-    std::ifstream file(path, std::ios::binary);
-    std::stringstream content;
-    content << file.rdbuf();
-    return content.str();
-}
 
 class CopyCommandTest : public testing::Test {
   protected:

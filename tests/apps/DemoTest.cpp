@@ -10,16 +10,15 @@
 #include <cmath>
 #include <ctime>
 #include <filesystem>
-#include <fstream>
 #include <iterator>
 #include <map>
 #include <memory>
 #include <nlohmann/json.hpp>
 #include <set>
-#include <sstream>
 #include <string>
 #include <vector>
 
+#include "tests/support/FileContent.h"
 #include "tests/support/Program.h"
 #include "tests/support/TemporaryFolder.h"
 
@@ -31,6 +30,7 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::MatchesRegex;
 using testing::StartsWith;
+using testing_support::contentOf;
 using testing_support::Outcome;
 using testing_support::runProgram;
 using testing_support::ScopedEnvironment;
@@ -43,13 +43,6 @@ constexpr const char* longName =
     "The Complete and Unabridged Story of How We Repainted the Kitchen, Lost the Cat, Found It Again and "
     "Decided to "
     "Move House";
-
-std::string contentOf(const std::string& path) {
-    std::ifstream file(path, std::ios::binary);
-    std::stringstream content;
-    content << file.rdbuf();
-    return content.str();
-}
 
 const std::string realProgram = std::string(VEXO_BIN_DIR) + "/vexo";
 

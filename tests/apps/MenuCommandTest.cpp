@@ -22,10 +22,6 @@ using testing::HasSubstr;
 using testing::Optional;
 using testing::StartsWith;
 
-bool isOneLine(const std::string& text) {
-    return !text.empty() && text.find('\n') == text.size() - 1;
-}
-
 class MenuCommand : public testing::Test {
   protected:
     MenuCommand() {

@@ -10,10 +10,9 @@
 #include <atomic>
 #include <csignal>
 #include <filesystem>
-#include <fstream>
-#include <sstream>
 #include <thread>
 
+#include "tests/support/FileContent.h"
 #include "tests/support/OrdinaryUser.h"
 #include "tests/support/TemporaryFolder.h"
 
@@ -24,18 +23,12 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::Optional;
+using testing_support::contentOf;
 
 using Problem = std::optional<std::string>;
 
 Problem write(const std::string& path, std::string_view content) {
     return vexo::writeFile(path, std::as_bytes(std::span(content)));
-}
-
-std::string contentOf(const std::string& path) {
-    std::ifstream file(path, std::ios::binary);
-    std::stringstream content;
-    content << file.rdbuf();
-    return content.str();
 }
 
 mode_t permissionsOf(const std::string& path) {

@@ -3,9 +3,9 @@
 #include <gtest/gtest.h>
 
 #include <filesystem>
-#include <fstream>
 #include <iterator>
 
+#include "tests/support/FileContent.h"
 #include "tests/support/Program.h"
 #include "tests/support/TemporaryFolder.h"
 
@@ -16,10 +16,6 @@ using testing::AllOf;
 using testing::HasSubstr;
 using testing::StartsWith;
 namespace fs = std::filesystem;
-
-bool isOneLine(const std::string& text) {
-    return !text.empty() && text.find('\n') == text.size() - 1;
-}
 
 class OverlayCommand : public testing::Test {
   protected:
@@ -37,16 +33,12 @@ class OverlayCommand : public testing::Test {
         EXPECT_EQ(outcome.output, "");
         EXPECT_THAT(outcome.errors, AllOf(StartsWith("vexo: "), HasSubstr(reason))) << size;
         EXPECT_TRUE(isOneLine(outcome.errors)) << outcome.errors;
-        EXPECT_EQ(content(), "before");
+        EXPECT_EQ(contentOf(file_), "before");
         EXPECT_EQ(std::distance(fs::directory_iterator(folder_.path()), {}), 1);
-    }
-    std::string content() const {
-        std::ifstream file(file_, std::ios::binary);
-        return {std::istreambuf_iterator<char>(file), {}};
     }
     // Width and height of the PNG in the file.
     std::string pixels() const {
-        const std::string png = content();
+        const std::string png = contentOf(file_);
         if (!png.starts_with("\x89PNG\r\n\x1a\n") || png.size() < 24)
             return "no PNG";
         const auto number = [&png](std::size_t at) {

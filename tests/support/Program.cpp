@@ -5,20 +5,11 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-#include <fstream>
-#include <sstream>
-
+#include "tests/support/FileContent.h"
 #include "tests/support/TemporaryFolder.h"
 
 namespace testing_support {
 namespace {
-
-std::string contentOf(const std::string& path) {
-    std::ifstream file(path, std::ios::binary);
-    std::stringstream content;
-    content << file.rdbuf();
-    return content.str();
-}
 
 // Nil-terminated, as the kernel wants them.
 std::vector<char*> pointersTo(std::vector<std::string>& texts) {
@@ -57,6 +48,10 @@ Outcome runProgram(const std::string& program, std::vector<std::string> argument
 
 Outcome runVexo(std::vector<std::string> arguments) {
     return runProgram(VEXO_BIN_DIR "/vexo", std::move(arguments));
+}
+
+bool isOneLine(const std::string& text) {
+    return !text.empty() && text.find('\n') == text.size() - 1;
 }
 
 }  // namespace testing_support

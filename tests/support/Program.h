@@ -19,4 +19,7 @@ Outcome runProgram(const std::string& program, std::vector<std::string> argument
 // vexo, as it was built.
 Outcome runVexo(std::vector<std::string> arguments);
 
+// Whether what a program said is one line, with its end.
+bool isOneLine(const std::string& text);
+
 }  // namespace testing_support
