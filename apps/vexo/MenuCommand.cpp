@@ -1,5 +1,7 @@
 #include <fmt/format.h>
 
+#include <variant>
+
 #include "apps/vexo/Commands.h"
 #include "apps/vexo/Json.h"
 #include "apps/vexo/MainLoop.h"
