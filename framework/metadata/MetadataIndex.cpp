@@ -7,6 +7,7 @@
 #include <chrono>
 #include <cstdio>
 #include <filesystem>
+#include <utility>
 
 #include "framework/UserFolders.h"
 #include "platform/Path.h"
@@ -153,14 +154,14 @@ std::optional<MediaReaderAnswer> MetadataIndex::find(const FileKey& key) {
     platform::Locked lock(mutex_);
     if (!table_)
         return std::nullopt;
-    const IndexTable::Entry* entry = readAhead_.find(key);
+    IndexTable::Entry* entry = readAhead_.find(key);
     if (!entry) {
         readAround(key);
         entry = readAhead_.find(key);
     }
     if (!entry)
         return std::nullopt;
-    if (!entry->isNewlyUsed)
+    if (!std::exchange(entry->isNewlyUsed, true))
         noteUse(key);
     return entry->answer;
 }

@@ -24,11 +24,11 @@ class ReadAhead {
     }
 
     // nil for what is not here. Valid until the next change.
-    const IndexTable::Entry* find(const FileKey& key) const {
+    IndexTable::Entry* find(const FileKey& key) {
         const auto block = blocks_.find(numberOf(key));
         if (block == blocks_.end())
             return nullptr;
-        const auto& entries = block->second;
+        auto& entries = block->second;
         const auto entry = std::find_if(entries.begin(), entries.end(),
                                         [&key](const auto& each) { return each.key == key; });
         return entry == entries.end() ? nullptr : &*entry;
@@ -44,7 +44,7 @@ class ReadAhead {
 
   private:
     static constexpr std::uint64_t blockInodes = 64;
-    static constexpr std::size_t mostBlocks = 64;  // some hundred kilobytes of entries
+    static constexpr std::size_t mostBlocks = 64;  // at most a megabyte or two, titles apart
 
     // Blocks of two devices may have one number: keys are compared whole.
     static std::uint64_t numberOf(const FileKey& key) { return key.inode / blockInodes ^ key.device << 40; }
