@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "framework/metadata/MediaLimits.h"
+#include "platform/Text.h"
 
 namespace vexo {
 
@@ -90,10 +91,11 @@ class RowReader {
     }
     bool isNull(int column) const { return sqlite3_column_type(row_, column) == SQLITE_NULL; }
     std::string_view bytes(int column, std::size_t longest) {
-        const auto* text = reinterpret_cast<const char*>(sqlite3_column_text(row_, column));
+        const auto* begin = reinterpret_cast<const char*>(sqlite3_column_text(row_, column));
         const auto size = static_cast<std::size_t>(sqlite3_column_bytes(row_, column));
-        makesSense_ &= size <= longest;
-        return text && makesSense_ ? std::string_view(text, size) : std::string_view();
+        const std::string_view text = begin ? std::string_view(begin, size) : std::string_view();
+        makesSense_ &= size <= longest && platform::isValidUTF8(text);
+        return makesSense_ ? text : std::string_view();
     }
 
     sqlite3_stmt* const row_;

@@ -287,9 +287,10 @@ TEST_F(MetadataIndexFile, DamageThatShowsLaterBeginsTheIndexAnew) {
 
 TEST_F(MetadataIndexFile, AnAnswerThatMakesNoSenseCountsAsNone) {
     MetadataIndex(path_).store(key, movie);
-    for (const char* damage : {"mediaTypes = NULL", "mediaTypes = ''", "pixelWidth = -1",
-                               "pixelHeight = 'many'", "totalBitRate = 9e99", "durationSeconds = 'long'",
-                               "title = zeroblob(50000)", "failure = zeroblob(901)"}) {
+    for (const char* damage :
+         {"mediaTypes = NULL", "mediaTypes = ''", "pixelWidth = -1", "pixelHeight = 'many'",
+          "totalBitRate = 9e99", "durationSeconds = 'long'", "title = zeroblob(50000)",
+          "title = CAST(x'ff' AS TEXT)", "failure = zeroblob(901)"}) {
         MetadataIndex(path_).store(key, movie);
         runSql(std::string("UPDATE files SET ") + damage);
         EXPECT_EQ(MetadataIndex(path_).find(key), std::nullopt) << damage;
@@ -430,6 +431,17 @@ TEST_F(MetadataIndexFile, ManyUsesAreNotedBeforeTheIndexIsClosed) {
     for (std::uint64_t i = 1; i < 1000; ++i)
         index.find(keyOf(i));
     EXPECT_EQ(dayOf(0), "100");
+}
+
+TEST_F(MetadataIndexFile, AnEntryThatIsFoundOverAndOverIsNotedOnce) {
+    MetadataIndex(path_, on(0)).store(key, movie);
+    {
+        MetadataIndex index(path_, on(100));
+        for (int i = 0; i < 1000; ++i)
+            EXPECT_EQ(index.find(key), movie);
+        EXPECT_EQ(dayOf(2), "0");
+    }
+    EXPECT_EQ(dayOf(2), "100");
 }
 
 TEST_F(MetadataIndexFile, AUseOfAnEarlierStateOfAFileIsNotTheFiles) {
