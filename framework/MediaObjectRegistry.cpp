@@ -13,6 +13,15 @@ std::size_t hashOf(const std::string& ID) {
 
 }  // namespace
 
+// Items may live on, and another registry may come to lie where this one was.
+MediaObjectRegistry::~MediaObjectRegistry() {
+    for (const auto& entry : objects_) {
+        const MediaObjectRegistry* self = this;
+        if (const VXMediaObjectRef mediaObject = entry.second.lock())
+            mediaObject->registry_.compare_exchange_strong(self, nullptr);
+    }
+}
+
 void MediaObjectRegistry::registerTree(const VXMediaGroupRef& root) {
     visitGroups(root, [this](const VXMediaGroupRef& group) {
         const VXMediaObjectList mediaObjects = group->ownMediaObjects().value_or(VXMediaObjectList());

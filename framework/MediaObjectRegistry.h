@@ -14,6 +14,11 @@ namespace vexo {
 
 class MediaObjectRegistry {
   public:
+    MediaObjectRegistry() = default;
+    ~MediaObjectRegistry();
+    MediaObjectRegistry(const MediaObjectRegistry&) = delete;
+    MediaObjectRegistry& operator=(const MediaObjectRegistry&) = delete;
+
     // Registers every item of a tree, a group's own items before those of its children. Whoever asks for an
     // item meanwhile doesn't wait for the whole tree.
     void registerTree(const VXMediaGroupRef& root) VX_EXCLUDES(mutex_);
