@@ -230,19 +230,19 @@ std::optional<VXReelixPlugin::EventLibraryScan::Piece> VXReelixPlugin::EventLibr
     return piece;
 }
 
-// Leaves no folder open when there is none left. An empty folder is no event.
+// Leaves no folder open when there is none left. An empty folder is no event. A folder counts as open last:
+// should making its event raise, the other thread must not take it for that of the event before.
 void VXReelixPlugin::EventLibraryScan::openNextFolder() {
-    while (nextFolder_ < folders_.size()) {
+    while (!folder_ && nextFolder_ < folders_.size()) {
         const std::string& path = folders_[nextFolder_++];
-        folder_ = platform::services().fileManager.openFolderAtPath(path);
-        if (folder_ && !folder_->names().empty()) {
-            nextName_ = 0;
-            events_.push_back({path, plugin_.eventGroupForFolder(path, libraryFolder_), {}});
-            events_.back().clips.resize(folder_->names().size());
-            return;
-        }
+        auto folder = platform::services().fileManager.openFolderAtPath(path);
+        if (!folder || folder->names().empty())
+            continue;
+        events_.push_back({path, plugin_.eventGroupForFolder(path, libraryFolder_),
+                           std::vector<std::optional<ScannedClip>>(folder->names().size())});
+        nextName_ = 0;
+        folder_ = std::move(folder);
     }
-    folder_.reset();
 }
 
 // A file that is a movie only by its metadata gets its item before its date is known, and keeps its whole
