@@ -25,9 +25,8 @@ bool MemoryByteSource::read(std::uint64_t offset, std::span<std::byte> buffer) {
 
 // Pages come as they are needed: most documents are done with after one or two. Their room is there from the
 // beginning, so they stay where they are.
-PageCache::PageCache(ByteSource& source) : source_(source), size_(source.size()) {
+PageCache::PageCache(ByteSource& source) : source_(source), size_(source.size()), latest_(nullptr) {
     pages_.reserve(pageCount);
-    latest_ = &pages_.emplace_back();
 }
 
 bool PageCache::read(std::uint64_t offset, std::span<std::byte> buffer) {
@@ -48,7 +47,7 @@ bool PageCache::read(std::uint64_t offset, std::span<std::byte> buffer) {
 }
 
 bool PageCache::fetch(std::uint64_t number) {
-    if (latest_->number == number)
+    if (latest_ && latest_->number == number)
         return true;
     const auto known = std::ranges::find(pages_, number, &Page::number);
     const bool isKnown = known != pages_.end();
