@@ -44,8 +44,8 @@ struct FolderEntry {
 };
 
 // A folder that is gone through. Each question answers as the operation by path does and costs as few calls
-// to the system as can be, which is what scans are made of. A folder that is moved meanwhile stays the same
-// folder. It holds a file open, so whoever goes down a tree closes each folder before entering the next.
+// to the system as can be, which is what scans are made of. One that is moved meanwhile stays the same, but
+// has no attributes any more. It holds a file open: down a tree each is closed before the next is entered.
 //
 // Callable from any thread.
 class Folder {

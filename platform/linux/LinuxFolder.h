@@ -1,5 +1,6 @@
 // A folder of the machine that is gone through: every look at an entry goes by the folder's descriptor, so
-// the kernel walks no path, and what holds for the whole folder is found out once.
+// the kernel walks no path, and what holds for the whole folder is found out once. Only attributes, which the
+// kernel tells by path alone, are asked for by the path that the folder had.
 #pragma once
 
 #include <dirent.h>
