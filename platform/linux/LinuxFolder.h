@@ -24,7 +24,7 @@ namespace platform {
 // An open folder with its names, in the order of the file system.
 struct FolderListing {
     struct Closer {
-        void operator()(DIR* folder) const { closedir(folder); }
+        void operator()(DIR* opened) const { closedir(opened); }
     };
 
     // nil, and errno set, when the folder can't be listed.
