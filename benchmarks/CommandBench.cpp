@@ -31,9 +31,13 @@ struct Run {
     std::string output;
 };
 
-std::vector<std::byte> contentOf(const std::string& path) {
+std::string textOf(const std::string& path) {
     std::ifstream stream(path, std::ios::binary);
-    const std::string text{std::istreambuf_iterator<char>(stream), {}};
+    return {std::istreambuf_iterator<char>(stream), {}};
+}
+
+std::vector<std::byte> contentOf(const std::string& path) {
+    const std::string text = textOf(path);
     const auto bytes = std::as_bytes(std::span(text));
     return {bytes.begin(), bytes.end()};
 }
@@ -63,8 +67,7 @@ Run run(std::vector<std::string> words, const std::string& folder) {
     posix_spawn_file_actions_destroy(&actions);
     if (status != 0)
         throw std::runtime_error(words[0] + " failed");
-    std::ifstream stream(output);
-    return {time.count(), {std::istreambuf_iterator<char>(stream), {}}};
+    return {time.count(), textOf(output)};
 }
 
 // Of several runs the one that was disturbed least.

@@ -94,24 +94,16 @@ std::optional<std::vector<std::string>> LinuxFileManager::contentsOfDirectoryAtP
     const auto real = kernelPath(path);
     if (!real)
         return std::nullopt;
-    auto listing = FolderListing::open(*real);
-    if (!listing) {
-        logListingFailure(*real, errno);
-        return std::nullopt;
-    }
-    return std::move(listing->names);
+    auto listing = listingOfFolder(*real);
+    return listing ? std::optional(std::move(listing->names)) : std::nullopt;
 }
 
 std::unique_ptr<Folder> LinuxFileManager::openFolderAtPath(const std::string& path) const {
     const auto real = kernelPath(path);
     if (!real)
         return nullptr;
-    auto listing = FolderListing::open(*real);
-    if (!listing) {
-        logListingFailure(*real, errno);
-        return nullptr;
-    }
-    return std::make_unique<LinuxFolder>(std::move(*listing), *real, folderServices_);
+    auto listing = listingOfFolder(*real);
+    return listing ? std::make_unique<LinuxFolder>(std::move(*listing), *real, folderServices_) : nullptr;
 }
 
 std::optional<FileAttributes> LinuxFileManager::attributesOfItemAtPath(const std::string& path) const {
@@ -233,9 +225,11 @@ std::optional<std::string> LinuxFileManager::volumeNameAt(const std::string& mou
     return std::nullopt;
 }
 
-void LinuxFileManager::logListingFailure(const std::string& path, int error) const {
-    if (error != ENOENT)
-        logFailure("list", path, error);
+std::optional<FolderListing> LinuxFileManager::listingOfFolder(const std::string& path) const {
+    auto listing = FolderListing::open(path);
+    if (!listing && errno != ENOENT)
+        logFailure("list", path, errno);
+    return listing;
 }
 
 void LinuxFileManager::logFailure(std::string_view operation, const std::string& path, int error) const {

@@ -57,7 +57,8 @@ class LinuxFileManager final : public FileManager {
     std::optional<struct ::statx> statusOfItem(const std::string& kernelPath, Links links) const;
     bool isInvisible(const std::string& kernelPath, const struct ::statx& status) const;
     std::optional<std::string> volumeNameAt(const std::string& mountPoint) const;
-    void logListingFailure(const std::string& path, int error) const;
+    // nil for a folder that can't be listed; the reason is logged.
+    std::optional<FolderListing> listingOfFolder(const std::string& path) const;
     void logFailure(std::string_view operation, const std::string& path, int error) const;
 
     const std::optional<std::string> homeDirectory_;

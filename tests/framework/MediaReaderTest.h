@@ -6,22 +6,18 @@
 #include <sys/wait.h>
 
 #include <cerrno>
-#include <fstream>
-#include <iterator>
 #include <string>
 
 #include "framework/metadata/MediaReader.h"
 #include "platform/linux/FileDescriptor.h"
+#include "tests/support/FileContent.h"
 #include "tests/support/TemporaryFolder.h"
 
 namespace vexo {
 
-inline const std::string realProgram = VEXO_BIN_DIR "/vexo-media-reader";
+using testing_support::contentOf;
 
-inline std::string contentOf(const std::string& path) {
-    std::ifstream file(path, std::ios::binary);
-    return {std::istreambuf_iterator<char>(file), {}};
-}
+inline const std::string realProgram = VEXO_BIN_DIR "/vexo-media-reader";
 
 inline MediaReaderAnswer answerFor(MediaReader& reader, const std::string& path) {
     const platform::FileDescriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC));

@@ -13,6 +13,7 @@
 
 #include "framework/metadata/FileTypes.h"
 #include "framework/metadata/MetadataStore.h"
+#include "tests/support/FileContent.h"
 #include "tests/support/Program.h"
 #include "tests/support/SampleMovie.h"
 #include "tests/support/TemporaryFolder.h"
@@ -30,11 +31,6 @@ const std::string samplesFolder = VEXO_SAMPLES_DIR "/movies";
 
 std::string sample(const std::string& name) {
     return samplesFolder + "/" + name;
-}
-
-std::string contentOf(const std::string& path) {
-    std::ifstream file(path, std::ios::binary);
-    return {std::istreambuf_iterator<char>(file), {}};
 }
 
 struct MovieSample {
