@@ -6,13 +6,16 @@
 namespace platform {
 
 Image::Image(std::shared_ptr<const Picture> picture, std::string name)
-    : picture_(std::move(picture)), name_(std::move(name)) {
-    if (picture_)
-        size_ = picture_->naturalSize();
-}
+    : picture_(std::move(picture)), name_(std::move(name)) {}
 
 ImageRef Image::copy() const {
     return std::make_shared<Image>(*this);
+}
+
+Size Image::size() const {
+    if (size_)
+        return *size_;
+    return picture_ ? picture_->naturalSize() : Size{};
 }
 
 bool Image::isValid() const {

@@ -58,7 +58,8 @@ class Image {
     ImageRef copy() const;
 
     const std::string& name() const { return name_; }  // empty when it has none
-    Size size() const { return size_; }                // in points
+    // In points; the picture's until it is set.
+    Size size() const;
     void setSize(Size size) { size_ = size; }
     // Whether a change of size scales the picture (else it is drawn at its natural size).
     bool scalesWhenResized() const { return scalesWhenResized_; }
@@ -71,13 +72,14 @@ class Image {
   private:
     std::shared_ptr<const Picture> picture_;
     std::string name_;
-    Size size_;
+    std::optional<Size> size_;
     bool scalesWhenResized_ = false;
 };
 
-// A picture of the bytes of an SVG or PNG file, never nil. Damaged bytes give a picture that is not drawable;
-// so do pictures of more than 16384 points a side or 64 Mi points in all, and SVG that is compressed,
-// declares entities or tells no size. Nothing outside the bytes is loaded, whatever an SVG refers to.
+// A picture of the bytes of an SVG or PNG file, which it copies, never nil. An SVG is parsed when something
+// is first asked of its picture. Damaged bytes give a picture that is not drawable; so do pictures of more
+// than 16384 points a side or 64 Mi points in all, and SVG that is compressed, declares entities or tells no
+// size. Nothing outside the bytes is loaded, whatever an SVG refers to.
 std::shared_ptr<const Picture> pictureWithData(std::span<const std::byte> data);
 
 // A picture of those pixels; one that is not drawable for a bitmap that lacks some or has too many.

@@ -4,9 +4,11 @@
 #include <array>
 #include <cstring>
 #include <new>
+#include <utility>
 
 #include "platform/ThreadSafety.h"
 #include "platform/linux/CairoCanvas.h"
+#include "platform/linux/VectorCheck.h"
 
 namespace platform {
 
@@ -76,34 +78,6 @@ class Renderings {
     std::size_t next_ VX_GUARDED_BY(mutex_) = 0;
 };
 
-class VectorPicture final : public Picture {
-  public:
-    VectorPicture(Handle handle, Size size) : handle_(std::move(handle)), size_(size) {}
-
-    Size naturalSize() const override { return size_; }
-    bool isDrawable() const override { return true; }
-    std::optional<Bitmap> draw(int width, int height) const override VX_EXCLUDES(mutex_) {
-        if (auto kept = renderings_.find(width, height))
-            return kept;
-        auto bitmap = paint(width, height, size_, [this](cairo_t* context) { return render(context); });
-        if (bitmap)
-            renderings_.keep(*bitmap);
-        return bitmap;
-    }
-
-  private:
-    bool render(cairo_t* context) const VX_EXCLUDES(mutex_) {
-        const RsvgRectangle area{0, 0, size_.width, size_.height};
-        Locked lock(mutex_);
-        return rsvg_handle_render_document(handle_.get(), context, &area, nullptr);
-    }
-
-    mutable Mutex mutex_;
-    const Handle handle_ VX_GUARDED_BY(mutex_);  // even drawing changes its state
-    const Size size_;
-    mutable Renderings renderings_;
-};
-
 constexpr std::array<unsigned char, 8> pngSignature{0x89, 'P', 'N', 'G', '\r', '\n', 0x1a, '\n'};
 
 bool isPNG(Bytes data) {
@@ -148,20 +122,10 @@ std::optional<Bitmap> decodedPNG(Bytes data) {
     });
 }
 
-bool isCompressed(Bytes data) {
-    return data.size() >= 2 && data[0] == std::byte{0x1f} && data[1] == std::byte{0x8b};
-}
-
-bool declaresEntities(Bytes data) {
-    const std::string_view text(reinterpret_cast<const char*>(data.data()), data.size());
-    return text.find("<!ENTITY") != std::string_view::npos;
-}
-
 Handle parsedSVG(Bytes data) {
-    // A compressed picture could unfold to any size, and librsvg never frees the text of an entity. Data
-    // without a base location can load no other file.
-    if (data.empty() || isCompressed(data) || declaresEntities(data))
+    if (data.empty() || !isHarmlessVector(data))
         return nullptr;
+    // Data without a base location can load no other file.
     Handle handle(
         rsvg_handle_new_from_data(reinterpret_cast<const guint8*>(data.data()), data.size(), nullptr));
     if (handle)
@@ -179,6 +143,58 @@ Size sizeOf(RsvgHandle& handle) {
     rsvg_handle_get_intrinsic_dimensions(&handle, nullptr, nullptr, nullptr, nullptr, &hasViewBox, &viewBox);
     return hasViewBox ? Size{viewBox.width, viewBox.height} : Size{};
 }
+
+// An SVG, parsed when it is first needed: programs that only print names have icons and draw none.
+class VectorPicture final : public Picture {
+  public:
+    explicit VectorPicture(Bytes data) : data_(data.begin(), data.end()) {}
+
+    Size naturalSize() const override VX_EXCLUDES(mutex_) {
+        Locked lock(mutex_);
+        return document().size;
+    }
+    bool isDrawable() const override { return naturalSize() != Size{}; }
+    std::optional<Bitmap> draw(int width, int height) const override VX_EXCLUDES(mutex_) {
+        if (auto kept = renderings_.find(width, height))
+            return kept;
+        const Size size = naturalSize();
+        if (size == Size{})
+            return std::nullopt;
+        auto bitmap = paint(width, height, size, [&](cairo_t* context) { return render(context, size); });
+        if (bitmap)
+            renderings_.keep(*bitmap);
+        return bitmap;
+    }
+
+  private:
+    struct Document {
+        Handle handle;
+        Size size;  // nothing when it can't be drawn
+    };
+
+    const Document& document() const VX_REQUIRES(mutex_) {
+        if (!document_)
+            document_ = parsed(std::exchange(data_, {}));
+        return *document_;
+    }
+    static Document parsed(const std::vector<std::byte>& data) {
+        Handle handle = parsedSVG(data);
+        const Size size = handle ? sizeOf(*handle) : Size{};
+        if (!isDrawableSize(size.width, size.height))
+            return {};
+        return {std::move(handle), size};
+    }
+    bool render(cairo_t* context, Size size) const VX_EXCLUDES(mutex_) {
+        const RsvgRectangle area{0, 0, size.width, size.height};
+        Locked lock(mutex_);
+        return rsvg_handle_render_document(document().handle.get(), context, &area, nullptr);
+    }
+
+    mutable Mutex mutex_;
+    mutable std::vector<std::byte> data_ VX_GUARDED_BY(mutex_);
+    mutable std::optional<Document> document_ VX_GUARDED_BY(mutex_);  // even drawing changes its state
+    mutable Renderings renderings_;
+};
 
 cairo_status_t appendBytes(void* closure, const unsigned char* buffer, unsigned int count) try {
     auto& bytes = *static_cast<std::vector<std::byte>*>(closure);
@@ -202,11 +218,7 @@ std::shared_ptr<const Picture> pictureWithData(std::span<const std::byte> data) 
             return std::make_shared<BitmapPicture>(*std::move(bitmap));
         return std::make_shared<UndrawablePicture>();
     }
-    Handle handle = parsedSVG(data);
-    const Size size = handle ? sizeOf(*handle) : Size{};
-    if (!isDrawableSize(size.width, size.height))
-        return std::make_shared<UndrawablePicture>();
-    return std::make_shared<VectorPicture>(std::move(handle), size);
+    return std::make_shared<VectorPicture>(data);
 }
 
 std::shared_ptr<const Picture> pictureWithBitmap(Bitmap bitmap) {

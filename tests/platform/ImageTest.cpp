@@ -53,6 +53,16 @@ TEST(Image, TakesItsSizeFromThePicture) {
     EXPECT_EQ(Image(pictureOf(twoColours())).size(), (Size{4, 2}));
 }
 
+TEST(Image, KeepsItsSizeOnceItIsGivenOne) {
+    Image image(pictureOf(twoColours()));
+    image.setSize({});
+    EXPECT_EQ(image.size(), Size());
+}
+
+TEST(Image, WithoutAPictureHasNoSize) {
+    EXPECT_EQ(Image(nullptr).size(), Size());
+}
+
 TEST(Image, ACopyIsAnotherObjectWithTheSamePictureNameSizeAndFlag) {
     Image image(pictureOf(twoColours()), "two");
     image.setSize({16, 16});
@@ -83,6 +93,24 @@ TEST(Picture, SVGIsSizedInPointsByWidthAndHeight) {
     EXPECT_EQ(pictureOf(twoColours("width='32' height='16' viewBox='0 0 4 2'"))->naturalSize(),
               (Size{32, 16}));
     EXPECT_EQ(pictureOf(twoColours("width='1in' height='12px'"))->naturalSize(), (Size{96, 12}));
+}
+
+TEST(Picture, KeepsItsOwnBytes) {
+    std::string text = twoColours();
+    const auto picture = pictureOf(text);
+    text.assign(text.size(), ' ');
+    EXPECT_TRUE(picture->isDrawable());
+    EXPECT_EQ(picture->naturalSize(), (Size{4, 2}));
+}
+
+TEST(Picture, IsTheSameWhicheverThreadAsksFirst) {
+    const auto picture = pictureOf(twoColours());
+    std::vector<std::jthread> threads;
+    std::array<Size, 4> sizes;
+    for (Size& size : sizes)
+        threads.emplace_back([&] { size = picture->naturalSize(); });
+    threads.clear();
+    EXPECT_THAT(sizes, Each(Size{4, 2}));
 }
 
 TEST(Picture, SVGWithoutWidthAndHeightIsSizedByItsViewBox) {
