@@ -97,16 +97,19 @@ platform::ImageRef Bundle::iconNamed(std::string_view name) const {
 }
 
 std::shared_ptr<const platform::Picture> Bundle::pictureOfIcon(const std::string& name) const {
-    {
-        platform::Locked lock(iconsMutex_);
-        if (const auto known = icons_.find(name); known != icons_.end())
-            return known->second;
-    }
+    if (auto known = knownPicture(name); known && known->isDrawable())
+        return known;
     auto picture = platform::pictureWithContentsOfFile(path_ + "/Contents/Resources/Icons/" + name + ".svg");
-    if (!picture || !picture->isDrawable())
-        return picture;
+    if (!picture)
+        return nullptr;
     platform::Locked lock(iconsMutex_);
-    return icons_.emplace(name, std::move(picture)).first->second;
+    return icons_[name] = std::move(picture);
+}
+
+std::shared_ptr<const platform::Picture> Bundle::knownPicture(const std::string& name) const {
+    platform::Locked lock(iconsMutex_);
+    const auto known = icons_.find(name);
+    return known == icons_.end() ? nullptr : known->second;
 }
 
 const VXPrincipalClass* Bundle::principalClass(std::string& error) const {

@@ -42,6 +42,8 @@ class Bundle final : public VXBundle {
     std::string modulePath() const;
     std::shared_ptr<const platform::Picture> pictureOfIcon(const std::string& name) const
         VX_EXCLUDES(iconsMutex_);
+    std::shared_ptr<const platform::Picture> knownPicture(const std::string& name) const
+        VX_EXCLUDES(iconsMutex_);
 
     const std::string path_;
     const std::string identifier_;
@@ -49,7 +51,8 @@ class Bundle final : public VXBundle {
     const std::string principalClassName_;
     const BundleStrings strings_;
 
-    // What has been read and can be drawn; an icon that was missing or damaged is looked for again.
+    // What has been read. Whether it can be drawn is asked when an icon is wanted again; one that was missing
+    // or damaged is then looked for again.
     mutable platform::Mutex iconsMutex_;
     mutable std::map<std::string, std::shared_ptr<const platform::Picture>> icons_ VX_GUARDED_BY(iconsMutex_);
 };
