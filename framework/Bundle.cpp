@@ -3,6 +3,7 @@
 #include <dlfcn.h>
 #include <sys/stat.h>
 
+#include "framework/ModuleFile.h"
 #include "platform/FileManager.h"
 #include "platform/Path.h"
 #include "platform/PropertyList.h"
@@ -23,7 +24,8 @@ std::optional<std::string> text(const platform::Dictionary& descriptor, std::str
 }
 
 bool isFileName(const std::string& name) {
-    return name.find('/') == std::string::npos && name != "." && name != "..";
+    return name.find('/') == std::string::npos && name.find('\0') == std::string::npos && name != "." &&
+           name != "..";
 }
 
 // What is wrong with a bundle's descriptor; empty when nothing is.
@@ -113,6 +115,10 @@ std::shared_ptr<const platform::Picture> Bundle::knownPicture(const std::string&
 }
 
 const VXPrincipalClass* Bundle::principalClass(std::string& error) const {
+    if (const auto problem = problemOfModuleFile(modulePath())) {
+        error = "the code of '" + path_ + "' cannot be loaded: " + *problem;
+        return nullptr;
+    }
     void* module = dlopen(modulePath().c_str(), RTLD_NOW | RTLD_LOCAL | RTLD_NODELETE);
     if (!module) {
         error = "the code of '" + path_ + "' cannot be loaded: " + dlerror();
@@ -120,7 +126,11 @@ const VXPrincipalClass* Bundle::principalClass(std::string& error) const {
     }
     const auto function =
         reinterpret_cast<VXPluginPrincipalClassFunction>(dlsym(module, VXPluginPrincipalClassSymbol));
-    const VXPrincipalClass* principalClass = function ? function(principalClassName_.c_str()) : nullptr;
+    if (!function) {
+        error = "the code of '" + path_ + "' is no plug-in's: it exports no " + VXPluginPrincipalClassSymbol;
+        return nullptr;
+    }
+    const VXPrincipalClass* principalClass = function(principalClassName_.c_str());
     if (!principalClass)
         error = "the code of '" + path_ + "' has no principal class named '" + principalClassName_ + "'";
     return principalClass;

@@ -33,7 +33,11 @@ class Bundle final : public VXBundle {
     std::optional<std::string> localizedString(std::string_view key) const override;
     platform::ImageRef iconNamed(std::string_view name) const override VX_EXCLUDES(iconsMutex_);
 
-    // Loads the code; nil when that fails, and `error` says why. Callable from the main thread only.
+    // What is wrong with its texts; empty when nothing is. The keys that are concerned have no text.
+    const std::string& warning() const { return strings_.warning(); }
+
+    // Loads the code, unless its file is no module for this process; nil when that fails, and `error` says
+    // why. Callable from the main thread only.
     const VXPrincipalClass* principalClass(std::string& error) const;
 
   private:
