@@ -1,7 +1,6 @@
 #include "framework/PluginSearch.h"
 
 #include <dlfcn.h>
-#include <glib.h>
 
 #include <algorithm>
 #include <cstdlib>
@@ -10,6 +9,7 @@
 #include "platform/FileManager.h"
 #include "platform/Path.h"
 #include "platform/Services.h"
+#include "platform/linux/UserFolders.h"
 
 namespace vexo {
 namespace {
@@ -73,7 +73,8 @@ std::vector<std::string> pluginBundles(const std::vector<std::string>& explicitB
     const std::string buildTree = path::withoutLastComponent(library);
     if (platform::services().fileManager.fileExistsAtPath(path::appending(buildTree, "CMakeCache.txt")))
         appendBundlesIn(buildTree, bundles);
-    appendBundlesIn(path::appending(g_get_user_data_dir(), "vexo/plugins"), bundles);
+    if (const auto data = platform::userDataFolder())
+        appendBundlesIn(path::appending(*data, "vexo/plugins"), bundles);
     appendBundlesIn(path::appending(library, "vexo/plugins"), bundles);
     return bundles;
 }

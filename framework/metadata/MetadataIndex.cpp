@@ -9,9 +9,9 @@
 #include <filesystem>
 #include <utility>
 
-#include "framework/UserFolders.h"
 #include "platform/Path.h"
 #include "platform/linux/FileDescriptor.h"
+#include "platform/linux/UserFolders.h"
 
 namespace vexo {
 
@@ -76,7 +76,7 @@ MetadataIndex::~MetadataIndex() {
 }
 
 std::optional<std::string> MetadataIndex::defaultPath() {
-    if (const auto cache = userCacheFolder())
+    if (const auto cache = platform::userCacheFolder())
         return platform::path::appending(*cache, "vexo/metadata.sqlite");
     return std::nullopt;
 }

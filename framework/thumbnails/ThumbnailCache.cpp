@@ -9,10 +9,10 @@
 #include <cstdlib>
 #include <filesystem>
 
-#include "framework/UserFolders.h"
 #include "platform/Path.h"
 #include "platform/linux/FileDescriptor.h"
 #include "platform/linux/PlainFile.h"
+#include "platform/linux/UserFolders.h"
 
 namespace vexo {
 
@@ -100,7 +100,7 @@ ThumbnailSize thumbnailSizeFor(int side) {
 ThumbnailCache::ThumbnailCache(std::optional<std::string> folder) : folder_(std::move(folder)) {}
 
 std::optional<std::string> ThumbnailCache::defaultFolder() {
-    const auto cache = userCacheFolder();
+    const auto cache = platform::userCacheFolder();
     return cache ? std::optional(platform::path::appending(*cache, "thumbnails")) : std::nullopt;
 }
 

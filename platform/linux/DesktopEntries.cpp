@@ -10,8 +10,8 @@
 #include <tuple>
 
 #include "platform/Path.h"
-#include "platform/linux/LinuxFileManager.h"
 #include "platform/linux/PlainFile.h"
+#include "platform/linux/UserFolders.h"
 
 namespace platform {
 
@@ -86,9 +86,9 @@ std::optional<DesktopEntry> entryInFile(const std::string& identifier, const std
     return entry;
 }
 
-std::string environmentOr(const char* name, const std::string& fallback) {
+std::string textOfVariable(const char* name) {
     const char* const value = std::getenv(name);
-    return value && *value ? value : fallback;
+    return value ? value : "";
 }
 
 std::vector<std::string> absolutePathsIn(std::string_view list) {
@@ -158,11 +158,11 @@ std::vector<DesktopEntries::EntryFile> DesktopEntries::entryFiles() const {
 }
 
 std::vector<std::string> desktopDataFolders() {
-    const auto home = LinuxFileManager::userHomeDirectory().value_or("");
-    auto folders =
-        absolutePathsIn(environmentOr("XDG_DATA_HOME", home.empty() ? "" : home + "/.local/share"));
-    const auto system = absolutePathsIn(environmentOr("XDG_DATA_DIRS", "/usr/local/share:/usr/share"));
-    folders.insert(folders.end(), system.begin(), system.end());
+    auto folders = absolutePathsIn(textOfVariable("XDG_DATA_DIRS"));
+    if (folders.empty())
+        folders = {"/usr/local/share", "/usr/share"};
+    if (auto own = userDataFolder())
+        folders.insert(folders.begin(), *std::move(own));
     return folders;
 }
 

@@ -20,6 +20,7 @@
 #include <random>
 #include <thread>
 
+#include "platform/linux/LinuxFileManager.h"
 #include "tests/support/OrdinaryUser.h"
 #include "tests/support/TemporaryFolder.h"
 
@@ -702,6 +703,11 @@ TEST(MetadataIndex, LiesInTheUsersCacheFolder) {
     }
     const ScopedEnvironment cache("XDG_CACHE_HOME", nullptr);
     EXPECT_EQ(MetadataIndex::defaultPath(), "/home/kim/.cache/vexo/metadata.sqlite");
-    const ScopedEnvironment noHome("HOME", nullptr);
-    EXPECT_EQ(MetadataIndex::defaultPath(), std::nullopt);
+    // Then the home is that of the password database, as it is for libraries.
+    for (const char* const noHome : {static_cast<const char*>(nullptr), "", "relative"}) {
+        const ScopedEnvironment home("HOME", noHome);
+        const auto known = platform::LinuxFileManager::userHomeDirectory();
+        EXPECT_EQ(MetadataIndex::defaultPath(),
+                  known ? std::optional(*known + "/.cache/vexo/metadata.sqlite") : std::nullopt);
+    }
 }

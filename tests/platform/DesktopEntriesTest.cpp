@@ -156,3 +156,16 @@ TEST(DesktopDataFolders, HaveDefaults) {
     const ScopedEnvironment system("XDG_DATA_DIRS", "");
     EXPECT_THAT(desktopDataFolders(), ElementsAre("/home/me/.local/share", "/usr/local/share", "/usr/share"));
 }
+
+TEST(DesktopDataFolders, AreAbsolute) {
+    const ScopedEnvironment user("HOME", "/home/me");
+    const ScopedEnvironment home("XDG_DATA_HOME", "relative");
+    const ScopedEnvironment system("XDG_DATA_DIRS", "relative::./here:");
+    EXPECT_THAT(desktopDataFolders(), ElementsAre("/home/me/.local/share", "/usr/local/share", "/usr/share"));
+}
+
+TEST(DesktopDataFolders, TheUsersOwnIsOne) {
+    const ScopedEnvironment home("XDG_DATA_HOME", "/home/me:/home/you");
+    const ScopedEnvironment system("XDG_DATA_DIRS", "/usr/share");
+    EXPECT_THAT(desktopDataFolders(), ElementsAre("/home/me:/home/you", "/usr/share"));
+}
