@@ -1,21 +1,26 @@
 #include "framework/Diagnostics.h"
 
-#include <algorithm>
-
 #include "framework/HostServices.h"
 #include "host/VXLog.h"
 
 namespace vexo {
 
 void Diagnostics::warn(const std::string& warning) {
-    {
-        platform::Locked lock(mutex_);
-        if (std::find(warnings_.begin(), warnings_.end(), warning) != warnings_.end())
-            return;
-        warnings_.push_back(warning);
-    }
-    log_.log(warning);
-    observers_.notify(warning);
+    const std::optional<std::string> told = keep(warning);
+    if (!told)
+        return;
+    log_.log(*told);
+    observers_.notify(*told);
+}
+
+// A library in which everything is broken must not fill memory and log for ever.
+std::optional<std::string> Diagnostics::keep(const std::string& warning) {
+    platform::Locked lock(mutex_);
+    if (warnings_.size() > mostWarnings || !known_.insert(warning).second)
+        return std::nullopt;
+    const bool isOneTooMany = warnings_.size() == mostWarnings;
+    warnings_.push_back(isOneTooMany ? "there are more warnings, which are left out" : warning);
+    return warnings_.back();
 }
 
 std::vector<std::string> Diagnostics::warnings() const {
