@@ -155,14 +155,16 @@ std::optional<std::string> Host::loadPlugin(const std::string& bundlePath) {
     if (known)
         return std::nullopt;
 
-    std::string error;
-    const VXPrincipalClass* principalClass = opened.bundle->principalClass(error);
+    if (const std::string& warning = opened.bundle->warning(); !warning.empty())
+        state_->diagnostics.warn(warning);
+    std::string error = "the plug-in '" + bundlePath + "' could not be initialised";
+    const auto principalClass = guardedAnswer([&] { return opened.bundle->principalClass(error); });
     if (!principalClass)
         return error;
-    std::shared_ptr<VXMediaManager> manager;
-    runGuarded([&] { manager = principalClass->newObject(opened.bundle); });
+    std::shared_ptr<VXMediaManager> manager =
+        guardedAnswer([&] { return principalClass->newObject(opened.bundle); });
     if (!manager)
-        return "the plug-in '" + bundlePath + "' could not be initialised";
+        return error;
     if (state_->prefetcher)
         manager->addTreeObserver(
             state_->prefetcher,

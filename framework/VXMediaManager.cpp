@@ -99,10 +99,11 @@ void VXMediaManager::runLoads() {
 
 // A tree from a load that was cancelled or failed is dropped, so that the last good one stays.
 void VXMediaManager::loadOnce() {
-    VXMediaGroupRef root;
-    runGuarded([this, &root] { root = performLoadData(); });
-    if (root && !state_->cancelPending)
-        setRootMediaGroup(root);
+    runGuarded([this] {
+        const VXMediaGroupRef root = performLoadData();
+        if (root && !state_->cancelPending)
+            setRootMediaGroup(root);
+    });
 }
 
 bool VXMediaManager::firstTimeCallingLoadData() const {

@@ -2,6 +2,7 @@
 
 #include "apps/vexo/Commands.h"
 #include "apps/vexo/Json.h"
+#include "apps/vexo/PluginIdentity.h"
 #include "apps/vexo/Terminal.h"
 #include "framework/metadata/MediaReader.h"
 
@@ -9,18 +10,18 @@ namespace vexo {
 namespace {
 
 Json jsonPlugin(const LoadedPlugin& plugin) {
-    VXMediaManager& manager = *plugin.manager;
+    const PluginIdentity identity = identityOf(plugin);
     return {{"bundle", jsonText(plugin.bundle->path())},
             {"identifier", jsonText(plugin.bundle->identifier())},
-            {"title", jsonText(manager.rootMediaGroupTitle())},
-            {"uniqueID", jsonText(manager.uniqueID())},
-            {"mediaTypesSupported", manager.mediaTypesSupported()},
-            {"managedMediaSource", plugin.principalClass->isManagedMediaSource()},
+            {"title", jsonText(identity.title)},
+            {"uniqueID", jsonText(identity.uniqueID)},
+            {"mediaTypesSupported", identity.mediaTypesSupported},
+            {"managedMediaSource", identity.isManagedMediaSource},
             {"version", plugin.principalClass->versionNumber},
             {"versionString", jsonText(plugin.principalClass->versionString)},
-            {"supportedPasteboardTypes", jsonValue(plugin.principalClass->supportedPasteboardTypes())},
-            {"canLoadData", manager.canLoadData()},
-            {"appInstalled", manager.appInstalled()}};
+            {"supportedPasteboardTypes", jsonValue(identity.supportedPasteboardTypes)},
+            {"canLoadData", identity.canLoadData},
+            {"appInstalled", identity.appInstalled}};
 }
 
 Json jsonMediaReader(Host& host) {
@@ -57,13 +58,13 @@ void printMediaReader(Host& host, std::ostream& out) {
 void printText(Host& host, const InfoOptions& options, std::ostream& out) {
     const OutputStyle style = OutputStyle::ofStandardOutput();
     for (const LoadedPlugin& plugin : host.plugins()) {
-        VXMediaManager& manager = *plugin.manager;
-        out << style.bold(printable(manager.rootMediaGroupTitle())) << " "
-            << plugin.principalClass->versionNumber << "  " << printable(manager.uniqueID()) << "\n"
+        const PluginIdentity identity = identityOf(plugin);
+        out << style.bold(printable(identity.title)) << " " << plugin.principalClass->versionNumber << "  "
+            << printable(identity.uniqueID) << "\n"
             << "  bundle       " << printable(plugin.bundle->path()) << "\n"
             << "  identifier   " << printable(plugin.bundle->identifier()) << "\n"
-            << "  application  " << (manager.appInstalled() ? "installed" : "not installed") << "\n"
-            << "  can load     " << yesOrNo(manager.canLoadData()) << "\n";
+            << "  application  " << (identity.appInstalled ? "installed" : "not installed") << "\n"
+            << "  can load     " << yesOrNo(identity.canLoadData) << "\n";
     }
     out << "Suite preferences  " << printable(host.suitePreferencesPath()) << "\n"
         << "User defaults      " << printable(host.userDefaultsPath()) << "\n"

@@ -77,7 +77,7 @@ Json JsonTreeWriter::groupAlone(const VXMediaGroupRef& group) {
 
 Json JsonTreeWriter::mediaGroups() {
     Json groups = Json::array();
-    for (const VXMediaGroupRef& group : manager_.mediaGroups())
+    for (const VXMediaGroupRef& group : guardedAnswer([&] { return manager_.mediaGroups(); }))
         groups.push_back(groupAlone(group));
     return groups;
 }
@@ -127,9 +127,7 @@ Json JsonTreeWriter::image(const platform::ImageRef& image) {
 }
 
 std::optional<std::string> noDataMessage(VXMediaManager& manager, const VXMediaGroupRef& group) {
-    std::optional<std::string> message;
-    runGuarded([&] { message = manager.defaultNoDataMessage(group); });
-    return message;
+    return guardedAnswer([&] { return manager.defaultNoDataMessage(group); });
 }
 
 }  // namespace vexo

@@ -2,6 +2,7 @@
 #include "apps/vexo/Json.h"
 #include "apps/vexo/Progress.h"
 #include "apps/vexo/Terminal.h"
+#include "framework/GuardedWork.h"
 #include "framework/pathwatcher/PathWatcher.h"
 #include "framework/pathwatcher/WatchLimits.h"
 #include "platform/FileManager.h"
@@ -28,7 +29,8 @@ Location locate(const std::string& path, const PathWatcher& watcher) {
 std::vector<Location> locationsOf(Host& host, std::string_view kind) {
     std::vector<Location> locations;
     for (const LoadedPlugin& plugin : host.plugins()) {
-        for (const VXLibraryLocations& library : plugin.manager->libraryLocations()) {
+        for (const VXLibraryLocations& library :
+             guardedAnswer([&] { return plugin.manager->libraryLocations(); })) {
             if (library.kind != kind)
                 continue;
             for (const std::string& path : library.paths)

@@ -8,6 +8,7 @@
 #include "apps/vexo/Progress.h"
 #include "apps/vexo/Terminal.h"
 #include "apps/vexo/TreeLookup.h"
+#include "framework/GuardedWork.h"
 #include "platform/Services.h"
 #include "platform/ThreadSafety.h"
 #include "platform/Workspace.h"
@@ -19,27 +20,39 @@ using platform::Locked;
 using platform::Menu;
 using platform::MenuItem;
 
+using MenuRef = std::shared_ptr<Menu>;  // nil where the plug-in has none
+
 // The menu of an item or a group.
 struct AskedMenu {
-    std::shared_ptr<Menu> menu;  // nil where the plug-in has none
+    MenuRef menu;
     std::shared_ptr<const void> askedFor;
     std::optional<std::string> id;
 };
+
+constexpr const char* noAnswer = "the plug-in could not say what can be done";
 
 std::variant<AskedMenu, std::string> menuOfObject(const TreeLookup& lookup, const std::string& id) {
     const FoundObject* const found = lookup.objectWithID(id);
     if (!found)
         return TreeLookup::noObjectProblem(id);
-    return AskedMenu{found->manager->contextMenuForMediaObject(found->mediaObject, found->mediaGroup),
-                     found->mediaObject, found->mediaObject->ID()};
+    MenuRef menu;
+    const bool isAnswered = runGuarded(
+        [&] { menu = found->manager->contextMenuForMediaObject(found->mediaObject, found->mediaGroup); });
+    if (!isAnswered)
+        return noAnswer;
+    return AskedMenu{std::move(menu), found->mediaObject, found->mediaObject->ID()};
 }
 
 std::variant<AskedMenu, std::string> menuOfGroup(const TreeLookup& lookup, const std::string& id) {
     const FoundGroup* const found = lookup.groupWithID(id);
     if (!found)
         return TreeLookup::noGroupProblem(id);
-    return AskedMenu{found->manager->contextMenuForMediaGroup(found->mediaGroup), found->mediaGroup,
-                     found->mediaGroup->ID()};
+    MenuRef menu;
+    const bool isAnswered =
+        runGuarded([&] { menu = found->manager->contextMenuForMediaGroup(found->mediaGroup); });
+    if (!isAnswered)
+        return noAnswer;
+    return AskedMenu{std::move(menu), found->mediaGroup, found->mediaGroup->ID()};
 }
 
 Json jsonItem(const MenuItem& item, const AskedMenu& asked) {
@@ -124,7 +137,8 @@ std::string reasonForNothing(const MenuItem& item) {
 
 Problems perform(const MenuItem& item) {
     const auto outcome = observedOutcome();
-    item.perform(item);
+    if (!runGuarded([&] { item.perform(item); }))
+        return {"'" + item.title + "' failed"};
     MainLoop().runPending();
     platform::services().workspace.waitUntilLaunched();
     if (!outcome->acted())

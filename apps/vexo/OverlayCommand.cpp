@@ -8,6 +8,7 @@
 #include "apps/vexo/OutputFile.h"
 #include "apps/vexo/Progress.h"
 #include "apps/vexo/TreeLookup.h"
+#include "framework/GuardedWork.h"
 
 namespace vexo {
 namespace {
@@ -30,12 +31,16 @@ Problems runOverlay(Host& host, const OverlayOptions& options) {
     const FoundObject* const found = lookup.objectWithID(options.object);
     if (!found)
         return {TreeLookup::noObjectProblem(options.object)};
-    const platform::ImageRef overlay =
-        found->manager->thumbnailOverlayForMediaObject(found->mediaObject, {found->mediaGroup}, options.size);
+    const platform::ImageRef overlay = guardedAnswer([&] {
+        return found->manager->thumbnailOverlayForMediaObject(found->mediaObject, {found->mediaGroup},
+                                                              options.size);
+    });
     if (!overlay)
         return {"the item has no overlay at " + text(options.size) + " points; no file was written"};
-    const auto bitmap = overlay->picture()->draw(pixels(options.size.width, options.scale),
-                                                 pixels(options.size.height, options.scale));
+    const auto bitmap = guardedAnswer([&] {
+        return overlay->picture()->draw(pixels(options.size.width, options.scale),
+                                        pixels(options.size.height, options.scale));
+    });
     const std::vector<std::byte> png = bitmap ? platform::pngData(*bitmap) : std::vector<std::byte>();
     if (png.empty())
         return {fmt::format("an overlay of {} points at scale {} cannot be drawn; try a smaller one",

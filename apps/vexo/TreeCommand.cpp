@@ -1,5 +1,6 @@
 #include "apps/vexo/Commands.h"
 #include "apps/vexo/Json.h"
+#include "apps/vexo/PluginIdentity.h"
 #include "apps/vexo/Progress.h"
 #include "apps/vexo/Terminal.h"
 #include "apps/vexo/TextTree.h"
@@ -9,15 +10,16 @@ namespace {
 
 Json jsonPlugin(const LoadedPlugin& plugin, const TreeOptions& options) {
     VXMediaManager& manager = *plugin.manager;
+    const PluginIdentity identity = identityOf(plugin);
     JsonTreeWriter writer(manager, options.withMetadata ? MetadataOutput::include : MetadataOutput::leaveOut);
     const VXMediaGroupRef root = manager.rootMediaGroup();
-    Json json{{"title", jsonText(manager.rootMediaGroupTitle())},
-              {"uniqueID", jsonText(manager.uniqueID())},
-              {"mediaTypesSupported", manager.mediaTypesSupported()},
-              {"managedMediaSource", plugin.principalClass->isManagedMediaSource()},
+    Json json{{"title", jsonText(identity.title)},
+              {"uniqueID", jsonText(identity.uniqueID)},
+              {"mediaTypesSupported", identity.mediaTypesSupported},
+              {"managedMediaSource", identity.isManagedMediaSource},
               {"version", plugin.principalClass->versionNumber},
-              {"canLoadData", manager.canLoadData()},
-              {"appInstalled", manager.appInstalled()},
+              {"canLoadData", identity.canLoadData},
+              {"appInstalled", identity.appInstalled},
               {"defaultNoDataMessage", jsonText(noDataMessage(manager, root))},
               {"root", root ? writer.group(root, options.depth) : Json()}};
     json["mediaGroups"] = writer.mediaGroups();
@@ -42,6 +44,15 @@ void printText(Host& host, const TreeOptions& options, std::ostream& out) {
     }
 }
 
+// Why it has no tree is among the warnings.
+Problems pluginsWithoutTree(const Host& host) {
+    Problems problems;
+    for (const LoadedPlugin& plugin : host.plugins())
+        if (!plugin.manager->rootMediaGroup())
+            problems.push_back("the plug-in '" + plugin.bundle->path() + "' could not read the libraries");
+    return problems;
+}
+
 }  // namespace
 
 Problems runTree(Host& host, const TreeOptions& options, std::ostream& out) {
@@ -52,7 +63,7 @@ Problems runTree(Host& host, const TreeOptions& options, std::ostream& out) {
         printJson(host, options, out);
     else
         printText(host, options, out);
-    return {};
+    return pluginsWithoutTree(host);
 }
 
 }  // namespace vexo

@@ -9,6 +9,7 @@
 #include "apps/vexo/MainThread.h"
 #include "apps/vexo/Progress.h"
 #include "apps/vexo/TextTree.h"
+#include "framework/GuardedWork.h"
 #include "framework/pathwatcher/PathWatcher.h"
 
 namespace vexo {
@@ -49,7 +50,7 @@ class WatchPrinter {
         JsonTreeWriter& writer =
             writers_.try_emplace(&manager, manager, MetadataOutput::leaveOut).first->second;
         Json json = event("root");
-        json["plugin"] = jsonText(manager.uniqueID());
+        json["plugin"] = jsonText(guardedAnswer([&] { return manager.uniqueID(); }));
         json["root"] = root ? writer.group(root, /*depth=*/std::nullopt) : Json();
         json["mediaGroups"] = writer.mediaGroups();
         return json;

@@ -10,6 +10,8 @@ int main(int argc, char** argv) {
         return vexo::runCommandLine(argc, argv);
     } catch (const std::exception& error) {
         std::cerr << "vexo: " << error.what() << "\n";
-        return 1;
+    } catch (...) {
+        std::cerr << "vexo: failed for an unknown reason\n";
     }
+    return 1;
 }
