@@ -40,8 +40,8 @@ class LandlockTest : public testing::Test {
             GTEST_SKIP() << "this kernel has no Landlock";
     }
     int errorOfOpening(const std::string& path, int flags) const {
-        const FileDescriptor file(open(path.c_str(), flags | O_CLOEXEC, 0600));
-        return errorOf(file.number());
+        const FileDescriptor opened(open(path.c_str(), flags | O_CLOEXEC, 0600));
+        return errorOf(opened.number());
     }
 
     const testing_support::TemporaryFolder folder;
