@@ -9,6 +9,7 @@
 #include "platform/linux/AppleDouble.h"
 #include "platform/linux/FileByteSource.h"
 #include "platform/linux/FileStatus.h"
+#include "platform/linux/Uninterrupted.h"
 
 namespace platform {
 
@@ -16,7 +17,8 @@ namespace {
 
 // The size of the value, or the negative errno.
 std::ptrdiff_t attributeOfFile(const std::string& path, const std::string& name, std::span<char> buffer) {
-    const auto size = getxattr(path.c_str(), name.c_str(), buffer.data(), buffer.size());
+    const auto size =
+        uninterrupted([&] { return getxattr(path.c_str(), name.c_str(), buffer.data(), buffer.size()); });
     return size >= 0 ? size : -errno;
 }
 
@@ -62,7 +64,8 @@ bool isUsualForAttributes(int error) {
 }
 
 std::optional<std::string> canonicalPath(const std::string& path) {
-    const std::unique_ptr<char, decltype(&free)> resolved(realpath(path.c_str(), nullptr), &free);
+    const std::unique_ptr<char, decltype(&free)> resolved(
+        uninterrupted([&] { return realpath(path.c_str(), nullptr); }), &free);
     return resolved ? std::optional<std::string>(resolved.get()) : std::nullopt;
 }
 

@@ -6,6 +6,7 @@
 
 #include "platform/FileManager.h"
 #include "platform/Path.h"
+#include "platform/linux/Uninterrupted.h"
 
 namespace platform {
 
@@ -19,7 +20,10 @@ double seconds(const statx_timestamp& time) {
 
 std::optional<struct statx> statusOfFile(int folder, const char* path, int flags) {
     struct statx status {};
-    if (statx(folder, path, flags | AT_NO_AUTOMOUNT, STATX_BASIC_STATS | STATX_BTIME, &status) != 0)
+    const int result = uninterrupted([&] {
+        return statx(folder, path, flags | AT_NO_AUTOMOUNT, STATX_BASIC_STATS | STATX_BTIME, &status);
+    });
+    if (result != 0)
         return std::nullopt;
     return status;
 }

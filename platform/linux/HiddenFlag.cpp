@@ -12,6 +12,7 @@
 #include <optional>
 
 #include "platform/linux/FileDescriptor.h"
+#include "platform/linux/Uninterrupted.h"
 
 namespace platform {
 
@@ -43,7 +44,7 @@ std::optional<std::uint32_t> ntfsAttributes(const std::string& path) {
 
 bool hasHiddenFlag(const std::string& path) {
     struct statfs fileSystem {};
-    if (statfs(path.c_str(), &fileSystem) != 0)
+    if (uninterrupted([&] { return statfs(path.c_str(), &fileSystem); }) != 0)
         return false;
     switch (static_cast<std::uint32_t>(fileSystem.f_type)) {
         case fatMagic:

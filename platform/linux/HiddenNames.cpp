@@ -7,6 +7,7 @@
 
 #include "platform/Path.h"
 #include "platform/linux/PlainFile.h"
+#include "platform/linux/Uninterrupted.h"
 
 namespace platform {
 
@@ -44,17 +45,21 @@ bool HiddenNames::contains(const std::string& folder, std::string_view name) con
 std::shared_ptr<const NameSet> HiddenNames::ofFolder(const std::string& folder) const {
     const std::string path = path::appending(folder, ".hidden");
     struct statx status {};
-    if (statx(AT_FDCWD, path.c_str(), AT_NO_AUTOMOUNT, STATX_BASIC_STATS, &status) != 0)
+    const int result = uninterrupted(
+        [&] { return statx(AT_FDCWD, path.c_str(), AT_NO_AUTOMOUNT, STATX_BASIC_STATS, &status); });
+    if (result != 0)
         return nullptr;
     const Version version{std::uint64_t{status.stx_dev_major} << 32 | status.stx_dev_minor, status.stx_ino,
                           status.stx_size, status.stx_ctime.tv_sec, status.stx_ctime.tv_nsec};
-    auto names = keptNames(folder, version);
-    if (!names) {
-        names = std::make_shared<const NameSet>(
-            namesInHiddenFile(beginningOfPlainFile(path, largestHiddenFile).value_or("")));
-        if (!wasChangedJustNow(version.seconds))
-            keep(folder, {version, names});
-    }
+    if (auto names = keptNames(folder, version))
+        return names;
+    // One that can't be read now may be readable the next time.
+    const auto content = beginningOfPlainFile(path, largestHiddenFile);
+    if (!content)
+        return nullptr;
+    auto names = std::make_shared<const NameSet>(namesInHiddenFile(*content));
+    if (!wasChangedJustNow(version.seconds))
+        keep(folder, {version, names});
     return names;
 }
 

@@ -18,6 +18,7 @@
 #include "platform/linux/FileSystemTypes.h"
 #include "platform/linux/HiddenFlag.h"
 #include "platform/linux/LogText.h"
+#include "platform/linux/Uninterrupted.h"
 
 namespace platform {
 
@@ -151,7 +152,7 @@ std::optional<std::string> LinuxFileManager::fileSystemTypeNameAtPath(const std:
     struct statfs fileSystem {};
     if (!real)
         return std::nullopt;
-    if (statfs(real->c_str(), &fileSystem) != 0) {
+    if (uninterrupted([&] { return statfs(real->c_str(), &fileSystem); }) != 0) {
         if (!meansMissing(errno))
             logFailure("tell the file system of", *real, errno);
         return std::nullopt;
@@ -178,7 +179,8 @@ std::optional<std::string> LinuxFileManager::resolvedPath(const std::string& pat
     const auto nameEnd = std::min(path.find('/', volumesPrefix_.size()), path.size());
     const std::string name = path.substr(volumesPrefix_.size(), nameEnd - volumesPrefix_.size());
     struct stat status {};
-    if (name.empty() || name == "." || name == ".." || lstat((volumesPrefix_ + name).c_str(), &status) == 0)
+    if (name.empty() || name == "." || name == ".." ||
+        uninterrupted([&] { return lstat((volumesPrefix_ + name).c_str(), &status); }) == 0)
         return path;
     const auto mountPoint = mountPointOfVolume(name);
     if (!mountPoint)

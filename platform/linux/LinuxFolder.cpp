@@ -13,6 +13,7 @@
 #include "platform/linux/FileStatus.h"
 #include "platform/linux/HiddenFlag.h"
 #include "platform/linux/LogText.h"
+#include "platform/linux/Uninterrupted.h"
 
 namespace platform {
 
@@ -26,8 +27,7 @@ bool isDotOrDotDot(const char* name) {
 std::optional<std::vector<std::string>> readNames(DIR* folder) {
     std::vector<std::string> names;
     for (;;) {
-        errno = 0;
-        const dirent* const entry = readdir(folder);
+        const dirent* const entry = uninterrupted([folder] { return readdir(folder); });
         if (!entry)
             break;
         if (!isDotOrDotDot(entry->d_name))
@@ -55,7 +55,7 @@ std::optional<std::uint64_t> deviceOf(DIR* folder) {
 }  // namespace
 
 std::optional<FolderListing> FolderListing::open(const std::string& path) {
-    std::unique_ptr<DIR, Closer> folder(opendir(path.c_str()));
+    std::unique_ptr<DIR, Closer> folder(uninterrupted([&] { return opendir(path.c_str()); }));
     if (!folder)
         return std::nullopt;
     auto names = readNames(folder.get());

@@ -6,6 +6,8 @@
 #include <algorithm>
 #include <cerrno>
 
+#include "platform/linux/Uninterrupted.h"
+
 namespace platform {
 
 namespace {
@@ -29,14 +31,15 @@ int reasonNotToOpen(const struct stat& status) {
 // which O_NONBLOCK keeps from blocking.
 PlainFile PlainFile::open(const std::string& path) {
     struct stat status {};
-    if (stat(path.c_str(), &status) != 0)
+    if (uninterrupted([&] { return stat(path.c_str(), &status); }) != 0)
         return failure(errno);
     if (const int reason = reasonNotToOpen(status))
         return failure(reason);
 
     PlainFile file;
-    file.descriptor = FileDescriptor(::open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
-    if (!file || fstat(file.descriptor.number(), &status) != 0)
+    file.descriptor = FileDescriptor(
+        uninterrupted([&] { return ::open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC); }));
+    if (!file || uninterrupted([&] { return fstat(file.descriptor.number(), &status); }) != 0)
         return failure(errno);
     if (const int reason = reasonNotToOpen(status))
         return failure(reason);
@@ -48,13 +51,14 @@ std::ptrdiff_t readAt(const FileDescriptor& file, std::uint64_t offset, std::byt
                       std::size_t length) {
     std::size_t done = 0;
     while (done < length) {
-        const auto count =
-            pread(file.number(), buffer + done, length - done, static_cast<off_t>(offset + done));
+        const auto count = uninterrupted([&] {
+            return pread(file.number(), buffer + done, length - done, static_cast<off_t>(offset + done));
+        });
+        if (count < 0)
+            return -1;
         if (count == 0)
             break;
-        if (count < 0 && errno != EINTR)
-            return -1;
-        done += static_cast<std::size_t>(std::max<std::ptrdiff_t>(count, 0));
+        done += static_cast<std::size_t>(count);
     }
     return static_cast<std::ptrdiff_t>(done);
 }
