@@ -1,10 +1,14 @@
-// What an overlay costs, made and drawn, beside what its shapes cost with Cairo alone.
+// What an overlay costs, made and drawn, beside what its shapes cost with Cairo alone, and beside a peer that
+// draws the same and has Pango lay out each text anew.
 //
 // The list imitated is one of a project library while it scrolls: thumbnails of 160 x 120 points, whose
 // movies last from one to some minutes.
 #include <benchmark/benchmark.h>
+#include <fmt/format.h>
 #include <pango/pangocairo.h>
 
+#include <functional>
+#include <memory>
 #include <stdexcept>
 
 #include "benchmarks/Surroundings.h"
@@ -21,57 +25,96 @@ double microseconds(std::chrono::nanoseconds time) {
     return std::chrono::duration<double, std::micro>(time).count();
 }
 
-// The floor: one layout, one icon, both ready to be drawn.
-class BareOverlay {
+struct Release {
+    void operator()(gpointer object) const { g_object_unref(object); }
+    void operator()(PangoFontDescription* font) const { pango_font_description_free(font); }
+    void operator()(cairo_surface_t* surface) const { cairo_surface_destroy(surface); }
+    void operator()(cairo_t* context) const { cairo_destroy(context); }
+};
+template <typename T>
+using Owned = std::unique_ptr<T, Release>;
+
+// The shapes of an overlay, the icon ready to be drawn.
+class BareShapes {
   public:
-    explicit BareOverlay(const platform::Picture& icon)
+    explicit BareShapes(const platform::Picture& icon)
         : iconPixels_(icon.draw(iconSide, iconSide).value()),
-          layout_(pango_layout_new(context_)),
           icon_(
               cairo_image_surface_create_for_data(reinterpret_cast<unsigned char*>(iconPixels_.pixels.data()),
-                                                  CAIRO_FORMAT_ARGB32, iconSide, iconSide, iconSide * 4)) {
-        PangoFontDescription* font = pango_font_description_from_string("sans-serif bold 10px");
-        pango_layout_set_font_description(layout_, font);
-        pango_font_description_free(font);
-        pango_layout_set_text(layout_, "2:05", -1);
-        pango_layout_get_size(layout_, &textWidth_, &textHeight_);
-    }
-    ~BareOverlay() {
-        cairo_surface_destroy(icon_);
-        g_object_unref(layout_);
-        g_object_unref(context_);
-    }
-    BareOverlay(const BareOverlay&) = delete;
-    BareOverlay& operator=(const BareOverlay&) = delete;
+                                                  CAIRO_FORMAT_ARGB32, iconSide, iconSide, iconSide * 4)) {}
 
-    std::vector<std::uint32_t> draw() const {
+    template <typename DrawText>
+    std::vector<std::uint32_t> draw(const DrawText& drawText) const {
         std::vector<std::uint32_t> pixels(std::size_t(width) * height);
-        cairo_surface_t* surface = cairo_image_surface_create_for_data(
-            reinterpret_cast<unsigned char*>(pixels.data()), CAIRO_FORMAT_ARGB32, width, height, width * 4);
-        cairo_t* context = cairo_create(surface);
-        cairo_set_source_rgba(context, 0, 0, 0, 0.5);
-        cairo_set_operator(context, CAIRO_OPERATOR_SOURCE);  // the quicker one
-        cairo_rectangle(context, 0, height - bandHeight, width, bandHeight);
-        cairo_fill(context);
-        cairo_set_operator(context, CAIRO_OPERATOR_OVER);
-        cairo_set_source_surface(context, icon_, 2, height - iconSide + 1);
-        cairo_paint(context);
-        cairo_set_source_rgb(context, 1, 1, 1);
-        cairo_move_to(
-            context, width - 3 - textWidth_ / double(PANGO_SCALE),
-            height + 0.5 - (textHeight_ - pango_layout_get_baseline(layout_)) / double(PANGO_SCALE));
-        pango_cairo_show_layout_line(context, pango_layout_get_line_readonly(layout_, 0));
-        cairo_destroy(context);
-        cairo_surface_destroy(surface);
+        const Owned<cairo_surface_t> surface(cairo_image_surface_create_for_data(
+            reinterpret_cast<unsigned char*>(pixels.data()), CAIRO_FORMAT_ARGB32, width, height, width * 4));
+        const Owned<cairo_t> context(cairo_create(surface.get()));
+        cairo_set_source_rgba(context.get(), 0, 0, 0, 0.5);
+        cairo_set_operator(context.get(), CAIRO_OPERATOR_SOURCE);  // the quicker one
+        cairo_rectangle(context.get(), 0, height - bandHeight, width, bandHeight);
+        cairo_fill(context.get());
+        cairo_set_operator(context.get(), CAIRO_OPERATOR_OVER);
+        cairo_set_source_surface(context.get(), icon_.get(), 2, height - iconSide + 1);
+        cairo_paint(context.get());
+        cairo_set_source_rgb(context.get(), 1, 1, 1);
+        drawText(context.get());
         return pixels;
     }
 
   private:
     platform::Bitmap iconPixels_;
-    PangoContext* const context_ = pango_font_map_create_context(pango_cairo_font_map_get_default());
-    PangoLayout* const layout_;
-    cairo_surface_t* const icon_;
-    int textWidth_ = 0, textHeight_ = 0;
+    const Owned<cairo_surface_t> icon_;
+};
+
+// A text as Pango lays it out in the lower right corner.
+class PangoText {
+  public:
+    PangoText(PangoContext* context, const std::string& text) : layout_(pango_layout_new(context)) {
+        const Owned<PangoFontDescription> font(pango_font_description_from_string("sans-serif bold 10px"));
+        pango_layout_set_font_description(layout_.get(), font.get());
+        pango_layout_set_text(layout_.get(), text.data(), static_cast<int>(text.size()));
+        int textWidth = 0, textHeight = 0;
+        pango_layout_get_size(layout_.get(), &textWidth, &textHeight);
+        left_ = width - 3 - textWidth / double(PANGO_SCALE);
+        baseline_ =
+            height + 0.5 - (textHeight - pango_layout_get_baseline(layout_.get())) / double(PANGO_SCALE);
+    }
+
+    void draw(cairo_t* context) const {
+        cairo_move_to(context, left_, baseline_);
+        pango_cairo_show_layout_line(context, pango_layout_get_line_readonly(layout_.get(), 0));
+    }
+
+  private:
+    friend class ReadyGlyphs;
+
+    const Owned<PangoLayout> layout_;
+    double left_, baseline_;
+};
+
+// The same without Pango: the quickest way to draw a text again.
+class ReadyGlyphs {
+  public:
+    ReadyGlyphs(PangoContext* context, const std::string& text) : text_(context, text) {
+        const auto& run = *static_cast<const PangoLayoutRun*>(
+            pango_layout_get_line_readonly(text_.layout_.get(), 0)->runs->data);
+        font_ = pango_cairo_font_get_scaled_font(PANGO_CAIRO_FONT(run.item->analysis.font));
+        double left = text_.left_;
+        for (int i = 0; i < run.glyphs->num_glyphs; ++i) {
+            glyphs_.push_back({run.glyphs->glyphs[i].glyph, left, text_.baseline_});
+            left += run.glyphs->glyphs[i].geometry.width / double(PANGO_SCALE);
+        }
+    }
+
+    void draw(cairo_t* context) const {
+        cairo_set_scaled_font(context, font_);
+        cairo_show_glyphs(context, glyphs_.data(), static_cast<int>(glyphs_.size()));
+    }
+
+  private:
+    const PangoText text_;  // keeps the font
+    cairo_scaled_font_t* font_;
+    std::vector<cairo_glyph_t> glyphs_;
 };
 
 int whitePixelsOnTheRight(const std::vector<std::uint32_t>& pixels) {
@@ -130,34 +173,52 @@ class LoadedPlugin {
     vexo::Host host_;
 };
 
+std::chrono::nanoseconds timeOf(const std::function<void()>& work) {
+    const auto start = bench::processorTimeOfThread();
+    work();
+    return bench::processorTimeOfThread() - start;
+}
+
 // Makes and draws the overlays of a list again and again, as scrolling does. Processor time, which is less
 // disturbed by what else runs.
 void MakeAndDrawOverlays(benchmark::State& state) {
     const LoadedPlugin plugin;
-    const BareOverlay bare(*plugin.manager().iconNamed("MBReelixAppIconSmall")->picture());
-    if (!areAlike(bare.draw(), plugin.overlay(plugin.movie(125))))
-        return state.SkipWithError("the overlay is not what the floor draws");
+    const BareShapes shapes(*plugin.manager().iconNamed("MBReelixAppIconSmall")->picture());
+    const Owned<PangoContext> context(pango_font_map_create_context(pango_cairo_font_map_get_default()));
+    const ReadyGlyphs glyphs(context.get(), "2:05");
+    const auto drawBarely = [&] { return shapes.draw([&](cairo_t* cairo) { glyphs.draw(cairo); }); };
+    const auto drawWithPango = [&](const std::string& text) {
+        return shapes.draw([&](cairo_t* cairo) { PangoText(context.get(), text).draw(cairo); });
+    };
+    const auto expected = plugin.overlay(plugin.movie(125));
+    if (!areAlike(drawBarely(), expected) || !areAlike(drawWithPango("2:05"), expected))
+        return state.SkipWithError("the overlay is not what the others draw");
     std::vector<vexo::VXMediaObjectRef> movies;
     for (int i = 0; i < durations; ++i)
         movies.push_back(plugin.movie(60 + 3 * i));
 
-    std::chrono::nanoseconds time{}, floorTime{};
+    std::chrono::nanoseconds time{}, floor{}, pango{};
     for (auto _ : state) {
-        const auto floorStart = bench::processorTimeOfThread();
-        for (int i = 0; i < durations; ++i)
-            benchmark::DoNotOptimize(bare.draw());
-        const auto start = bench::processorTimeOfThread();
-        for (const auto& movie : movies)
-            benchmark::DoNotOptimize(plugin.overlay(movie));
-        const auto end = bench::processorTimeOfThread();
-        state.SetIterationTime(std::chrono::duration<double>(end - start).count());
-        time += end - start;
-        floorTime += start - floorStart;
+        floor += timeOf([&] {
+            for (int i = 0; i < durations; ++i)
+                benchmark::DoNotOptimize(drawBarely());
+        });
+        pango += timeOf([&] {
+            for (int i = 0; i < durations; ++i)
+                benchmark::DoNotOptimize(drawWithPango(fmt::format("{}:{:02}", 1 + i / 20, i * 3 % 60)));
+        });
+        const auto ours = timeOf([&] {
+            for (const auto& movie : movies)
+                benchmark::DoNotOptimize(plugin.overlay(movie));
+        });
+        state.SetIterationTime(std::chrono::duration<double>(ours).count());
+        time += ours;
     }
     const double count = durations * double(state.iterations());
     state.counters["us_per_overlay"] = microseconds(time) / count;
-    state.counters["floor_us"] = microseconds(floorTime) / count;
-    state.counters["to_floor"] = microseconds(time) / microseconds(floorTime);
+    state.counters["floor_us"] = microseconds(floor) / count;
+    state.counters["to_floor"] = microseconds(time) / microseconds(floor);
+    state.counters["to_pango"] = microseconds(time) / microseconds(pango);
 }
 BENCHMARK(MakeAndDrawOverlays)->UseManualTime()->Unit(benchmark::kMicrosecond);
 

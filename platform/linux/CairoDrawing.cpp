@@ -44,10 +44,6 @@ Rect partInside(Size area, const Rect& rect) {
             std::min(rect.y + rect.height, area.height) - bottom};
 }
 
-double points(int pangoUnits) {
-    return pangoUnits / double(PANGO_SCALE);
-}
-
 bool holds(const Rect& rect, Size size) {
     return size.width <= rect.width && size.height <= rect.height;
 }
@@ -60,9 +56,12 @@ class Player {
     }
 
     void operator()(const FilledRect& step) const {
+        const Rect rect = partInside(size_, step.rect);
+        if (isEmpty(rect))
+            return;
         setColor(step.color);
         cairo_set_operator(context_, CAIRO_OPERATOR_SOURCE);
-        addRectangle(partInside(size_, step.rect));
+        cairo_rectangle(context_, rect.x, top(rect), rect.width, rect.height);
         cairo_fill(context_);
         cairo_set_operator(context_, CAIRO_OPERATOR_OVER);
     }
@@ -84,18 +83,14 @@ class Player {
             draw(*bitmap, step.rect);
     }
     void operator()(const DrawnText& step) const {
-        if (isEmpty(partInside(size_, step.rect)))
-            return;
-        const bool fits = holds(step.rect, step.text.size());
-        PangoLayout* layout = layoutOf(step.text);
-        if (!layout)
+        const TextLine* line = isEmpty(partInside(size_, step.rect)) ? nullptr : lineOf(step.text);
+        if (!line)
             return;
         cairo_save(context_);
-        if (!fits)
+        if (!holds(step.rect, line->size()))
             clipToPixelsOf(partInside(size_, step.rect));
         setColor(step.text.color());
-        cairo_move_to(context_, step.rect.x, top(step.rect) + points(pango_layout_get_baseline(layout)));
-        pango_cairo_show_layout_line(context_, pango_layout_get_line_readonly(layout, 0));
+        line->draw(context_, step.rect.x, top(step.rect));
         cairo_restore(context_);
     }
 
@@ -104,10 +99,6 @@ class Player {
     double top(const Rect& rect) const { return size_.height - rect.y - rect.height; }
     void setColor(const Color& color) const {
         cairo_set_source_rgba(context_, color.red, color.green, color.blue, color.alpha);
-    }
-    void addRectangle(const Rect& rect) const {
-        if (!isEmpty(rect))
-            cairo_rectangle(context_, rect.x, top(rect), rect.width, rect.height);
     }
     void addRoundedRectangle(const Rect& rect, double radius) const {
         constexpr double quarter = std::numbers::pi / 2;
@@ -153,7 +144,7 @@ class Player {
 // Not changed once it has become the picture of an image.
 class Drawing::Recording final : public Picture {
   public:
-    explicit Recording(Size size) : size_(size) {}
+    explicit Recording(Size size) : size_(size) { steps_.reserve(usualSteps); }
 
     void add(Step step) { steps_.push_back(std::move(step)); }
 
@@ -171,6 +162,8 @@ class Drawing::Recording final : public Picture {
     }
 
   private:
+    static constexpr std::size_t usualSteps = 4;  // of an overlay
+
     const Size size_;
     std::vector<Step> steps_;
 };
@@ -192,7 +185,7 @@ void Drawing::fillRoundedRect(const Rect& rect, double radius) {
 }
 
 void Drawing::drawImage(const Image& image, const Rect& inRect) {
-    if (image.isValid())
+    if (image.picture())
         recording_->add(DrawnImage{image.picture(), inRect});
 }
 
@@ -208,12 +201,8 @@ AttributedString::AttributedString(std::string text, Font font, Color color)
     : text_(std::move(text)), font_(font), color_(color) {}
 
 Size AttributedString::size() const {
-    PangoLayout* layout = layoutOf(*this);
-    if (!layout)
-        return {};
-    int width = 0, height = 0;
-    pango_layout_get_size(layout, &width, &height);
-    return {points(width), points(height)};
+    const TextLine* line = lineOf(*this);
+    return line ? line->size() : Size{};
 }
 
 }  // namespace platform
