@@ -1,5 +1,6 @@
 #include "platform/Notification.h"
 
+#include <exception>
 #include <iterator>
 
 namespace platform {
@@ -13,12 +14,21 @@ void NotificationCenter::addObserver(std::weak_ptr<const void> observer, std::st
     registrations_.push_back({std::move(observer), std::string(name), std::move(handler)});
 }
 
+// All hear of it before what the first of them raised goes on.
 void NotificationCenter::post(const Notification& notification) {
+    std::exception_ptr failure;
     for (const Registration& registration : registrationsFor(notification.name)) {
         // Asked only now: a handler before may have ended this observer's life.
-        if (const auto alive = registration.observer.lock())
-            registration.handler(notification);
+        const auto alive = registration.observer.lock();
+        try {
+            if (alive)
+                registration.handler(notification);
+        } catch (...) {
+            failure = failure ? failure : std::current_exception();
+        }
     }
+    if (failure)
+        std::rethrow_exception(failure);
 }
 
 std::vector<NotificationCenter::Registration> NotificationCenter::registrationsFor(const std::string& name) {

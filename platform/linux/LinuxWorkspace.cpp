@@ -119,8 +119,16 @@ void LinuxWorkspace::mountsChanged() {
     const auto now = knownVolumes_;  // an observer may run the main loop, and with it this
     for (const auto& path : now)
         if (std::find(before.begin(), before.end(), path) == before.end())
-            notificationCenter().post(
-                {std::string(NSWorkspaceDidMountNotification), this, {{"NSDevicePath", path}}});
+            postMount(path);
+}
+
+// Nothing may be raised into GLib, which called.
+void LinuxWorkspace::postMount(const std::string& path) try {
+    notificationCenter().post({std::string(NSWorkspaceDidMountNotification), this, {{"NSDevicePath", path}}});
+} catch (const std::exception& error) {
+    log_.log("cannot tell everybody that '" + path + "' was mounted: " + error.what());
+} catch (...) {
+    log_.log("cannot tell everybody that '" + path + "' was mounted");
 }
 
 }  // namespace platform

@@ -51,6 +51,7 @@ class LinuxWorkspace final : public Workspace {
 
   private:
     void mountsChanged();
+    void postMount(const std::string& path);
     void report(const std::string& problem);
 
     const MountTable& mountTable_;
