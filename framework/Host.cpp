@@ -6,6 +6,7 @@
 #include "framework/HostServices.h"
 #include "framework/ImageManager.h"
 #include "framework/PluginSearch.h"
+#include "framework/WarningLog.h"
 #include "framework/metadata/FileTypes.h"
 #include "framework/metadata/MediaReader.h"
 #include "framework/metadata/MetadataIndex.h"
@@ -67,10 +68,11 @@ struct Host::State {
           log("vexo", options.verbosity == Verbosity::verbose
                           ? platform::LinuxSystemLog::StandardError::copies
                           : platform::LinuxSystemLog::StandardError::silent),
-          files(home, mounts, log, isPackageExtension),
-          workspace(mounts, log),
-          userDefaults(preferencesFolder(home), processDefaultsDomain, &log),
           diagnostics(log, options.verbosity),
+          fileWarnings(diagnostics),
+          files(home, mounts, fileWarnings, isPackageExtension),
+          workspace(mounts, log),
+          userDefaults(preferencesFolder(home), processDefaultsDomain, &fileWarnings),
           reader(newMediaReader()),
           backgroundReader(newMediaReader()),
           metadata(MetadataIndex::defaultPath(), reader),
@@ -87,12 +89,13 @@ struct Host::State {
     const HostOptions options;
     const std::optional<std::string> home;
     platform::LinuxSystemLog log;
+    Diagnostics diagnostics;
+    WarningLog fileWarnings;
     platform::SystemMountTable mounts;
     platform::LinuxFileManager files;
     platform::LinuxWorkspace workspace;
     platform::LinuxUserDefaults userDefaults;
     platform::NotificationCenter notifications;
-    Diagnostics diagnostics;
     PathWatcher pathWatcher;
     const std::shared_ptr<ProcessMediaReader> reader;
     // Nobody waits for what it reads, so a property that somebody waits for never stands behind that.

@@ -63,12 +63,15 @@ bool isPlainFile(const FoundFile& file) {
     return S_ISREG(file.status.stx_mode);
 }
 
-// Opens the file only where its extension tells no type.
+// Opens the file only where its extension tells no type. A pipe, a socket or a device holds nothing that a
+// name could tell.
 const FileType& typeOf(const FoundFile& file) {
     const std::string name = platform::path::lastComponent(file.path);
     if (isFolder(file))
         return typeOfFolder(name);
-    if (isPlainFile(file) && !typeForExtension(platform::path::extension(name)))
+    if (!isPlainFile(file))
+        return typeOfFile("");
+    if (!typeForExtension(platform::path::extension(name)))
         if (const FileType* type = typeOfContentOfFile(file.realPath))
             return *type;
     return typeOfFile(name);
