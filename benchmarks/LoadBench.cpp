@@ -1,15 +1,20 @@
 // The first load of a whole library, in a process of its own, beside a walk over the same files on one thread
-// that keeps nothing.
+// that keeps nothing, and beside what others take to look at each file.
 #include <benchmark/benchmark.h>
 #include <sys/mman.h>
 #include <unistd.h>
 
 #include <algorithm>
+#include <array>
 #include <chrono>
 #include <cstdlib>
+#include <filesystem>
+#include <functional>
 #include <stdexcept>
+#include <string>
 
 #include "benchmarks/BareWalk.h"
+#include "benchmarks/PeerWalks.h"
 #include "benchmarks/SampleLibrary.h"
 #include "benchmarks/Surroundings.h"
 #include "framework/Host.h"
@@ -28,6 +33,7 @@ struct Run {
     double processorSeconds = 1e9;
     long clips = 0;
     long groups = 0;
+    std::size_t digest = 0;  // of the clips' paths
 };
 
 double seconds(std::chrono::nanoseconds time) {
@@ -49,6 +55,19 @@ long groupsOf(const vexo::VXMediaGroupRef& root) {
     return count;
 }
 
+// Digests add up to the same in any order.
+std::size_t digestOf(const std::string& path) {
+    return std::hash<std::string>()(path);
+}
+
+std::size_t digestOfClips(const std::string& home) {
+    std::size_t digest = 0;
+    for (const auto& entry : std::filesystem::recursive_directory_iterator(bench::eventsFolder(home)))
+        if (entry.is_regular_file())
+            digest += digestOf(entry.path());
+    return digest;
+}
+
 void load(const std::string& home, Run& run) {
     setenv("XDG_CACHE_HOME", (home + "/.cache").c_str(), /*overwrite=*/1);
     vexo::HostOptions options;
@@ -62,7 +81,11 @@ void load(const std::string& home, Run& run) {
         host.waitUntilLoaded(600s);
     });
     const auto root = host.plugins()[0].manager->rootMediaGroup();
-    run.clips = static_cast<long>(root->mediaObjects().size());
+    const auto clips = root->mediaObjects();
+    run.clips = static_cast<long>(clips.size());
+    run.digest = 0;
+    for (const auto& clip : clips)
+        run.digest += digestOf(clip->path().value_or(""));
     run.groups = groupsOf(root);
 }
 
@@ -90,9 +113,17 @@ void walk(const std::string& home, const bench::LibrarySize& size, Run& run) {
         throw std::runtime_error("the walk missed something");
 }
 
+void walk(const std::string& home, const bench::PeerWalk& peer, const bench::LibrarySize& size, Run& run) {
+    long files = 0;
+    measure(run, [&] { files = peer.countFiles(home + "/Movies"); });
+    if (files != size.clips + size.projects)
+        throw std::runtime_error(std::string(peer.name) + " missed something");
+}
+
 // The library's own root, the years and what the projects lie in are groups as well.
-bool isComplete(const Run& run, const bench::LibrarySize& size) {
-    return run.clips == size.clips && run.groups > size.projects + size.clips / size.clipsAnEvent;
+bool isComplete(const Run& run, const bench::LibrarySize& size, std::size_t digest) {
+    return run.clips == size.clips && run.digest == digest &&
+           run.groups > size.projects + size.clips / size.clipsAnEvent;
 }
 
 void FirstLoad(benchmark::State& state) {
@@ -100,19 +131,25 @@ void FirstLoad(benchmark::State& state) {
                                   static_cast<int>(state.range(2))};
     const bench::Folder home;
     bench::makeLibraries(home.path(), size);
+    const std::size_t digest = digestOfClips(home.path());
     for (auto _ : state) {
         SharedRun floor, ours;
+        std::array<SharedRun, bench::peerWalks.size()> peers;
         for (int i = 0; i < rounds; ++i) {
             bench::runInChild([&] { walk(home.path(), size, *floor); });
             bench::runInChild([&] { load(home.path(), *ours); });
-            if (!isComplete(*ours, size))
+            if (!isComplete(*ours, size, digest))
                 return state.SkipWithError("the tree is not complete");
+            for (std::size_t j = 0; j < peers.size(); ++j)
+                bench::runInChild([&] { walk(home.path(), bench::peerWalks[j], size, *peers[j]); });
         }
         state.SetIterationTime(ours->seconds);
         state.counters["to_floor"] = ours->seconds / floor->seconds;
         state.counters["cpu_to_floor"] = ours->processorSeconds / floor->processorSeconds;
         state.counters["us_per_clip"] = ours->seconds * 1e6 / size.clips;
         state.counters["floor_s"] = floor->seconds;
+        for (std::size_t j = 0; j < peers.size(); ++j)
+            state.counters[std::string("to_") + bench::peerWalks[j].name] = ours->seconds / peers[j]->seconds;
     }
 }
 BENCHMARK(FirstLoad)
