@@ -19,6 +19,29 @@ TEST(ObserverList, ObserversHearWhileTheirOwnersLive) {
     EXPECT_EQ(second, 11);
 }
 
+TEST(ObserverList, AnOwnerThatGoesMeanwhileIsAskedNothingMore) {
+    platform::ObserverList<> observers;
+    const auto firstOwner = std::make_shared<int>();
+    auto secondOwner = std::make_shared<int>();
+    int calls = 0;
+    observers.add(firstOwner, [&] { secondOwner.reset(); });
+    observers.add(secondOwner, [&] { ++calls; });
+    observers.notify();
+    EXPECT_EQ(calls, 0);
+}
+
+TEST(ObserverList, AnOwnerLivesWhileItsObserverIsCalled) {
+    platform::ObserverList<> observers;
+    auto owner = std::make_shared<int>();
+    const std::weak_ptr<int> watched = owner;
+    observers.add(owner, [&] {
+        owner.reset();
+        EXPECT_FALSE(watched.expired());
+    });
+    observers.notify();
+    EXPECT_TRUE(watched.expired());
+}
+
 TEST(ObserverList, AnObserverMayAddAnother) {
     platform::ObserverList<> observers;
     const auto owner = std::make_shared<int>();
