@@ -76,11 +76,18 @@ std::size_t bytesOfUnits(std::string_view text, int32_t units) {
     return length;
 }
 
+// Where nobody knows the language, there are numbers in place of names: "M07".
+bool hasNames(const icu::Locale& locale) {
+    UErrorCode status = U_ZERO_ERROR;
+    const icu::Locale found = icu::DateFormatSymbols(locale, status).getLocale(ULOC_VALID_LOCALE, status);
+    return U_SUCCESS(status) && *found.getLanguage() != '\0';
+}
+
 icu::Locale gregorianLocale(const Locale& locale) {
     icu::Locale gregorian(locale.identifier.c_str());
     UErrorCode status = U_ZERO_ERROR;
     gregorian.setKeywordValue("calendar", "gregorian", status);
-    if (U_FAILURE(status) || gregorian.isBogus())
+    if (U_FAILURE(status) || gregorian.isBogus() || !hasNames(gregorian))
         return icu::Locale("en_US_POSIX");
     return gregorian;
 }
