@@ -16,6 +16,28 @@ namespace {
 // Where something happens, more follows at once. Taken in together it costs a fraction.
 constexpr milliseconds gatheringTime{5};
 
+// Finds nothing more once `closed` says so: a walk through a large tree, of which nobody wants to hear any
+// more, ends with the folders that it knows.
+class AccessUntilClosed final : public FolderAccess {
+  public:
+    AccessUntilClosed(std::unique_ptr<FolderAccess> access, const std::atomic<bool>& closed)
+        : access_(std::move(access)), closed_(closed) {}
+
+    PathEntry look(const std::string& path) const override { return access_->look(path); }
+    FolderListing list(const std::string& folder) const override {
+        return closed_ ? FolderListing{} : access_->list(folder);
+    }
+
+  private:
+    const std::unique_ptr<FolderAccess> access_;
+    const std::atomic<bool>& closed_;
+};
+
+WatchSeams endingWith(const std::atomic<bool>& closed, WatchSeams seams) {
+    seams.folders = std::make_unique<AccessUntilClosed>(std::move(seams.folders), closed);
+    return seams;
+}
+
 int pollTimeout(milliseconds time) {
     if (time == ChangeFollower::forever)
         return -1;
@@ -31,7 +53,7 @@ ChangeFollower::ChangeFollower(WatchSeams seams, std::shared_ptr<const WakeSigna
       registrations_(std::move(registrations)),
       delivery_(std::move(delivery)),
       warn_(std::move(warn)),
-      paths_(std::move(seams)) {}
+      paths_(endingWith(closed_, std::move(seams))) {}
 
 void ChangeFollower::watch(const std::string& path) {
     if (!path.starts_with('/'))

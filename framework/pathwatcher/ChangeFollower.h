@@ -38,7 +38,7 @@ class ChangeFollower {
     bool step(std::chrono::milliseconds atMost) VX_EXCLUDES(mutex_);
     // Whether there are changes that are kept for the rest of their burst.
     bool keepsChanges() const VX_EXCLUDES(mutex_);
-    // Ends the current and every later step.
+    // Ends the current and every later step, and what other threads have begun to watch.
     void close() VX_EXCLUDES(mutex_);
 
     // Requires: `watchedPath` is registered, and `path` is it or below it.
