@@ -1,6 +1,7 @@
 #include "core/ProcessCaches.h"
 #include "core/ReelixConstants.h"
 #include "core/VXReelixPlugin.h"
+#include "events/EventScansAhead.h"
 #include "platform/FileManager.h"
 #include "platform/Path.h"
 #include "platform/Services.h"
@@ -63,6 +64,7 @@ VXReelixPlugin::Group VXReelixPlugin::performLoadData() {
                        pathList({_ReelixDefaultPath(), _ReelixDefaultPath2()}), queryRunMode);
     watcher.watchQuery(std::string(eventQuery), self(), _ReelixEventsSearchPaths, queryRunMode);
 
+    const EventScansAhead eventScansAhead(*this);
     root->setChildGroups(_reloadReelixProjects(/*updateRoot=*/false));
     root->addChildGroup(_reloadReelixEvents(root->ID(), /*updateRootMediaGroup=*/false));
     _setMediaObjectsForRootMediaGroup(root);

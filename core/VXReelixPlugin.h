@@ -235,6 +235,7 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     struct ScannedEvent;
     struct EventYears;
     class EventLibraryScan;
+    class EventScansAhead;
     using YearGroups = std::map<double, Group>;  // the year groups of one event library by their years
 
     void scanProjectLibraries(Groups& libraries) VX_REQUIRES(_monitor);
@@ -248,6 +249,8 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     void fileEventUnderItsYear(const Group& event, const Group& eventLibrary, YearGroups& years);
     Group newYearGroup(const std::optional<platform::Value>& year);
 
+    // The one that was begun ahead, or a new one.
+    std::shared_ptr<EventLibraryScan> scanOfEventLibrary(const std::string& folder) VX_REQUIRES(_monitor);
     Group eventGroupForFolder(const std::string& folder, const std::string& libraryFolder);
     // Gives the event its clips; false when it has none.
     bool finishEvent(const ScannedEvent& scanned);
@@ -255,6 +258,8 @@ class VXReelixPlugin : public vexo::VXMediaManager,
 
     void scheduleProjectsReload();
     void scheduleEventsReload();
+
+    EventScansAhead* eventScansAhead_ VX_GUARDED_BY(_monitor) = nullptr;  // while a load goes on
 };
 
 }  // namespace reelix

@@ -9,7 +9,7 @@ using platform::Locked;
 void SharedWork::help() {
     {
         Locked lock(mutex_);
-        if (isFinished_)
+        if (isEnded_)
             return;
         ++helpers_;
     }
@@ -21,21 +21,22 @@ void SharedWork::help() {
 
 void SharedWork::finish() {
     doPieces();
-    std::exception_ptr failure;
-    {
-        Locked lock(mutex_);
-        isFinished_ = true;
-        while (helpers_ > 0)
-            helperLeft_.wait(mutex_);
-        failure = failure_;
-    }
-    if (failure)
-        std::rethrow_exception(failure);
+    abandon();
+    Locked lock(mutex_);
+    if (failure_)
+        std::rethrow_exception(failure_);
+}
+
+void SharedWork::abandon() {
+    Locked lock(mutex_);
+    isEnded_ = true;
+    while (helpers_ > 0)
+        helperLeft_.wait(mutex_);
 }
 
 void SharedWork::doPieces() {
     try {
-        while (!hasFailed() && doPiece_()) {
+        while (!isOver() && doPiece_()) {
         }
     } catch (...) {
         fail(std::current_exception());
@@ -48,9 +49,9 @@ void SharedWork::fail(std::exception_ptr failure) {
         failure_ = std::move(failure);
 }
 
-bool SharedWork::hasFailed() const {
+bool SharedWork::isOver() const {
     Locked lock(mutex_);
-    return failure_ != nullptr;
+    return isEnded_ || failure_;
 }
 
 }  // namespace reelix

@@ -33,32 +33,38 @@ struct FileAttributes {
     DateRef creationDate;      // nil when the file system tells neither birth nor modification time
 };
 
-// What one look at an entry of a folder tells.
-struct FolderEntry {
-    std::uint32_t flags = 0;         // as itemFlagsAtPath answers
-    bool isOnFoldersDevice = false;  // whether it is neither a link nor a mount point
-    // What follows is told of the file that a link leads to.
-    bool isPlainFile = false;
-    bool hasAttributes = false;          // whether attributesOfItemAtPath answers any
-    std::optional<double> creationTime;  // the creation date of those, in seconds from 1970; nil for none
+// An item of a folder, as the folder's listing tells it.
+struct FolderItem {
+    // `other` stands for everything else, and for what the listing says nothing about.
+    enum class Kind : std::uint8_t { other, plainFile, folder };
+
+    std::string name;
+    Kind kind = Kind::other;
 };
 
 // A folder that is gone through. Each question answers as the operation by path does and costs as few calls
-// to the system as can be, which is what scans are made of. One that is moved meanwhile stays the same, but
-// has no attributes any more. It holds a file open: down a tree each is closed before the next is entered.
+// to the system as can be, often none: what the listing told is not asked again, so an item that has vanished
+// since may still be told of by everything but its attributes. It holds a file open: down a tree each is
+// closed before the next is entered.
 //
 // Callable from any thread.
 class Folder {
   public:
     virtual ~Folder() = default;
 
-    // As contentsOfDirectoryAtPath answers.
-    virtual const std::vector<std::string>& names() const = 0;
-    // nil when there is no such item.
-    virtual std::optional<FolderEntry> entryNamed(const std::string& name) const = 0;
-    // FileManager::extendedAttribute of an item, of which `entry` was told.
-    virtual std::ptrdiff_t extendedAttribute(const std::string& name, const FolderEntry& entry,
-                                             std::string_view attribute, std::span<char> buffer) const = 0;
+    // As contentsOfDirectoryAtPath answers. The questions below are about one of these.
+    virtual const std::vector<FolderItem>& items() const = 0;
+
+    // As itemFlagsAtPath answers.
+    virtual std::optional<std::uint32_t> flagsOf(const FolderItem& item) const = 0;
+    // Whether the item, or what a link leads to, is a file with content of its own.
+    virtual bool isPlainFile(const FolderItem& item) const = 0;
+    // As attributesOfItemAtPath answers.
+    virtual std::optional<FileAttributes> attributesOf(const FolderItem& item) const = 0;
+    // As FileManager::extendedAttribute answers; nil when it is not even known whether the item is there.
+    virtual std::optional<std::ptrdiff_t> extendedAttributeOf(const FolderItem& item,
+                                                              std::string_view attribute,
+                                                              std::span<char> buffer) const = 0;
 };
 
 class FileManager {

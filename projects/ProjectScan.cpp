@@ -14,21 +14,40 @@ namespace path = platform::path;
 
 constexpr std::string_view projectExtension = "qnproject";
 
-struct FolderListing {
-    std::string folder;  // the folder that was listed
-    std::vector<std::string> names;
+struct Item {
+    std::string path;
+    std::uint32_t flags;
 };
 
-// A folder whose localized form can't be listed is read by its plain name. An unlistable one has no entries.
-FolderListing listFolder(const std::string& folder) {
+struct FolderContent {
+    std::string folder;  // the folder that was listed
+    std::vector<Item> items;
+};
+
+// What may be seen in a folder. An item whose flags can't be had is skipped.
+std::vector<Item> visibleItems(const platform::Folder& folder, const std::string& path) {
+    std::vector<Item> items;
+    for (const platform::FolderItem& item : folder.items()) {
+        if (item.name.empty() || item.name.front() == '.')
+            continue;
+        const std::uint32_t flags = folder.flagsOf(item).value_or(platform::itemIsInvisible);
+        if (!(flags & platform::itemIsInvisible))
+            items.push_back({path::appending(path, item.name), flags});
+    }
+    return items;
+}
+
+// A folder whose localized form can't be listed is read by its plain name. An unlistable one has no items.
+FolderContent contentOf(const std::string& folder) {
     const platform::FileManager& files = platform::services().fileManager;
-    if (auto names = files.contentsOfDirectoryAtPath(folder))
-        return {folder, std::move(*names)};
+    if (const auto listed = files.openFolderAtPath(folder))
+        return {folder, visibleItems(*listed, folder)};
     if (path::extension(folder) != ReelixLocalizedExtension)
         return {folder, {}};
     std::string plain = path::withoutExtension(folder);
-    auto names = files.contentsOfDirectoryAtPath(plain).value_or(std::vector<std::string>{});
-    return {std::move(plain), std::move(names)};
+    const auto listed = files.openFolderAtPath(plain);
+    auto items = listed ? visibleItems(*listed, plain) : std::vector<Item>{};
+    return {std::move(plain), std::move(items)};
 }
 
 void setFileFields(const vexo::VXMediaGroupRef& group, const std::string& file) {
@@ -56,27 +75,20 @@ VXReelixPlugin::Group VXReelixPlugin::_createReelixProjectsFolderForPath(
     folderGroup->setParentID(path::withoutLastComponent(*path));
     folderGroup->setIcon(vexo::VXMediaBrowserImageManager::sharedInstance().iconForFile(*path));
 
-    const FolderListing listing = listFolder(*path);
-    for (const std::string& name : listing.names) {
-        if (name.empty() || name.front() == '.')
-            continue;
-        const std::string entry = path::appending(listing.folder, name);
-        // An item whose flags can't be had is skipped.
-        const std::uint32_t flags = platform::services().fileManager.itemFlagsAtPath(entry).value_or(0);
-        if (flags & platform::itemIsInvisible)
-            continue;
+    const FolderContent content = contentOf(*path);
+    for (const auto& [item, flags] : content.items) {
         if (flags & platform::itemIsPackage) {
-            if (path::extension(entry) == projectExtension)
-                folderGroup->addChildGroup(projectGroupForPackage(entry, listing.folder));
+            if (path::extension(item) == projectExtension)
+                folderGroup->addChildGroup(projectGroupForPackage(item, content.folder));
         } else if (flags & platform::itemIsContainer) {
-            const Group subfolder = _createReelixProjectsFolderForPath(entry);
+            const Group subfolder = _createReelixProjectsFolderForPath(item);
             subfolder->setParentID(folderGroup->ID());
             folderGroup->addChildGroup(subfolder);
         }
     }
 
     if (folderGroup->childGroups().empty())
-        _flatProjectGroupsList->push_back(placeholderGroupForFolder(listing.folder));
+        _flatProjectGroupsList->push_back(placeholderGroupForFolder(content.folder));
     _createReelixProjectsFolderMediaObjects(folderGroup);
     return folderGroup;
 }

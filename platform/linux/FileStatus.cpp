@@ -4,7 +4,6 @@
 
 #include <cerrno>
 
-#include "platform/FileManager.h"
 #include "platform/Path.h"
 #include "platform/linux/Uninterrupted.h"
 
@@ -14,6 +13,10 @@ namespace {
 
 double seconds(const statx_timestamp& time) {
     return static_cast<double>(time.tv_sec) + time.tv_nsec * 1e-9;
+}
+
+DateRef dateAt(const std::optional<double>& secondsSince1970) {
+    return secondsSince1970 ? Date::since1970(*secondsSince1970) : nullptr;
 }
 
 }  // namespace
@@ -41,11 +44,13 @@ std::optional<double> creationTime(const struct statx& status) {
                                          : modificationTime(status);
 }
 
-std::uint32_t containerFlags(const struct statx& status, std::string_view name,
-                             const std::function<bool(std::string_view extension)>& isPackageExtension) {
-    if (!S_ISDIR(status.stx_mode))
-        return 0;
+std::uint32_t flagsOfFolder(std::string_view name,
+                            const std::function<bool(std::string_view extension)>& isPackageExtension) {
     return isPackageExtension(path::extension(name)) ? itemIsContainer | itemIsPackage : itemIsContainer;
+}
+
+FileAttributes attributesFromStatus(const struct statx& status) {
+    return {status.stx_size, dateAt(modificationTime(status)), dateAt(creationTime(status))};
 }
 
 // File systems with Unix's flag for backups, all the usual ones, have no hidden flag; neither have links.

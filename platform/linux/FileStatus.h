@@ -9,6 +9,8 @@
 #include <string>
 #include <string_view>
 
+#include "platform/FileManager.h"
+
 namespace platform {
 
 // Asks statx for what these functions look at; `flags` go with AT_NO_AUTOMOUNT. nil, and errno set, where the
@@ -23,9 +25,12 @@ bool meansMissing(int error);
 std::optional<double> modificationTime(const struct statx& status);
 std::optional<double> creationTime(const struct statx& status);
 
-// Container and package, of the item flags.
-std::uint32_t containerFlags(const struct statx& status, std::string_view name,
-                             const std::function<bool(std::string_view extension)>& isPackageExtension);
+// Container and package, of the flags of a folder with this name.
+std::uint32_t flagsOfFolder(std::string_view name,
+                            const std::function<bool(std::string_view extension)>& isPackageExtension);
+
+// What attributesOfItemAtPath answers.
+FileAttributes attributesFromStatus(const struct statx& status);
 
 // Whether it is worth another call to ask for the hidden flag of FAT and NTFS.
 bool mayHaveHiddenFlag(const struct statx& status);

@@ -24,14 +24,6 @@ namespace platform {
 
 namespace {
 
-DateRef dateAt(const std::optional<double>& secondsSince1970) {
-    return secondsSince1970 ? Date::since1970(*secondsSince1970) : nullptr;
-}
-
-FileAttributes attributesFromStatus(const struct statx& status) {
-    return {status.stx_size, dateAt(modificationTime(status)), dateAt(creationTime(status))};
-}
-
 // Whether something is mounted right at the item; true as well where the kernel does not say.
 bool mayBeMountPoint(const struct statx& status) {
     return !(status.stx_attributes_mask & STATX_ATTR_MOUNT_ROOT) ||
@@ -49,6 +41,14 @@ std::string fuseTypeName(const std::string& path) {
     auto name = fileSystemNameForType(g_unix_mount_get_fs_type(mount), device ? device : "");
     g_unix_mount_free(mount);
     return name;
+}
+
+std::vector<std::string> namesOf(std::vector<FolderItem> items) {
+    std::vector<std::string> names;
+    names.reserve(items.size());
+    for (FolderItem& item : items)
+        names.push_back(std::move(item.name));
+    return names;
 }
 
 std::optional<std::string> homeDirectoryInPasswordDatabase() {
@@ -96,7 +96,7 @@ std::optional<std::vector<std::string>> LinuxFileManager::contentsOfDirectoryAtP
     if (!real)
         return std::nullopt;
     auto listing = listingOfFolder(*real);
-    return listing ? std::optional(std::move(listing->names)) : std::nullopt;
+    return listing ? std::optional(namesOf(std::move(listing->items))) : std::nullopt;
 }
 
 std::unique_ptr<Folder> LinuxFileManager::openFolderAtPath(const std::string& path) const {
@@ -118,7 +118,8 @@ std::optional<std::uint32_t> LinuxFileManager::itemFlagsAtPath(const std::string
     const auto status = real ? statusOfItem(*real, Links::lookAt) : std::nullopt;
     if (!status)
         return std::nullopt;
-    std::uint32_t flags = containerFlags(*status, path::lastComponent(*real), isPackageExtension_);
+    std::uint32_t flags =
+        S_ISDIR(status->stx_mode) ? flagsOfFolder(path::lastComponent(*real), isPackageExtension_) : 0;
     if (isInvisible(*real, *status))
         flags |= itemIsInvisible;
     return flags;
@@ -141,7 +142,7 @@ std::ptrdiff_t LinuxFileManager::extendedAttribute(const std::string& path, std:
     const auto real = kernelPath(path);
     if (!real)
         return missing;
-    const auto size = platform::extendedAttribute(*real, name, buffer, ForeignNames::asked).size;
+    const auto size = platform::extendedAttribute({*real}, name, buffer, ForeignNames::asked).size;
     if (size < 0 && !isUsualForAttributes(static_cast<int>(-size)))
         logFailure("read an attribute of", *real, static_cast<int>(-size));
     return size;

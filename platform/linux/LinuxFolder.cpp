@@ -23,33 +23,42 @@ bool isDotOrDotDot(const char* name) {
     return std::strcmp(name, ".") == 0 || std::strcmp(name, "..") == 0;
 }
 
+FolderItem::Kind kindOf(const dirent& entry) {
+    switch (entry.d_type) {
+        case DT_REG:
+            return FolderItem::Kind::plainFile;
+        case DT_DIR:
+            return FolderItem::Kind::folder;
+        default:
+            return FolderItem::Kind::other;
+    }
+}
+
 // nil, and errno set, when reading fails.
-std::optional<std::vector<std::string>> readNames(DIR* folder) {
-    std::vector<std::string> names;
+std::optional<std::vector<FolderItem>> readItems(DIR* folder) {
+    std::vector<FolderItem> items;
     for (;;) {
-        const dirent* const entry = uninterrupted([folder] { return readdir(folder); });
+        errno = 0;
+        const dirent* const entry = readdir(folder);
         if (!entry)
             break;
         if (!isDotOrDotDot(entry->d_name))
-            names.emplace_back(entry->d_name);
+            items.push_back({entry->d_name, kindOf(*entry)});
     }
-    return errno == 0 ? std::optional(std::move(names)) : std::nullopt;
+    return errno == 0 ? std::optional(std::move(items)) : std::nullopt;
 }
 
 // In any case of letters, because some file systems find the file by any.
 bool holdsHiddenFile(const FolderListing& listing) {
-    return std::ranges::any_of(listing.names, [](const std::string& name) {
-        return name.starts_with('.') && strcasecmp(name.c_str(), ".hidden") == 0;
+    return std::ranges::any_of(listing.items, [](const FolderItem& item) {
+        return item.name.starts_with('.') && strcasecmp(item.name.c_str(), ".hidden") == 0;
     });
 }
 
-std::uint64_t deviceOf(const struct statx& status) {
-    return std::uint64_t{status.stx_dev_major} << 32 | status.stx_dev_minor;
-}
-
-std::optional<std::uint64_t> deviceOf(DIR* folder) {
+// What is in a folder can be hidden by a flag where the folder itself can.
+bool mayHoldHiddenFlags(DIR* folder) {
     const auto status = statusOfFile(dirfd(folder), "", AT_EMPTY_PATH);
-    return status ? std::optional(deviceOf(*status)) : std::nullopt;
+    return !status || mayHaveHiddenFlag(*status);
 }
 
 }  // namespace
@@ -58,10 +67,10 @@ std::optional<FolderListing> FolderListing::open(const std::string& path) {
     std::unique_ptr<DIR, Closer> folder(uninterrupted([&] { return opendir(path.c_str()); }));
     if (!folder)
         return std::nullopt;
-    auto names = readNames(folder.get());
-    if (!names)
+    auto items = readItems(folder.get());
+    if (!items)
         return std::nullopt;
-    return FolderListing{std::move(folder), std::move(*names)};
+    return FolderListing{std::move(folder), std::move(*items)};
 }
 
 LinuxFolder::LinuxFolder(FolderListing listing, std::string path, const Services& services)
@@ -69,56 +78,65 @@ LinuxFolder::LinuxFolder(FolderListing listing, std::string path, const Services
       path_(std::move(path)),
       services_(services),
       hiddenNames_(holdsHiddenFile(listing_) ? services_.hiddenNames.ofFolder(path_) : nullptr),
-      device_(deviceOf(listing_.folder.get())) {}
+      mayHoldHiddenFlags_(mayHoldHiddenFlags(listing_.folder.get())) {}
 
-// One call for a file or folder; a link takes another one, for what it leads to.
-std::optional<FolderEntry> LinuxFolder::entryNamed(const std::string& name) const {
-    const auto status = statusOf(name, AT_SYMLINK_NOFOLLOW);
-    if (!status)
-        return std::nullopt;
-    FolderEntry entry;
-    entry.flags = containerFlags(*status, name, services_.isPackageExtension);
-    if (isInvisible(name, *status))
-        entry.flags |= itemIsInvisible;
-
-    entry.isOnFoldersDevice = isOnFoldersDevice(*status);
-    const auto target = S_ISLNK(status->stx_mode) ? statusOf(name, 0) : status;
-    if (!target)
-        return entry;
-    entry.hasAttributes = true;
-    entry.isPlainFile = S_ISREG(target->stx_mode);
-    entry.creationTime = creationTime(*target);
-    return entry;
+// No call where the listing has told what the item is and nothing but its name can hide it.
+std::optional<std::uint32_t> LinuxFolder::flagsOf(const FolderItem& item) const {
+    bool isFolder = item.kind == FolderItem::Kind::folder;
+    bool isInvisible = isInvisibleByName(item.name);
+    if (item.kind == FolderItem::Kind::other || mayHoldHiddenFlags_) {
+        const auto status = statusOf(item, AT_SYMLINK_NOFOLLOW);
+        if (!status)
+            return std::nullopt;
+        isFolder = S_ISDIR(status->stx_mode);
+        isInvisible = isInvisible || (mayHaveHiddenFlag(*status) && hasHiddenFlag(pathOf(item.name)));
+    }
+    return (isFolder ? flagsOfFolder(item.name, services_.isPackageExtension) : 0u) |
+           (isInvisible ? static_cast<std::uint32_t>(itemIsInvisible) : 0u);
 }
 
-std::ptrdiff_t LinuxFolder::extendedAttribute(const std::string& name, const FolderEntry& entry,
-                                              std::string_view attribute, std::span<char> buffer) const {
-    const auto foreignNames = entry.isOnFoldersDevice && !mayHaveForeignNames_
-                                  ? ForeignNames::knownToBeMissing
-                                  : ForeignNames::asked;
-    const std::string path = pathOf(name);
-    const AttributeAnswer answer = platform::extendedAttribute(path, attribute, buffer, foreignNames);
-    if (entry.isOnFoldersDevice && !answer.hasForeignNames)
+bool LinuxFolder::isPlainFile(const FolderItem& item) const {
+    if (item.kind != FolderItem::Kind::other)
+        return item.kind == FolderItem::Kind::plainFile;
+    const auto status = statusOf(item, /*flags=*/0);
+    return status && S_ISREG(status->stx_mode);
+}
+
+std::optional<FileAttributes> LinuxFolder::attributesOf(const FolderItem& item) const {
+    const auto status = statusOf(item, /*flags=*/0);
+    return status ? std::optional(attributesFromStatus(*status)) : std::nullopt;
+}
+
+std::optional<std::ptrdiff_t> LinuxFolder::extendedAttributeOf(const FolderItem& item,
+                                                               std::string_view attribute,
+                                                               std::span<char> buffer) const {
+    const bool isLikeOthers = isOnFoldersDevice(item);
+    const auto foreignNames =
+        isLikeOthers && !mayHaveForeignNames_ ? ForeignNames::knownToBeMissing : ForeignNames::asked;
+    const AttributeAnswer answer = platform::extendedAttribute(
+        {dirfd(listing_.folder.get()), path_, item.name}, attribute, buffer, foreignNames);
+    if (isLikeOthers && !answer.hasForeignNames)
         mayHaveForeignNames_ = false;
     if (answer.size < 0 && !isUsualForAttributes(static_cast<int>(-answer.size)))
-        services_.systemLog.log(failureLine("read an attribute of", path, static_cast<int>(-answer.size)));
-    return answer.size;
+        services_.systemLog.log(
+            failureLine("read an attribute of", pathOf(item.name), static_cast<int>(-answer.size)));
+    return isOfFoundFile(answer.size) ? std::optional(answer.size) : std::nullopt;
 }
 
-std::optional<struct statx> LinuxFolder::statusOf(const std::string& name, int flags) const {
-    const auto status = statusOfFile(dirfd(listing_.folder.get()), name.c_str(), flags);
+std::optional<struct statx> LinuxFolder::statusOf(const FolderItem& item, int flags) const {
+    const auto status = statusOfFile(dirfd(listing_.folder.get()), item.name.c_str(), flags);
     if (!status && !meansMissing(errno))
-        services_.systemLog.log(failureLine("look at", pathOf(name), errno));
+        services_.systemLog.log(failureLine("look at", pathOf(item.name), errno));
     return status;
 }
 
-bool LinuxFolder::isInvisible(const std::string& name, const struct statx& status) const {
-    return name.starts_with('.') || (hiddenNames_ && hiddenNames_->contains(name)) ||
-           (mayHaveHiddenFlag(status) && hasHiddenFlag(pathOf(name)));
+bool LinuxFolder::isInvisibleByName(const std::string& name) const {
+    return name.starts_with('.') || (hiddenNames_ && hiddenNames_->contains(name));
 }
 
-bool LinuxFolder::isOnFoldersDevice(const struct statx& status) const {
-    return !S_ISLNK(status.stx_mode) && deviceOf(status) == device_;
+// A single file onto which one of another device is mounted counts as well: nobody does that to a clip.
+bool LinuxFolder::isOnFoldersDevice(const FolderItem& item) const {
+    return item.kind == FolderItem::Kind::plainFile;
 }
 
 std::string LinuxFolder::pathOf(const std::string& name) const {

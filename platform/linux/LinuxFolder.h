@@ -1,6 +1,6 @@
-// A folder of the machine that is gone through: every look at an entry goes by the folder's descriptor, so
-// the kernel walks no path, and what holds for the whole folder is found out once. Only attributes, which the
-// kernel tells by path alone, are asked for by the path that the folder had.
+// A folder of the machine that is gone through: every look at an item goes by the folder's descriptor, so the
+// kernel walks no path, and what holds for the whole folder is found out once. Kernels before 6.13 tell
+// attributes by path alone: there a folder that is moved has none any more.
 #pragma once
 
 #include <dirent.h>
@@ -21,7 +21,7 @@ struct statx;
 
 namespace platform {
 
-// An open folder with its names, in the order of the file system.
+// An open folder with what lies in it, in the order of the file system.
 struct FolderListing {
     struct Closer {
         void operator()(DIR* opened) const { closedir(opened); }
@@ -31,7 +31,7 @@ struct FolderListing {
     static std::optional<FolderListing> open(const std::string& path);
 
     std::unique_ptr<DIR, Closer> folder;
-    std::vector<std::string> names;
+    std::vector<FolderItem> items;
 };
 
 class LinuxFolder final : public Folder {
@@ -46,22 +46,24 @@ class LinuxFolder final : public Folder {
     // `path` is the one by which the kernel knows the folder. The services must outlive the folder.
     LinuxFolder(FolderListing listing, std::string path, const Services& services);
 
-    const std::vector<std::string>& names() const override { return listing_.names; }
-    std::optional<FolderEntry> entryNamed(const std::string& name) const override;
-    std::ptrdiff_t extendedAttribute(const std::string& name, const FolderEntry& entry,
-                                     std::string_view attribute, std::span<char> buffer) const override;
+    const std::vector<FolderItem>& items() const override { return listing_.items; }
+    std::optional<std::uint32_t> flagsOf(const FolderItem& item) const override;
+    bool isPlainFile(const FolderItem& item) const override;
+    std::optional<FileAttributes> attributesOf(const FolderItem& item) const override;
+    std::optional<std::ptrdiff_t> extendedAttributeOf(const FolderItem& item, std::string_view attribute,
+                                                      std::span<char> buffer) const override;
 
   private:
-    std::optional<struct ::statx> statusOf(const std::string& name, int flags) const;
-    bool isInvisible(const std::string& name, const struct ::statx& status) const;
-    bool isOnFoldersDevice(const struct ::statx& status) const;
+    std::optional<struct ::statx> statusOf(const FolderItem& item, int flags) const;
+    bool isInvisibleByName(const std::string& name) const;
+    bool isOnFoldersDevice(const FolderItem& item) const;
     std::string pathOf(const std::string& name) const;
 
     const FolderListing listing_;
     const std::string path_;
     const Services& services_;
     const std::shared_ptr<const NameSet> hiddenNames_;  // nil for none
-    const std::optional<std::uint64_t> device_;
+    const bool mayHoldHiddenFlags_;                     // of FAT and NTFS
     // Whether files on the folder's device may have attributes by the names of foreign volumes' drivers.
     mutable std::atomic<bool> mayHaveForeignNames_ = true;
 };

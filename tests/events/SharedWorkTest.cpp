@@ -69,6 +69,33 @@ TEST(SharedWorkTest, TheEndWaitsForWhatHelpersHaveTaken) {
     helper.join();
 }
 
+TEST(SharedWorkTest, NoPieceOfAbandonedWorkIsBegun) {
+    int asked = 0;
+    SharedWork work([&asked] { return ++asked < 3; });
+    work.abandon();
+    work.help();
+    work.finish();
+    EXPECT_EQ(asked, 0);
+}
+
+TEST(SharedWorkTest, AbandoningWaitsForThePieceThatAHelperHasTaken) {
+    std::latch helperHasAPiece(1);
+    std::atomic<int> begun = 0, done = 0;
+    SharedWork work([&] {
+        if (++begun == 1)
+            helperHasAPiece.count_down();
+        ++done;
+        return true;  // there is always more
+    });
+    std::thread helper([&work] { work.help(); });
+    helperHasAPiece.wait();
+    work.abandon();
+    EXPECT_EQ(done, begun);
+    const int doneInTime = done;
+    helper.join();
+    EXPECT_EQ(done, doneInTime);
+}
+
 TEST(SharedWorkTest, AnExceptionEndsTheWorkAndComesOutAtTheEnd) {
     int asked = 0;
     SharedWork work([&asked]() -> bool {

@@ -19,28 +19,35 @@ class FaultyFolder final : public platform::Folder {
                  const BeforeOperation& beforeOperation)
         : real_(std::move(real)),
           path_(std::move(path)),
-          names_(real_->names()),
+          items_(real_->items()),
           beforeOperation_(beforeOperation) {
-        std::ranges::sort(names_);
+        std::ranges::sort(items_, {}, &platform::FolderItem::name);
     }
 
-    const std::vector<std::string>& names() const override { return names_; }
-    std::optional<platform::FolderEntry> entryNamed(const std::string& name) const override {
-        return goesOn(beforeOperation_, pathOf(name)) ? real_->entryNamed(name) : std::nullopt;
+    const std::vector<platform::FolderItem>& items() const override { return items_; }
+    std::optional<std::uint32_t> flagsOf(const platform::FolderItem& item) const override {
+        return asks(item) ? real_->flagsOf(item) : std::nullopt;
     }
-    std::ptrdiff_t extendedAttribute(const std::string& name, const platform::FolderEntry& entry,
-                                     std::string_view attribute, std::span<char> buffer) const override {
-        return goesOn(beforeOperation_, pathOf(name))
-                   ? real_->extendedAttribute(name, entry, attribute, buffer)
-                   : -1;
+    bool isPlainFile(const platform::FolderItem& item) const override {
+        return asks(item) && real_->isPlainFile(item);
+    }
+    std::optional<platform::FileAttributes> attributesOf(const platform::FolderItem& item) const override {
+        return asks(item) ? real_->attributesOf(item) : std::nullopt;
+    }
+    std::optional<std::ptrdiff_t> extendedAttributeOf(const platform::FolderItem& item,
+                                                      std::string_view attribute,
+                                                      std::span<char> buffer) const override {
+        return asks(item) ? real_->extendedAttributeOf(item, attribute, buffer) : std::nullopt;
     }
 
   private:
-    std::string pathOf(const std::string& name) const { return platform::path::appending(path_, name); }
+    bool asks(const platform::FolderItem& item) const {
+        return goesOn(beforeOperation_, platform::path::appending(path_, item.name));
+    }
 
     const std::unique_ptr<platform::Folder> real_;
     const std::string path_;
-    std::vector<std::string> names_;
+    std::vector<platform::FolderItem> items_;
     const BeforeOperation& beforeOperation_;
 };
 

@@ -18,7 +18,7 @@ namespace testing_support {
 namespace {
 
 using platform::Folder;
-using platform::FolderEntry;
+using platform::FolderItem;
 using testing::ElementsAre;
 using testing::IsEmpty;
 using testing::UnorderedElementsAre;
@@ -26,11 +26,16 @@ using testing::UnorderedElementsAre;
 class FolderTest : public testing::Test {
   protected:
     std::unique_ptr<Folder> open() const { return files_.openFolderAtPath(home_.path()); }
+    static FolderItem itemNamed(const Folder& folder, const std::string& name) {
+        const auto found = std::ranges::find(folder.items(), name, &FolderItem::name);
+        return found != folder.items().end() ? *found : FolderItem{name};
+    }
     static std::string attribute(const Folder& folder, const std::string& name) {
-        const auto entry = folder.entryNamed(name);
         std::array<char, 16> value{};
-        const auto size = folder.extendedAttribute(name, entry.value_or(FolderEntry{}), "date", value);
-        return size < 0 ? "missing" : std::string(value.data(), static_cast<std::size_t>(size));
+        const auto size = folder.extendedAttributeOf(itemNamed(folder, name), "date", value);
+        if (!size)
+            return "out of reach";
+        return *size < 0 ? "missing" : std::string(value.data(), static_cast<std::size_t>(*size));
     }
     std::string fileWithDate(const std::string& name, const std::string& attributeName = "user.date") {
         std::string file = home_.writeFile(name);
@@ -45,13 +50,12 @@ class FolderTest : public testing::Test {
         home_.path(), mounts_, log_, [](std::string_view extension) { return extension == "qnproject"; }};
 };
 
-std::string text(const std::optional<FolderEntry>& entry) {
-    if (!entry)
-        return "nothing";
-    std::string text = std::to_string(entry->flags);
-    text += entry->isPlainFile ? " plain" : "";
-    text += entry->hasAttributes ? " attributes" : "";
-    text += entry->creationTime ? " " + std::to_string(*entry->creationTime) : "";
+std::string told(const Folder& folder, const FolderItem& item) {
+    const auto flags = folder.flagsOf(item);
+    const auto attributes = folder.attributesOf(item);
+    std::string text = flags ? std::to_string(*flags) : "nothing";
+    text += folder.isPlainFile(item) ? " plain" : "";
+    text += attributes ? " attributes" : "";
     return text;
 }
 
@@ -74,39 +78,59 @@ void fill(const TemporaryFolder& home) {
     home.writeFile("not UTF-8 \xff.mov");
 }
 
-TEST_F(FolderTest, NamesAreThoseOfTheListing) {
+TEST_F(FolderTest, ItemsAreThoseOfTheListing) {
     fill(home_);
-    EXPECT_EQ(open()->names(), files_.contentsOfDirectoryAtPath(home_.path()));
+    const auto folder = open();
+    std::vector<std::string> names;
+    for (const FolderItem& item : folder->items())
+        names.push_back(item.name);
+    EXPECT_EQ(names, files_.contentsOfDirectoryAtPath(home_.path()));
 }
 
-TEST_F(FolderTest, EntriesAreToldAsByPath) {
+TEST_F(FolderTest, ItemsAreToldOfAsByPath) {
     fill(home_);
     const auto folder = open();
     const auto byPath = PathFolder::open(files_, home_.path());
-    for (const std::string& name : folder->names())
-        EXPECT_EQ(text(folder->entryNamed(name)), text(byPath->entryNamed(name))) << name;
+    for (const FolderItem& item : folder->items())
+        EXPECT_EQ(told(*folder, item), told(*byPath, item)) << item.name;
     for (const std::string name : {".", "missing", "file.mov/below"})
-        EXPECT_EQ(text(folder->entryNamed(name)), text(byPath->entryNamed(name))) << name;
+        EXPECT_EQ(told(*folder, {name}), told(*byPath, {name})) << name;
 }
 
-TEST_F(FolderTest, EntriesTellWhatAScanAsks) {
+// As where the file system does not say what it lists.
+TEST_F(FolderTest, AListingThatSaysNothingChangesNoAnswer) {
     fill(home_);
     const auto folder = open();
-    const auto withoutTime = [&folder](const std::string& name) {
-        auto entry = folder->entryNamed(name);
-        entry->creationTime.reset();
-        return text(entry);
+    for (const FolderItem& item : folder->items())
+        EXPECT_EQ(told(*folder, item), told(*folder, {item.name})) << item.name;
+}
+
+TEST_F(FolderTest, AttributesAreThoseByPath) {
+    const std::string file = home_.writeFile("a.mov", "content");
+    const auto folder = open();
+    const auto attributes = folder->attributesOf(folder->items()[0]);
+    const auto byPath = files_.attributesOfItemAtPath(file);
+    EXPECT_EQ(attributes->size, byPath->size);
+    EXPECT_EQ(attributes->creationDate->secondsSince1970(), byPath->creationDate->secondsSince1970());
+    EXPECT_EQ(attributes->modificationDate->secondsSince1970(), byPath->modificationDate->secondsSince1970());
+}
+
+TEST_F(FolderTest, ItemsTellWhatAScanAsks) {
+    fill(home_);
+    const auto folder = open();
+    const auto toldOf = [&folder](const std::string& name) {
+        return told(*folder, itemNamed(*folder, name));
     };
-    EXPECT_EQ(withoutTime("file.mov"), "0 plain attributes");
-    EXPECT_EQ(withoutTime("folder"), "8 attributes");
-    EXPECT_EQ(withoutTime("package.qnproject"), "10 attributes");
-    EXPECT_EQ(withoutTime("fifo.mov"), "0 attributes");
-    EXPECT_EQ(withoutTime("link to file.mov"), "0 plain attributes");
-    EXPECT_EQ(withoutTime("link to folder"), "0 attributes");
-    EXPECT_EQ(withoutTime("link to nothing.mov"), "0");
-    EXPECT_EQ(withoutTime("hidden.mov"), "64 plain attributes");
-    EXPECT_EQ(withoutTime("hidden folder"), "72 attributes");
-    EXPECT_EQ(withoutTime(".dotted.mov"), "64 plain attributes");
+    EXPECT_EQ(toldOf("file.mov"), "0 plain attributes");
+    EXPECT_EQ(toldOf("folder"), "8 attributes");
+    EXPECT_EQ(toldOf("package.qnproject"), "10 attributes");
+    EXPECT_EQ(toldOf("fifo.mov"), "0 attributes");
+    EXPECT_EQ(toldOf("link to file.mov"), "0 plain attributes");
+    EXPECT_EQ(toldOf("link to folder"), "0 attributes");
+    EXPECT_EQ(toldOf("link to nothing.mov"), "0");
+    EXPECT_EQ(toldOf("hidden.mov"), "64 plain attributes");
+    EXPECT_EQ(toldOf("hidden folder"), "72 attributes");
+    EXPECT_EQ(toldOf(".dotted.mov"), "64 plain attributes");
 }
 
 TEST_F(FolderTest, AFolderThatCantBeListedIsNil) {
@@ -117,30 +141,29 @@ TEST_F(FolderTest, AFolderThatCantBeListedIsNil) {
     EXPECT_EQ(log_.lines().size(), 1u);
 }
 
-TEST_F(FolderTest, AnEntryThatVanishesIsNothing) {
+TEST_F(FolderTest, AFileThatVanishesHasNoAttributes) {
     home_.writeFile("a.mov");
     const auto folder = open();
     home_.remove("a.mov");
-    EXPECT_EQ(folder->names(), std::vector<std::string>{"a.mov"});
-    EXPECT_EQ(text(folder->entryNamed("a.mov")), "nothing");
-    EXPECT_EQ(attribute(*folder, "a.mov"), "missing");
+    ASSERT_EQ(folder->items().size(), 1u);
+    EXPECT_EQ(folder->attributesOf(folder->items()[0]), std::nullopt);
+    EXPECT_EQ(attribute(*folder, "a.mov"), "out of reach");
     EXPECT_THAT(log_.lines(), IsEmpty());
 }
 
-TEST_F(FolderTest, AFolderThatVanishesHasNoEntries) {
-    home_.writeFile("inner/a.mov");
-    const auto folder = files_.openFolderAtPath(home_.path("inner"));
-    home_.remove("inner");
-    EXPECT_EQ(text(folder->entryNamed("a.mov")), "nothing");
+TEST_F(FolderTest, WhatWasNoFileAndVanishesIsNothing) {
+    home_.makeFifo("a.mov");
+    const auto folder = open();
+    home_.remove("a.mov");
+    EXPECT_EQ(told(*folder, folder->items()[0]), "nothing");
     EXPECT_THAT(log_.lines(), IsEmpty());
 }
 
 TEST_F(FolderTest, HiddenFileInAnyCaseOfLettersHidesAsByPath) {
     home_.writeFile("a.mov");
     home_.writeFile(".HIDDEN", "a.mov\n");
-    const auto entry = open()->entryNamed("a.mov");
-    ASSERT_TRUE(entry);
-    EXPECT_EQ(entry->flags, files_.itemFlagsAtPath(home_.path("a.mov")));
+    const auto folder = open();
+    EXPECT_EQ(folder->flagsOf(itemNamed(*folder, "a.mov")), files_.itemFlagsAtPath(home_.path("a.mov")));
 }
 
 TEST_F(FolderTest, AttributesAreReadBesideFilesWithoutAny) {

@@ -20,38 +20,40 @@ class PathFolder final : public platform::Folder {
     static std::unique_ptr<platform::Folder> open(const platform::FileManager& files,
                                                   const std::string& path) {
         auto names = files.contentsOfDirectoryAtPath(path);
-        return names ? std::make_unique<PathFolder>(files, path, std::move(*names)) : nullptr;
+        return names ? std::make_unique<PathFolder>(files, path, *names) : nullptr;
     }
-    PathFolder(const platform::FileManager& files, std::string path, std::vector<std::string> names)
-        : files_(files), path_(std::move(path)), names_(std::move(names)) {}
+    PathFolder(const platform::FileManager& files, std::string path, const std::vector<std::string>& names)
+        : files_(files), path_(std::move(path)) {
+        for (const std::string& name : names)
+            items_.push_back({name});
+    }
 
-    const std::vector<std::string>& names() const override { return names_; }
-    std::optional<platform::FolderEntry> entryNamed(const std::string& name) const override {
-        const std::string item = pathOf(name);
-        const auto flags = files_.itemFlagsAtPath(item);
-        if (!flags)
-            return std::nullopt;
-        platform::FolderEntry entry;
-        entry.flags = *flags;
-        std::error_code ignored;
-        entry.isPlainFile = std::filesystem::is_regular_file(item, ignored);
-        const auto attributes = files_.attributesOfItemAtPath(item);
-        entry.hasAttributes = attributes.has_value();
-        if (attributes && attributes->creationDate)
-            entry.creationTime = attributes->creationDate->secondsSince1970();
-        return entry;
+    const std::vector<platform::FolderItem>& items() const override { return items_; }
+    std::optional<std::uint32_t> flagsOf(const platform::FolderItem& item) const override {
+        return files_.itemFlagsAtPath(pathOf(item));
     }
-    std::ptrdiff_t extendedAttribute(const std::string& name, const platform::FolderEntry&,
-                                     std::string_view attribute, std::span<char> buffer) const override {
-        return files_.extendedAttribute(pathOf(name), attribute, buffer);
+    bool isPlainFile(const platform::FolderItem& item) const override {
+        std::error_code ignored;
+        return std::filesystem::is_regular_file(pathOf(item), ignored);
+    }
+    std::optional<platform::FileAttributes> attributesOf(const platform::FolderItem& item) const override {
+        return files_.attributesOfItemAtPath(pathOf(item));
+    }
+    std::optional<std::ptrdiff_t> extendedAttributeOf(const platform::FolderItem& item,
+                                                      std::string_view attribute,
+                                                      std::span<char> buffer) const override {
+        const auto size = files_.extendedAttribute(pathOf(item), attribute, buffer);
+        return size >= 0 ? std::optional(size) : std::nullopt;
     }
 
   private:
-    std::string pathOf(const std::string& name) const { return platform::path::appending(path_, name); }
+    std::string pathOf(const platform::FolderItem& item) const {
+        return platform::path::appending(path_, item.name);
+    }
 
     const platform::FileManager& files_;
     const std::string path_;
-    const std::vector<std::string> names_;
+    std::vector<platform::FolderItem> items_;
 };
 
 }  // namespace testing_support

@@ -1,0 +1,187 @@
+#include "events/EventLibraryScan.h"
+
+#include <algorithm>
+
+#include "core/ProcessCaches.h"
+#include "host/VXMediaBrowserUtilities.h"
+#include "platform/Path.h"
+#include "platform/Services.h"
+
+namespace reelix {
+
+using platform::Locked;
+
+namespace {
+
+namespace path = platform::path;
+
+constexpr int yearWithoutCreationDate = -1;
+
+bool isHiddenName(const std::string& name) {
+    return name.empty() || name.front() == '.';
+}
+
+constexpr std::uint32_t containerOrInvisible = platform::itemIsContainer | platform::itemIsInvisible;
+
+// Whether the item is there and of the flags that decide has these alone.
+bool hasFlags(const std::optional<std::uint32_t>& flags, std::uint32_t decidingFlags) {
+    return flags && (*flags & containerOrInvisible) == decidingFlags;
+}
+
+bool listContains(const platform::Array& list, std::initializer_list<std::string_view> texts) {
+    return std::any_of(list.begin(), list.end(), [&](const platform::Value& entry) {
+        return entry.string() && std::find(texts.begin(), texts.end(), *entry.string()) != texts.end();
+    });
+}
+
+// Whether a file that the host does not know as a movie is one by its content.
+bool isMovieByMetadata(const vexo::VXMetadataProperties& properties) {
+    if (const auto types = properties.valueForKey(vexo::kMDItemMediaTypes); types && types->array())
+        return listContains(*types->array(), {"Video", "MPEG1 Muxed"});
+    if (const auto tree = properties.valueForKey(vexo::kMDItemContentTypeTree); tree && tree->array())
+        return listContains(*tree->array(), {"public.video", "public.movie"});
+    return false;
+}
+
+bool isSupportedMovie(const std::string& clip, bool isPlainFile) {
+    return isPlainFile ? vexo::VXMediaBrowserUtilities::supportedPlainFile(clip)
+                       : vexo::VXMediaBrowserUtilities::supportedMovieFile(clip);
+}
+
+bool hasUsableYear(const platform::CalendarDateRef& date) {
+    return date && 0 <= date->yearOfCommonEra() && date->yearOfCommonEra() <= 9999;
+}
+
+int creationYear(const platform::DateRef& creationDate) {
+    return creationDate ? platform::yearInCurrentCalendar(*creationDate) : yearWithoutCreationDate;
+}
+
+// The paths of the folders in a library that may be events.
+std::vector<std::string> eventFolders(const platform::Folder& library, const std::string& libraryFolder) {
+    std::vector<std::string> folders;
+    for (const platform::FolderItem& item : library.items()) {
+        if (!isHiddenName(item.name) && hasFlags(library.flagsOf(item), platform::itemIsContainer))
+            folders.push_back(path::appending(libraryFolder, item.name));
+    }
+    return folders;
+}
+
+}  // namespace
+
+VXReelixPlugin::EventLibraryScan::EventLibraryScan(VXReelixPlugin& plugin, std::string libraryFolder)
+    : plugin_(plugin),
+      texts_(plugin),
+      locale_(platform::Locale::current()),
+      libraryFolder_(std::move(libraryFolder)),
+      work_([this] { return scanNextClips(); }) {}
+
+bool VXReelixPlugin::EventLibraryScan::hasEntries() const {
+    Locked lock(mutex_);
+    return hasEntries_;
+}
+
+const std::deque<VXReelixPlugin::ScannedEvent>& VXReelixPlugin::EventLibraryScan::events() const {
+    Locked lock(mutex_);
+    return events_;
+}
+
+bool VXReelixPlugin::EventLibraryScan::scanNextClips() {
+    const std::optional<Piece> piece = takePiece();
+    if (!piece)
+        return false;
+    for (std::size_t i = piece->begin; i < piece->end; ++i)
+        piece->event->clips[i] = clipForFile(*piece->folder, piece->event->folder, piece->folder->items()[i]);
+    return true;
+}
+
+std::optional<VXReelixPlugin::EventLibraryScan::Piece> VXReelixPlugin::EventLibraryScan::takePiece() {
+    Locked lock(mutex_);
+    if (!isOpened_)
+        openLibrary();
+    if (!folder_)
+        openNextFolder();
+    if (!folder_)
+        return std::nullopt;
+    const std::size_t itemCount = folder_->items().size();
+    Piece piece{folder_, &events_.back(), nextItem_, std::min(nextItem_ + clipsAPiece, itemCount)};
+    nextItem_ = piece.end;
+    if (nextItem_ == itemCount)
+        folder_.reset();
+    return piece;
+}
+
+void VXReelixPlugin::EventLibraryScan::openLibrary() {
+    isOpened_ = true;
+    const auto library = platform::services().fileManager.openFolderAtPath(libraryFolder_);
+    if (!library)
+        return;
+    hasEntries_ = !library->items().empty();
+    folders_ = eventFolders(*library, libraryFolder_);
+}
+
+// Leaves no folder open when there is none left. An empty folder is no event. A folder counts as open last:
+// should making its event raise, the other thread must not take it for that of the event before.
+void VXReelixPlugin::EventLibraryScan::openNextFolder() {
+    while (!folder_ && nextFolder_ < folders_.size()) {
+        const std::string& path = folders_[nextFolder_++];
+        auto folder = platform::services().fileManager.openFolderAtPath(path);
+        if (!folder || folder->items().empty())
+            continue;
+        events_.push_back({path, plugin_.eventGroupForFolder(path, libraryFolder_),
+                           std::vector<std::optional<ScannedClip>>(folder->items().size())});
+        nextItem_ = 0;
+        folder_ = std::move(folder);
+    }
+}
+
+// A file that is a movie only by its metadata gets its item before its date is known, and keeps its whole
+// name for that reason. That is deliberate.
+//
+// The attributes of a file are read only where they are needed: for a date when the clip has none of its own,
+// and to tell whether a file is there that did not tell so itself.
+std::optional<VXReelixPlugin::ScannedClip> VXReelixPlugin::EventLibraryScan::clipForFile(
+    const platform::Folder& folder, const platform::Value& eventFolder,
+    const platform::FolderItem& item) const {
+    if (isHiddenName(item.name) || !hasFlags(folder.flagsOf(item), 0))
+        return std::nullopt;
+    const std::string clip = path::appending(*eventFolder.string(), item.name);
+    Object mediaObject;
+    if (!isSupportedMovie(clip, folder.isPlainFile(item))) {
+        if (!isMovieByMetadata(*vexo::VXMediaObject::spotlightProperties(clip)))
+            return std::nullopt;
+        mediaObject = newClip(item.name, clip);
+    }
+    ClipDateValue value;
+    const auto valueSize = folder.extendedAttributeOf(item, clipDateAttribute, value.room());
+    auto clipDate = valueSize.value_or(0) > 0 ? value.date() : nullptr;
+    if (!clipDate)
+        clipDate = PathDate::dateFromFileName(item.name, texts_);
+    const bool hasYear = hasUsableYear(clipDate);
+    const auto attributes = valueSize && hasYear ? platform::FileAttributes{} : folder.attributesOf(item);
+    if (!attributes)
+        return std::nullopt;
+    if (!mediaObject)
+        mediaObject = newClip(clipName(clipDate, item.name), clip);
+    mediaObject->setAttribute(eventFolder, vexo::VXReelixProjectPathKey);
+
+    const int year = hasYear ? clipDate->yearOfCommonEra() : creationYear(attributes->creationDate);
+    return ScannedClip{mediaObject, year, clipDate ? clipDate : attributes->creationDate};
+}
+
+VXReelixPlugin::Object VXReelixPlugin::EventLibraryScan::newClip(const std::string& name,
+                                                                 const std::string& clip) const {
+    const Object mediaObject = plugin_.newMediaObjectWithType(vexo::VXMediaTypeMovie, name, clip);
+    mediaObject->setMediaSourceType(vexo::VXMediaSourceTypeFile);
+    mediaObject->setPath(clip);
+    mediaObject->setSpotlightProperties(vexo::VXMediaObject::spotlightProperties(clip));
+    mediaObject->setIcon(iconCache().smallApplicationIcon.get());
+    return mediaObject;
+}
+
+std::string VXReelixPlugin::EventLibraryScan::clipName(const platform::CalendarDateRef& date,
+                                                       const std::string& fileName) const {
+    return date ? date->descriptionWithCalendarFormat(texts_.displayFormat, locale_)
+                : path::withoutExtension(fileName);
+}
+
+}  // namespace reelix
