@@ -62,11 +62,13 @@ TEST_F(EnvironmentTest, TheTreeIsTheSameInOddOnes) {
     ASSERT_EQ(plain.status, 0) << plain.errors;
     ASSERT_THAT(plain.output, HasSubstr("2009-07-01"));
     const std::string file = elsewhere.writeFile("file"), folder = elsewhere.makeFolder("folder");
+    // In each the home or the cache is a folder of the test's, so that nothing lands in the user's own.
     const std::vector<std::string> odd[] = {
-        {"-uHOME", "-uPATH", "-uXDG_CACHE_HOME", "-uLANG", "-uLC_ALL", "-uTERM", "TZ=UTC0"},
-        {"HOME=", "XDG_CACHE_HOME=", "XDG_DATA_HOME=", "XDG_DATA_DIRS=", "XDG_CONFIG_HOME=", "PATH=", "LANG=",
+        {"-uHOME", "-uPATH", "-uLANG", "-uLC_ALL", "-uTERM", "TZ=UTC0"},
+        {"HOME=" + folder,
+         "XDG_CACHE_HOME=", "XDG_DATA_HOME=", "XDG_DATA_DIRS=", "XDG_CONFIG_HOME=", "PATH=", "LANG=",
          "LC_ALL=", "LANGUAGE=", "TERM=", "TMPDIR=", "VEXO_PLUGIN_PATH=", "VEXO_MEDIA_READER=", "TZ=UTC0"},
-        {"HOME=relative", "XDG_CACHE_HOME=relative", "XDG_DATA_HOME=./here", "XDG_DATA_DIRS=a:./b:..",
+        {"HOME=" + folder, "XDG_CACHE_HOME=relative", "XDG_DATA_HOME=./here", "XDG_DATA_DIRS=a:./b:..",
          "XDG_CONFIG_HOME=c", "XDG_RUNTIME_DIR=r", "PATH=.:bin", "VEXO_PLUGIN_PATH=plugins:.", "TZ=UTC0"},
         {"HOME=/nowhere", "XDG_CACHE_HOME=/nowhere", "XDG_DATA_HOME=/nowhere", "XDG_DATA_DIRS=/nowhere",
          "TMPDIR=/nowhere", "VEXO_PLUGIN_PATH=/nowhere", "VEXO_MEDIA_READER=/nowhere", "TZ=Nowhere/Unknown"},
@@ -77,8 +79,9 @@ TEST_F(EnvironmentTest, TheTreeIsTheSameInOddOnes) {
          "TZ=../../../etc/passwd"},
         {"HOME=/" + longText, "XDG_CACHE_HOME=/" + longText, "XDG_DATA_DIRS=/" + longText, "TZ=" + longText,
          "VEXO_PLUGIN_PATH=" + longText, "LANGUAGE=" + longText, "LC_ALL=" + longText, "PATH=" + longText},
-        {"COLUMNS=99999999999999999999", "NO_COLOR=\xff", "DBUS_SESSION_BUS_ADDRESS=nonsense:",
-         "LANG=\xff\xfe", "LANGUAGE=%s%n", "LC_MESSAGES=../../..", "TZ=\xff"},
+        {"HOME=relative", "COLUMNS=99999999999999999999", "NO_COLOR=\xff",
+         "DBUS_SESSION_BUS_ADDRESS=nonsense:", "LANG=\xff\xfe", "LANGUAGE=%s%n", "LC_MESSAGES=../../..",
+         "TZ=\xff"},
     };
     for (const auto& settings : odd) {
         const Outcome outcome = tree(settings);
