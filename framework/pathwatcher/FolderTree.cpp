@@ -75,6 +75,7 @@ FolderTree::~FolderTree() {
 }
 
 int FolderTree::watch() {
+    latestContent_ = {};
     const int error = follow(*top_);
     if (top_->watch >= 0)
         explore(*top_, Discovery::initial);
@@ -114,9 +115,20 @@ void FolderTree::heardOfItself(Folder& folder, const FileEvent& event) {
 }
 
 void FolderTree::heardOfContent(Folder& folder, const FileEvent& event) {
+    if (isContentKnown(folder, event.name))
+        return;
     if (folder.package && !typeOfFile(event.name).isMovie)
         return markChanged(folder);
     means_.burst.add(reportedPath_, platform::path::appending(pathBelow(reportedPath_, folder), event.name));
+}
+
+// Writing a file is several events in a row, which say the same to a burst.
+bool FolderTree::isContentKnown(const Folder& folder, std::string_view name) {
+    const std::uint64_t burst = means_.burst.number();
+    if (latestContent_.watch == folder.watch && latestContent_.burst == burst && latestContent_.name == name)
+        return true;
+    latestContent_ = {folder.watch, std::string(name), burst};
+    return false;
 }
 
 // The folder may be gone afterwards.
@@ -132,6 +144,7 @@ void FolderTree::lost(Folder& folder, bool unmounted) {
 // A folder that was moved here may be known, from a listing or because it was here before. What happened in
 // it while it was elsewhere was looked for here, in vain; so it is explored anew.
 void FolderTree::examine(Folder& parent, const std::string& name, Known whatIsKnown) {
+    latestContent_ = {};  // a folder that was moved may have kept its watch
     auto found = std::make_unique<Folder>(*this, &parent, name);
     follow(*found);
     const auto known = parent.children.find(name);

@@ -11,6 +11,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <unordered_map>
 #include <vector>
 
@@ -65,6 +66,7 @@ class FolderTree {
     void heard(Folder& folder, const FileEvent& event);
     void heardOfItself(Folder& folder, const FileEvent& event);
     void heardOfContent(Folder& folder, const FileEvent& event);
+    bool isContentKnown(const Folder& folder, std::string_view name);
     void lost(Folder& folder, bool unmounted);
 
     void examine(Folder& parent, const std::string& name, Known whatIsKnown = Known::isKept);
@@ -84,12 +86,21 @@ class FolderTree {
     template <typename Visit>
     void visitAll(Visit visit) const;
 
+    // A file whose content changed in a burst. Watches have numbers of their own as long as the tree is
+    // watched.
+    struct Content {
+        int watch = -1;
+        std::string name;
+        std::uint64_t burst = 0;
+    };
+
     WatchMeans& means_;
     Owner& owner_;
     const std::string path_;
     const std::string reportedPath_;
     std::unordered_map<std::uint64_t, Folder*> polledFolders_;  // by place
     std::unique_ptr<Folder> top_;
+    Content latestContent_;
 };
 
 }  // namespace vexo

@@ -70,6 +70,24 @@ TEST_F(FolderChanges, ContentIsAChangeOfTheFile) {
     EXPECT_EQ(reportsOf([&] { appendTo(text); }), Paths{text});
 }
 
+TEST_F(FolderChanges, AFileThatIsWrittenAgainAndAgainIsReportedOnceInEachBurst) {
+    const std::string file = folder.writeFile("one/a.mov"), namesake = folder.writeFile("two/a.mov");
+    watch(folder.path());
+    for (int burst = 0; burst < 3; ++burst) {
+        EXPECT_EQ(reportsOf([&] {
+                      appendTo(file);
+                      appendTo(file);
+                  }),
+                  Paths{file});
+    }
+    EXPECT_EQ(reportsOf([&] {
+                  appendTo(file);
+                  appendTo(namesake);
+                  appendTo(file);
+              }),
+              (Paths{file, namesake}));
+}
+
 TEST_F(FolderChanges, AFileThatReplacesAnotherIsAChangeOfTheFolder) {
     const std::string file = folder.writeFile("sub/clip.mov", "a");
     const std::string replacement = folder.writeFile("sub/.clip.mov.tmp", "b");
