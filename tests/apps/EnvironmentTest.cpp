@@ -70,8 +70,9 @@ TEST_F(EnvironmentTest, TheTreeIsTheSameInOddOnes) {
          "LC_ALL=", "LANGUAGE=", "TERM=", "TMPDIR=", "VEXO_PLUGIN_PATH=", "VEXO_MEDIA_READER=", "TZ=UTC0"},
         {"HOME=" + folder, "XDG_CACHE_HOME=relative", "XDG_DATA_HOME=./here", "XDG_DATA_DIRS=a:./b:..",
          "XDG_CONFIG_HOME=c", "XDG_RUNTIME_DIR=r", "PATH=.:bin", "VEXO_PLUGIN_PATH=plugins:.", "TZ=UTC0"},
-        {"HOME=/nowhere", "XDG_CACHE_HOME=/nowhere", "XDG_DATA_HOME=/nowhere", "XDG_DATA_DIRS=/nowhere",
-         "TMPDIR=/nowhere", "VEXO_PLUGIN_PATH=/nowhere", "VEXO_MEDIA_READER=/nowhere", "TZ=Nowhere/Unknown"},
+        {"HOME=/proc/nowhere", "XDG_CACHE_HOME=/proc/nowhere", "XDG_DATA_HOME=/proc/nowhere",
+         "XDG_DATA_DIRS=/proc/nowhere", "TMPDIR=/proc/nowhere", "VEXO_PLUGIN_PATH=/proc/nowhere",
+         "VEXO_MEDIA_READER=/proc/nowhere", "TZ=Nowhere/Unknown"},
         {"HOME=" + file, "XDG_CACHE_HOME=" + file, "XDG_DATA_HOME=" + file, "XDG_DATA_DIRS=" + file,
          "TMPDIR=" + file, "VEXO_PLUGIN_PATH=" + file, "VEXO_MEDIA_READER=" + folder, "TZ=:"},
         {"XDG_CACHE_HOME=/dev/null", "XDG_DATA_DIRS=::/dev/zero::", "VEXO_PLUGIN_PATH=::::",
@@ -107,8 +108,8 @@ TEST_F(EnvironmentTest, WithoutAUsableHomeItIsThatOfThePasswordDatabase) {
 }
 
 TEST_F(EnvironmentTest, AHomeThatIsNotThereIsAnEmptyOne) {
-    for (const std::string& odd :
-         {std::string("/nowhere"), elsewhere.writeFile("file"), std::string("/dev/null"), "/" + longText}) {
+    for (const std::string& odd : {std::string("/proc/nowhere"), elsewhere.writeFile("file"),
+                                   std::string("/dev/null"), "/" + longText}) {
         const Outcome outcome = run({"HOME=" + odd}, {"tree"});
         EXPECT_EQ(outcome.status, 0) << odd.substr(0, 100);
         EXPECT_THAT(outcome.output, HasSubstr("No Reelix projects or events"));
