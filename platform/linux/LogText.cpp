@@ -39,4 +39,11 @@ std::string failureLine(std::string_view operation, std::string_view path, int e
     return fmt::format("cannot {} {}: {}", operation, printable(path), g_strerror(error));
 }
 
+// Paths are absolute, operations hold no slash, and messages no colon.
+std::string_view pathInFailureLine(std::string_view line) {
+    const auto begin = line.find('/');
+    const auto end = line.rfind(": ");
+    return begin < end && end != line.npos ? line.substr(begin, end - begin) : line;
+}
+
 }  // namespace platform

@@ -11,5 +11,7 @@ std::string printable(std::string_view text);
 
 // "cannot <operation> <path>: <message of the system for the errno `error`>".
 std::string failureLine(std::string_view operation, std::string_view path, int error);
+// The path that such a line names, as it stands there; all of a line that names none.
+std::string_view pathInFailureLine(std::string_view line);
 
 }  // namespace platform
