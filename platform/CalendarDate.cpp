@@ -61,8 +61,7 @@ CalendarDate::CalendarDate(double secondsSinceReferenceDate, int secondsFromGMT)
     : Date(secondsSinceReferenceDate), secondsFromGMT_(secondsFromGMT) {}
 
 CalendarDateRef CalendarDate::dateWithString(std::string_view string, std::string_view calendarFormat) {
-    const Locale locale = Locale::current();
-    const auto fields = CalendarParser(string, locale).parse(calendarFormat);
+    const auto fields = CalendarParser(string).parse(calendarFormat);
     const auto civilTime = fields ? fields->civilTime() : std::nullopt;
     const auto zoned = civilTime ? zonedTime(secondsOf(*civilTime), *fields) : std::nullopt;
     if (!zoned)

@@ -153,7 +153,7 @@ bool CalendarParser::readHalfOfDay() {
 }
 
 bool CalendarParser::readName(NameKind kind, std::optional<int>& index) {
-    const auto match = CalendarNames::ofLocale(locale_)->match(kind, rest_);
+    const auto match = CalendarNames::ofLocale(Locale::current())->match(kind, rest_);
     if (!match)
         return false;
     rest_.remove_prefix(match->length);
@@ -162,7 +162,7 @@ bool CalendarParser::readName(NameKind kind, std::optional<int>& index) {
 }
 
 bool CalendarParser::readForm(LocaleForm form) {
-    const auto match = CalendarNames::ofLocale(locale_)->parse(form, rest_);
+    const auto match = CalendarNames::ofLocale(Locale::current())->parse(form, rest_);
     if (!match)
         return false;
     rest_.remove_prefix(match->length);

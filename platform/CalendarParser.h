@@ -31,10 +31,10 @@ struct ParsedFields {
     std::optional<CivilTime> civilTime() const;
 };
 
-// Reads one text once.
+// Reads one text once, by the names of the user's locale.
 class CalendarParser {
   public:
-    CalendarParser(std::string_view text, const Locale& locale) : rest_(text), locale_(locale) {}
+    explicit CalendarParser(std::string_view text) : rest_(text) {}
 
     // nil when the text does not match the format from its first byte to its last.
     std::optional<ParsedFields> parse(std::string_view format);
@@ -67,7 +67,6 @@ class CalendarParser {
     std::optional<int> sixtieths();
 
     std::string_view rest_;
-    const Locale& locale_;
     ParsedFields fields_;
 };
 

@@ -1,6 +1,6 @@
 #include "platform/CalendarPrinter.h"
 
-#include <fmt/format.h>
+#include <fmt/compile.h>
 
 #include <cstdlib>
 
@@ -14,7 +14,7 @@ namespace {
 
 // At least four digits after the sign.
 std::string yearText(int year) {
-    return fmt::format("{}{:04}", year < 0 ? "-" : "", std::abs(year));
+    return fmt::format(FMT_COMPILE("{}{:04}"), year < 0 ? "-" : "", std::abs(year));
 }
 
 int yearOfCentury(int year) {
@@ -34,8 +34,12 @@ CalendarPrinter::CalendarPrinter(std::int64_t seconds, int milliseconds, int sec
 std::string CalendarPrinter::print(std::string_view format) const {
     std::string text;
     FormatReader reader(format);
-    while (const auto piece = reader.next())
-        text += piece->isConversion() ? conversion(piece->conversion) : std::string(piece->literal);
+    while (const auto piece = reader.next()) {
+        if (piece->isConversion())
+            text += conversion(piece->conversion);
+        else
+            text += piece->literal;
+    }
     return text;
 }
 
@@ -44,27 +48,27 @@ std::string CalendarPrinter::conversion(char letter) const {
         case 'Y':
             return yearText(time_.year);
         case 'y':
-            return fmt::format("{:02}", yearOfCentury(time_.year));
+            return fmt::format(FMT_COMPILE("{:02}"), yearOfCentury(time_.year));
         case 'm':
-            return fmt::format("{:02}", time_.month);
+            return fmt::format(FMT_COMPILE("{:02}"), time_.month);
         case 'd':
-            return fmt::format("{:02}", time_.day);
+            return fmt::format(FMT_COMPILE("{:02}"), time_.day);
         case 'e':
-            return fmt::format("{}", time_.day);
+            return fmt::format(FMT_COMPILE("{}"), time_.day);
         case 'j':
-            return fmt::format("{:03}", dayOfYear(time_));
+            return fmt::format(FMT_COMPILE("{:03}"), dayOfYear(time_));
         case 'w':
-            return fmt::format("{}", dayOfWeek(time_));
+            return fmt::format(FMT_COMPILE("{}"), dayOfWeek(time_));
         case 'H':
-            return fmt::format("{:02}", time_.hour);
+            return fmt::format(FMT_COMPILE("{:02}"), time_.hour);
         case 'I':
-            return fmt::format("{:02}", (time_.hour + 11) % 12 + 1);
+            return fmt::format(FMT_COMPILE("{:02}"), (time_.hour + 11) % 12 + 1);
         case 'M':
-            return fmt::format("{:02}", time_.minute);
+            return fmt::format(FMT_COMPILE("{:02}"), time_.minute);
         case 'S':
-            return fmt::format("{:02}", time_.second);
+            return fmt::format(FMT_COMPILE("{:02}"), time_.second);
         case 'F':
-            return fmt::format("{:03}", milliseconds_);
+            return fmt::format(FMT_COMPILE("{:03}"), milliseconds_);
         case 'z':
             return zoneOffset();
         case 'Z':
@@ -99,9 +103,9 @@ std::string CalendarPrinter::inLocale(char letter) const {
 // "+0100"; with seconds where the offset has some, as those before standard time do: "+005328".
 std::string CalendarPrinter::zoneOffset() const {
     const std::int64_t size = std::abs(std::int64_t{secondsFromGMT_});
-    std::string text =
-        fmt::format("{}{:02}{:02}", secondsFromGMT_ < 0 ? '-' : '+', size / 3600, size / 60 % 60);
-    return size % 60 == 0 ? text : text + fmt::format("{:02}", size % 60);
+    std::string text = fmt::format(FMT_COMPILE("{}{:02}{:02}"), secondsFromGMT_ < 0 ? '-' : '+', size / 3600,
+                                   size / 60 % 60);
+    return size % 60 == 0 ? text : text + fmt::format(FMT_COMPILE("{:02}"), size % 60);
 }
 
 // A date knows its offset only; the local zone has a name for it when it is the local one.

@@ -52,13 +52,15 @@ std::vector<ZonedTime> timesOfLocalClock(std::int64_t civilSeconds) {
     const int offsetBefore = zoneAt(civilSeconds - beyondAnyOffset).secondsFromGMT;
     const int offsetAfter = zoneAt(civilSeconds + beyondAnyOffset).secondsFromGMT;
     const ZonedTime byOffsetBefore = zoneAt(civilSeconds - offsetBefore);
-    const ZonedTime byOffsetAfter = zoneAt(civilSeconds - offsetAfter);
 
     std::vector<ZonedTime> times;
     if (clockShows(byOffsetBefore, civilSeconds))
         times.push_back(byOffsetBefore);
-    if (offsetAfter != offsetBefore && clockShows(byOffsetAfter, civilSeconds))
-        times.push_back(byOffsetAfter);
+    if (offsetAfter != offsetBefore) {
+        const ZonedTime byOffsetAfter = zoneAt(civilSeconds - offsetAfter);
+        if (clockShows(byOffsetAfter, civilSeconds))
+            times.push_back(byOffsetAfter);
+    }
     if (times.empty())
         times.push_back(byOffsetBefore);
     return times;
