@@ -136,9 +136,6 @@ void VXReelixPlugin::EventLibraryScan::openNextFolder() {
 
 // A file that is a movie only by its metadata gets its item before its date is known, and keeps its whole
 // name for that reason. That is deliberate.
-//
-// The attributes of a file are read only where they are needed: for a date when the clip has none of its own,
-// and to tell whether a file is there that did not tell so itself.
 std::optional<VXReelixPlugin::ScannedClip> VXReelixPlugin::EventLibraryScan::clipForFile(
     const platform::Folder& folder, const platform::Value& eventFolder,
     const platform::FolderItem& item) const {
@@ -151,21 +148,32 @@ std::optional<VXReelixPlugin::ScannedClip> VXReelixPlugin::EventLibraryScan::cli
             return std::nullopt;
         mediaObject = newClip(item.name, clip);
     }
-    ClipDateValue value;
-    const auto valueSize = folder.extendedAttributeOf(item, clipDateAttribute, value.room());
-    auto clipDate = valueSize.value_or(0) > 0 ? value.date() : nullptr;
-    if (!clipDate)
-        clipDate = PathDate::dateFromFileName(item.name, texts_);
-    const bool hasYear = hasUsableYear(clipDate);
-    const auto attributes = valueSize && hasYear ? platform::FileAttributes{} : folder.attributesOf(item);
-    if (!attributes)
+    const auto dates = datesOfClip(folder, item);
+    if (!dates)
         return std::nullopt;
     if (!mediaObject)
-        mediaObject = newClip(clipName(clipDate, item.name), clip);
+        mediaObject = newClip(clipName(dates->own, item.name), clip);
     mediaObject->setAttribute(eventFolder, vexo::VXReelixProjectPathKey);
+    return ScannedClip{mediaObject, dates->year, dates->own ? dates->own : dates->creation};
+}
 
-    const int year = hasYear ? clipDate->yearOfCommonEra() : creationYear(attributes->creationDate);
-    return ScannedClip{mediaObject, year, clipDate ? clipDate : attributes->creationDate};
+// The attributes of a file are read only where they are needed: for the year when the clip's own date has
+// none, and to tell whether a file is there that did not show it by its extended attributes.
+std::optional<VXReelixPlugin::EventLibraryScan::ClipDates> VXReelixPlugin::EventLibraryScan::datesOfClip(
+    const platform::Folder& folder, const platform::FolderItem& item) const {
+    ClipDateValue value;
+    const auto valueSize = folder.extendedAttributeOf(item, clipDateAttribute, value.room());
+    auto own = valueSize.value_or(0) > 0 ? value.date() : nullptr;
+    if (!own)
+        own = PathDate::dateFromFileName(item.name, texts_);
+    const bool hasYear = hasUsableYear(own);
+    if (hasYear && valueSize)
+        return ClipDates{own, nullptr, own->yearOfCommonEra()};
+    const auto attributes = folder.attributesOf(item);
+    if (!attributes)
+        return std::nullopt;
+    const auto& creation = attributes->creationDate;
+    return ClipDates{own, creation, hasYear ? own->yearOfCommonEra() : creationYear(creation)};
 }
 
 VXReelixPlugin::Object VXReelixPlugin::EventLibraryScan::newClip(const std::string& name,

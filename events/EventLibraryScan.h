@@ -59,6 +59,12 @@ class VXReelixPlugin::EventLibraryScan {
         std::size_t end;
     };
 
+    struct ClipDates {
+        platform::CalendarDateRef own;  // of the attribute or the name; nil for none
+        platform::DateRef creation;     // nil also where it isn't needed
+        int year;
+    };
+
     // False when everything has been taken.
     bool scanNextClips() VX_EXCLUDES(mutex_);
     std::optional<Piece> takePiece() VX_EXCLUDES(mutex_);
@@ -66,6 +72,9 @@ class VXReelixPlugin::EventLibraryScan {
     void openNextFolder() VX_REQUIRES(mutex_);
     std::optional<ScannedClip> clipForFile(const platform::Folder& folder, const platform::Value& eventFolder,
                                            const platform::FolderItem& item) const;
+    // nil for a file that is not there.
+    std::optional<ClipDates> datesOfClip(const platform::Folder& folder,
+                                         const platform::FolderItem& item) const;
     Object newClip(const std::string& name, const std::string& clip) const;
     std::string clipName(const platform::CalendarDateRef& date, const std::string& fileName) const;
 
