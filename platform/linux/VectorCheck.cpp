@@ -3,7 +3,6 @@
 #include <expat.h>
 #include <glib.h>
 
-#include <cstdint>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -12,7 +11,9 @@ namespace platform {
 
 namespace {
 
+constexpr std::size_t mostBytes = 1024 * 1024;
 constexpr std::size_t mostElements = 20'000;
+constexpr std::size_t mostText = 4096;  // bytes; laying out a word of a megabyte takes gigabytes
 
 bool isUTF8(std::span<const std::byte> data) {
     return g_utf8_validate_len(reinterpret_cast<const char*>(data.data()), data.size(), nullptr);
@@ -35,13 +36,18 @@ bool isReference(std::string_view attribute) {
     return attribute == "href" || attribute.ends_with(":href");
 }
 
+bool isText(std::string_view element) {
+    return element == "text" || element.ends_with(":text");
+}
+
 class Check {
   public:
     Check() {
         XML_SetUserData(parser_.get(), this);
         XML_SetXmlDeclHandler(parser_.get(), encodingDeclared);
         XML_SetEntityDeclHandler(parser_.get(), entityDeclared);
-        XML_SetStartElementHandler(parser_.get(), elementBegan);
+        XML_SetElementHandler(parser_.get(), elementBegan, elementEnded);
+        XML_SetCharacterDataHandler(parser_.get(), textCame);
     }
     bool passes(std::span<const std::byte> data) {
         return XML_Parse(parser_.get(), reinterpret_cast<const char*>(data.data()),
@@ -63,8 +69,9 @@ class Check {
                                        const XML_Char*, const XML_Char*, const XML_Char*, const XML_Char*) {
         static_cast<Check*>(self)->refuse();
     }
-    static void XMLCALL elementBegan(void* self, const XML_Char*, const XML_Char** attributes) {
+    static void XMLCALL elementBegan(void* self, const XML_Char* name, const XML_Char** attributes) {
         Check& check = *static_cast<Check*>(self);
+        check.textsAround_ += isText(name);
         if (++check.elements_ > mostElements)
             check.refuse();
         for (; *attributes; attributes += 2)
@@ -72,14 +79,25 @@ class Check {
                 check.refuse();
     }
 
+    static void XMLCALL elementEnded(void* self, const XML_Char* name) {
+        static_cast<Check*>(self)->textsAround_ -= isText(name);
+    }
+    static void XMLCALL textCame(void* self, const XML_Char*, int length) {
+        Check& check = *static_cast<Check*>(self);
+        if (check.textsAround_ > 0 && (check.text_ += static_cast<std::size_t>(length)) > mostText)
+            check.refuse();
+    }
+
     std::unique_ptr<XML_ParserStruct, Free> parser_{XML_ParserCreate(nullptr)};
     std::size_t elements_ = 0;
+    int textsAround_ = 0;
+    std::size_t text_ = 0;  // within them
 };
 
 }  // namespace
 
 bool isHarmlessVector(std::span<const std::byte> data) {
-    return data.size() <= INT32_MAX && isUTF8(data) && Check().passes(data);
+    return data.size() <= mostBytes && isUTF8(data) && Check().passes(data);
 }
 
 }  // namespace platform

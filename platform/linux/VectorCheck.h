@@ -9,8 +9,8 @@ namespace platform {
 // Whether an SVG may be drawn. Refused is what isn't XML in UTF-8, because a rule about a text holds only for
 // an encoding that everybody reads alike; what declares entities, whose text librsvg never frees and which
 // may stand for a multiple of itself; what embeds other files, which would be unpacked to any size by
-// whatever decoders are installed; and what has more elements than an icon could show. How long the drawing
-// takes is not known before.
+// whatever decoders are installed; and what is larger, or has more elements or words, than an icon that could
+// be seen. How long the drawing takes is not known before.
 bool isHarmlessVector(std::span<const std::byte> data);
 
 }  // namespace platform

@@ -73,6 +73,20 @@ TEST(VectorCheck, MoreElementsThanAnyIconHasAreRefused) {
     EXPECT_TRUE(isHarmless(svg(shapes.substr(4))));
 }
 
+TEST(VectorCheck, MoreTextThanAnyIconShowsIsRefused) {
+    const std::string text(4096, 'x');
+    EXPECT_TRUE(isHarmless(svg("<text>" + text + "</text><title>" + text + "</title>")));
+    EXPECT_FALSE(isHarmless(svg("<text>" + text + "</text><text>x</text>")));
+    EXPECT_FALSE(isHarmless(svg("<text><tspan>x</tspan>" + text + "</text>")));
+}
+
+TEST(VectorCheck, WhatIsLargerThanAnyIconIsRefused) {
+    const std::string rest = svg("<title></title>");
+    const std::string title(1024 * 1024 - rest.size(), 'x');
+    EXPECT_TRUE(isHarmless(svg("<title>" + title + "</title>")));
+    EXPECT_FALSE(isHarmless(svg("<title>x" + title + "</title>")));
+}
+
 TEST(VectorCheck, WhatIsNoXMLIsRefused) {
     for (const std::string text : {"", "no picture", "<svg", "<svg></g>", "<svg/><svg/>"})
         EXPECT_FALSE(isHarmless(text)) << text;
