@@ -38,7 +38,8 @@ std::optional<std::ptrdiff_t> attributeInFolder(int folder, const char* file, co
         return std::nullopt;
     AttributeArguments arguments{reinterpret_cast<std::uintptr_t>(buffer.data()),
                                  static_cast<std::uint32_t>(buffer.size()), 0};
-    const long size = syscall(getxattratNumber, folder, file, 0, name, &arguments, sizeof(arguments));
+    const long size = uninterrupted(
+        [&] { return syscall(getxattratNumber, folder, file, 0, name, &arguments, sizeof(arguments)); });
     if (size >= 0)
         return size;
     if (errno != ENOSYS && errno != EPERM)
@@ -78,7 +79,8 @@ AttributedFile::AttributedFile(int folder, const std::string& folderPath, const 
 std::ptrdiff_t AttributedFile::attribute(const std::string& name, std::span<char> buffer) const {
     if (const auto size = attributeInFolder(folder_, name_.c_str(), name.c_str(), buffer))
         return *size;
-    const auto size = getxattr(path().c_str(), name.c_str(), buffer.data(), buffer.size());
+    const auto size =
+        uninterrupted([&] { return getxattr(path().c_str(), name.c_str(), buffer.data(), buffer.size()); });
     return size >= 0 ? size : -errno;
 }
 

@@ -38,8 +38,7 @@ FolderItem::Kind kindOf(const dirent& entry) {
 std::optional<std::vector<FolderItem>> readItems(DIR* folder) {
     std::vector<FolderItem> items;
     for (;;) {
-        errno = 0;
-        const dirent* const entry = readdir(folder);
+        const dirent* const entry = uninterrupted([folder] { return readdir(folder); });
         if (!entry)
             break;
         if (!isDotOrDotDot(entry->d_name))

@@ -161,6 +161,23 @@ int statfs(const char* path, struct statfs* fileSystem) noexcept {
     return fails("statfs", path) ? -1 : real(path, fileSystem);
 }
 
+// What the C library has no name for.
+long syscall(long number, ...) noexcept {
+    constexpr long getxattrat = 464;
+    using Function = long(long, ...) noexcept;
+    static const auto real = reinterpret_cast<Function*>(dlsym(RTLD_NEXT, "syscall"));
+    std::array<long, 6> given{};
+    std::va_list arguments;
+    va_start(arguments, number);
+    for (long& argument : given)
+        argument = va_arg(arguments, long);
+    va_end(arguments);
+    if (number == getxattrat &&
+        fails("getxattrat", static_cast<int>(given[0]), reinterpret_cast<const char*>(given[1])))
+        return -1;
+    return real(number, given[0], given[1], given[2], given[3], given[4], given[5]);
+}
+
 ssize_t getxattr(const char* path, const char* name, void* value, size_t size) noexcept {
     static const auto real = original(&::getxattr, "getxattr");
     return fails("getxattr", path) ? -1 : real(path, name, value, size);
