@@ -24,13 +24,21 @@ std::string WatchRegistrations::registeredForm(std::string path) {
 
 void WatchRegistrations::add(const std::string& path, const Subscriber& subscriber) {
     Locked lock(mutex_);
-    std::erase_if(subscribersByPath_, [](const auto& entry) {
-        return std::none_of(entry.second.begin(), entry.second.end(), isLiving);
-    });
+    forgetGone();
     auto& subscribers = subscribersByPath_[registeredForm(path)];
     std::erase_if(subscribers,
                   [&](const Subscriber& known) { return known.isGone() || known == subscriber; });
     subscribers.push_back(subscriber);
+}
+
+// Only when the paths have doubled: looking at all of them for each new one takes seconds for thousands.
+void WatchRegistrations::forgetGone() {
+    if (subscribersByPath_.size() < sizeToForgetAt_)
+        return;
+    std::erase_if(subscribersByPath_, [](const auto& entry) {
+        return std::none_of(entry.second.begin(), entry.second.end(), isLiving);
+    });
+    sizeToForgetAt_ = 2 * subscribersByPath_.size() + 1;
 }
 
 bool WatchRegistrations::covers(const std::string& path, const Subscriber& subscriber) const {

@@ -34,9 +34,11 @@ class WatchRegistrations {
     template <typename Predicate>
     std::optional<std::string> findAncestor(const std::string& path, Predicate matches) const
         VX_REQUIRES(mutex_);
+    void forgetGone() VX_REQUIRES(mutex_);
 
     mutable platform::Mutex mutex_;
     std::map<std::string, std::vector<Subscriber>> subscribersByPath_ VX_GUARDED_BY(mutex_);
+    std::size_t sizeToForgetAt_ VX_GUARDED_BY(mutex_) = 0;
 };
 
 }  // namespace vexo

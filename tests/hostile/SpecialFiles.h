@@ -8,8 +8,8 @@
 
 namespace testing_support {
 
-// Makes each kind of them in the folder of a path, with names that begin with the path's last component: a
-// FIFO, a socket and, where the test may, devices. Answers the names' paths.
+// Makes one of each kind, a FIFO, a socket and, where the test may, devices: at `path`, which ends in a slash
+// or with the beginning of a name, followed by the kind and the extension. Answers their paths in the home.
 std::vector<std::string> makeSpecialFiles(const TemporaryFolder& home, const std::string& path,
                                           const std::string& extension);
 
