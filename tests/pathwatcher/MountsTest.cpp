@@ -1,9 +1,9 @@
 // Watched paths on mounts: of every kind by a made-up mount table, and real ones that come and go.
 #include <filesystem>
 
-#include "tests/pathwatcher/DeadMount.h"
 #include "tests/pathwatcher/FakeMounts.h"
 #include "tests/pathwatcher/WatcherTest.h"
+#include "tests/support/DeadMount.h"
 #include "tests/support/LoopImage.h"
 
 using namespace testing_support;

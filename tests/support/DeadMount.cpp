@@ -1,8 +1,9 @@
-#include "tests/pathwatcher/DeadMount.h"
+#include "tests/support/DeadMount.h"
 
 #include <fcntl.h>
 #include <fmt/format.h>
 #include <linux/fuse.h>
+#include <poll.h>
 #include <sys/mount.h>
 
 #include <array>
@@ -53,9 +54,11 @@ void DeadMount::greet() const {
         throw std::runtime_error(std::string("cannot greet the kernel: ") + std::strerror(errno));
 }
 
+// What the server has read not even the end of a process gets out of.
 void DeadMount::awaitRequest() const {
-    Request request{};
-    readRequest(server_.number(), request);
+    pollfd request{server_.number(), POLLIN, 0};
+    if (poll(&request, 1, /*timeout=*/-1) != 1)
+        throw std::runtime_error(std::string("cannot wait for a request: ") + std::strerror(errno));
 }
 
 }  // namespace testing_support

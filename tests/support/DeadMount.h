@@ -1,4 +1,4 @@
-// A mount whose server takes requests and never answers: whoever looks at it waits until the mount goes.
+// A mount whose server never answers: whoever looks at it waits until the mount goes.
 #pragma once
 
 #include <string>
