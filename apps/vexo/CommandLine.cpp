@@ -7,6 +7,7 @@
 #include <iostream>
 
 #include "apps/vexo/Commands.h"
+#include "apps/vexo/Departure.h"
 #include "apps/vexo/Paths.h"
 #include "apps/vexo/Progress.h"
 #include "apps/vexo/Terminal.h"
@@ -381,13 +382,17 @@ Problems runWithHost(const HostCommand& command, Arguments& arguments) {
     options.homeDirectory = arguments.home;
     options.pluginBundles = arguments.plugins;
     options.verbosity = arguments.verbose ? Verbosity::verbose : Verbosity::normal;
+    const Departure departure;  // of the host as well
     Host host(options);
     const auto warningOwner = std::make_shared<int>();
     // A verbose host's log shows warnings already.
     if (!arguments.quiet && !arguments.verbose)
         host.diagnostics().addWarningObserver(warningOwner, showWarning);
     const Problem problem = command.needs == Needs::plugins ? loadPlugins(host) : std::nullopt;
-    return problem ? Problems{*problem} : command.run(host);
+    Problems problems = problem ? Problems{*problem} : command.run(host);
+    std::cout.flush();
+    departure.begin();
+    return problems;
 }
 
 }  // namespace

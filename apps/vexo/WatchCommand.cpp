@@ -104,8 +104,10 @@ bool load(Host& host, MainLoop& loop) {
     while (!host.waitUntilLoaded(std::chrono::milliseconds(50))) {
         line.show(fmt::format("Reading the libraries… {} s", line.elapsed().count()));
         loop.runPending();
-        if (loop.isEnded())
+        if (loop.isEnded()) {
             host.cancelLoading();
+            return false;
+        }
     }
     loop.runPending();
     return !loop.isEnded();

@@ -1,0 +1,22 @@
+// The end of a program in which something may be waiting for a file system that doesn't answer. Nothing but
+// the end of the process gets a thread out of that.
+#pragma once
+
+namespace vexo {
+
+// One at a time, of the main thread.
+class Departure {
+  public:
+    static constexpr unsigned secondsAtMost = 3;
+
+    Departure() = default;
+    // The program got away by itself.
+    ~Departure();
+    Departure(const Departure&) = delete;
+    Departure& operator=(const Departure&) = delete;
+
+    // From now on the object has to go within `secondsAtMost`, or the process is ended with a message.
+    static void begin();
+};
+
+}  // namespace vexo
