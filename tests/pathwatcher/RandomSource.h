@@ -10,7 +10,8 @@ namespace testing_support {
 
 class RandomSource {
   public:
-    RandomSource() : engine_(seed_) {}
+    RandomSource() : RandomSource(chosenSeed()) {}
+    explicit RandomSource(unsigned seed) : seed_(seed), engine_(seed_) {}
 
     unsigned seed() const { return seed_; }
     // 0 up to, but not including, `end`.
@@ -29,7 +30,7 @@ class RandomSource {
         return text ? static_cast<unsigned>(std::strtoul(text, nullptr, 10)) : std::random_device()();
     }
 
-    const unsigned seed_ = chosenSeed();
+    const unsigned seed_;
     std::mt19937 engine_;
 };
 

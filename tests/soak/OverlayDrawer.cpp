@@ -1,0 +1,37 @@
+#include "tests/soak/Actors.h"
+#include "tests/soak/TreePick.h"
+
+namespace soak {
+namespace {
+
+class OverlayDrawer final : public Actor {
+  public:
+    OverlayDrawer(vexo::Host& host, unsigned seed) : Actor(seed), host_(host) {}
+
+    std::string name() const override { return "overlays"; }
+
+    void act() override {
+        static constexpr Deed<OverlayDrawer> deeds[] = {{"draw", &OverlayDrawer::draw}};
+        doOneOf(*this, deeds);
+    }
+
+  private:
+    bool draw() {
+        const PickedItem picked = anyItem(host_, chance);
+        if (!picked.item)
+            return false;
+        const auto overlay = managerOf(host_).thumbnailOverlayForMediaObject(
+            picked.item, {picked.group}, {double(64 + chance.below(200)), 96});
+        return overlay && overlay->picture()->draw(128, 96);
+    }
+
+    vexo::Host& host_;
+};
+
+}  // namespace
+
+ActorRef newOverlayDrawer(vexo::Host& host, unsigned seed) {
+    return std::make_unique<OverlayDrawer>(host, seed);
+}
+
+}  // namespace soak
