@@ -705,7 +705,7 @@ TEST(MetadataIndex, LiesInTheUsersCacheFolder) {
     EXPECT_EQ(MetadataIndex::defaultPath(), "/home/kim/.cache/vexo/metadata.sqlite");
     // Then the home is that of the password database, as it is for libraries.
     for (const char* const noHome : {static_cast<const char*>(nullptr), "", "relative"}) {
-        const ScopedEnvironment home("HOME", noHome);
+        const ScopedEnvironment unusable("HOME", noHome);
         const auto known = platform::LinuxFileManager::userHomeDirectory();
         EXPECT_EQ(MetadataIndex::defaultPath(),
                   known ? std::optional(*known + "/.cache/vexo/metadata.sqlite") : std::nullopt);
