@@ -1,7 +1,7 @@
 // Reads any bytes as a binary property list. What can be read must survive both written forms.
-#include <cstdlib>
 #include <string_view>
 
+#include "fuzzing/Require.h"
 #include "platform/BinaryPropertyList.h"
 #include "platform/PropertyList.h"
 #include "platform/PropertyListLimits.h"
@@ -9,11 +9,6 @@
 using namespace platform;
 
 namespace {
-
-void require(bool holds) {
-    if (!holds)
-        std::abort();
-}
 
 // Compares bytes, because a value that holds not-a-number is not equal to itself.
 void requireTheSameAfterRewriting(const Value& value) {

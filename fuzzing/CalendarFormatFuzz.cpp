@@ -2,9 +2,9 @@
 // the text.
 #include <cstddef>
 #include <cstdint>
-#include <cstdlib>
 #include <string_view>
 
+#include "fuzzing/Require.h"
 #include "platform/CalendarDate.h"
 
 namespace {
@@ -12,11 +12,6 @@ namespace {
 constexpr std::string_view everything = "%Y %y %m %d %e %H %I %M %S %F %j %p %a %A %b %B %c %x %X %w %z %Z";
 constexpr std::string_view exact = "%Y-%m-%d %H:%M:%S.%F %z";
 constexpr double exactYears = 1e14;  // farther away, seconds have no milliseconds
-
-void require(bool condition) {
-    if (!condition)
-        std::abort();
-}
 
 // A date that can be printed exactly is read as the same date again.
 void requireThatItComesBack(const platform::CalendarDate& date, const platform::Locale& locale) {

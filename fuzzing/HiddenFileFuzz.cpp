@@ -1,14 +1,17 @@
-// Lists of hidden names: every name is a line of the file.
+// Lists of hidden names: every name is a line of the file, and every line is one.
 #include <cstdint>
-#include <cstdlib>
 
+#include "fuzzing/Require.h"
 #include "platform/linux/HiddenNames.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     const std::string_view content(reinterpret_cast<const char*>(data), size);
-    for (const auto& name : platform::namesInHiddenFile(content))
-        if (name.empty() || name.find('\n') != std::string::npos ||
-            content.find(name) == std::string_view::npos)
-            std::abort();
+    const std::string lines = "\n" + std::string(content) + "\n";
+    const auto names = platform::namesInHiddenFile(content);
+    for (const auto& name : names) {
+        require(!name.empty() && name.find('\n') == std::string::npos);
+        require(lines.find("\n" + name + "\n") != std::string::npos);
+    }
+    require(names.contains(content.substr(0, content.find('\n'))) == (size > 0 && content.front() != '\n'));
     return 0;
 }

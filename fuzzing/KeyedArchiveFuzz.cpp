@@ -1,7 +1,8 @@
 // Opens any bytes as a keyed archive and looks around in it, with errors that raise and with errors that
 // count as unreadable. Nothing but ArchiveError may come out, and nothing at all in the second case.
-#include <cstdlib>
+#include <cstdint>
 
+#include "fuzzing/Require.h"
 #include "platform/KeyedUnarchiver.h"
 
 using namespace platform;
@@ -41,8 +42,8 @@ void lookAround(std::span<const std::uint8_t> bytes) {
         if (!object)
             return;
         static_cast<void>(object->description());
-        if (unarchiver.decodeObjectForKey("root") && object->objectForKey(key) != object->objectForKey(key))
-            std::abort();
+        if (unarchiver.decodeObjectForKey("root"))
+            require(object->objectForKey(key) == object->objectForKey(key));
         object = object->objectForKey(key);
     }
 }
@@ -58,7 +59,6 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     const RejectedArchivesAsUnreadable scope(
         [](const ArchiveError&, void* count) { ++*static_cast<int*>(count); }, &reportCount);
     lookAround({data, size});
-    if (reportCount > 1)
-        std::abort();
+    require(reportCount <= 1);
     return 0;
 }

@@ -1,20 +1,15 @@
 // Queries over made-up properties: whatever the text, an error lies within it, and a query with its opposite
 // and with itself means what logic says. The input is the query, a NUL, and the text of a property.
 #include <cstdint>
-#include <cstdlib>
 #include <string>
 
 #include "framework/queries/QueryExpression.h"
+#include "fuzzing/Require.h"
 
 namespace {
 
 using vexo::QueryExpression;
 using vexo::QuerySyntaxError;
-
-void require(bool condition) {
-    if (!condition)
-        std::abort();
-}
 
 // One property of each kind, by the first letter of its key.
 class MadeUpProperties final : public vexo::VXMetadataProperties {

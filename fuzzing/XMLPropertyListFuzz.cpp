@@ -1,18 +1,13 @@
 // Reads any bytes as an XML property list. What can be read must survive being written as XML once and for
 // all.
-#include <cstdlib>
 #include <string_view>
 
+#include "fuzzing/Require.h"
 #include "platform/PropertyList.h"
 
 using namespace platform;
 
 namespace {
-
-void require(bool holds) {
-    if (!holds)
-        std::abort();
-}
 
 void requireTheSameAfterRewriting(const Value& value, PropertyListFormat format) {
     const Data once = dataWithPropertyList(value, format);

@@ -15,7 +15,7 @@
 
 namespace platform {
 
-class StandInFileManager final : public FileManager {
+class StandInFileManager : public FileManager {
   public:
     std::optional<std::string> home;
 
