@@ -45,6 +45,7 @@ void VXReelixPlugin::loadData() {
 }
 
 VXReelixPlugin::Group VXReelixPlugin::performLoadData() {
+    ++loadsBegun_;
     Locked monitor(_monitor);
     if (!_ReelixSearchPaths)
         _prepareReelixProjectsSearchPaths();

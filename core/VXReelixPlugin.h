@@ -259,6 +259,17 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     void scheduleProjectsReload();
     void scheduleEventsReload();
 
+    struct LoadState {
+        unsigned begun;  // loads, ever
+        bool isLoading;
+    };
+    LoadState loadState() const;
+    // Has both branches read again when a load went on since `whenScanned`: its tree may have come in the
+    // place of the one that a reload has published, or the other way round.
+    void reloadAgainAfterLoads(const LoadState& whenScanned);
+
+    std::atomic<unsigned> loadsBegun_ = 0;
+
     EventScansAhead* eventScansAhead_ VX_GUARDED_BY(_monitor) = nullptr;  // while a load goes on
 };
 

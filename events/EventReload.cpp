@@ -54,6 +54,7 @@ VXReelixPlugin::Group VXReelixPlugin::_reloadReelixEvents(const std::optional<st
         Locked monitor(_monitor);
         scanEventLibraries(holder);
     }
+    const LoadState whenScanned = loadState();
     if (isCancelLoadRequestPending())
         return nullptr;
 
@@ -82,6 +83,7 @@ VXReelixPlugin::Group VXReelixPlugin::_reloadReelixEvents(const std::optional<st
         }
         if (root)
             setRootMediaGroup(root);
+        reloadAgainAfterLoads(whenScanned);
     }
     return eventLibrary->childGroups().empty() ? nullptr : eventLibrary;
 }

@@ -53,6 +53,7 @@ VXMediaGroupList VXReelixPlugin::_reloadReelixProjects(bool updateRoot) {
         _flatProjectGroupsList = std::make_unique<Groups>();
         scanProjectLibraries(libraries);
     }
+    const LoadState whenScanned = loadState();
     if (!libraries.empty() && updateRoot && !isCancelLoadRequestPending()) {
         const Group& merged = libraries.front();
         for (std::size_t i = 1; i < libraries.size(); ++i)
@@ -66,6 +67,7 @@ VXMediaGroupList VXReelixPlugin::_reloadReelixProjects(bool updateRoot) {
         }
         if (root)
             setRootMediaGroup(root);
+        reloadAgainAfterLoads(whenScanned);
     }
 
     VXMediaGroupList groups;

@@ -106,4 +106,17 @@ void VXReelixPlugin::scheduleEventsReload() {
             reloadDelay, [plugin = self()] { plugin->_reloadReelixEvents(); });
 }
 
+// In this order: a load that begins in between is then seen by its number.
+VXReelixPlugin::LoadState VXReelixPlugin::loadState() const {
+    const unsigned begun = loadsBegun_;
+    return {begun, isLoading()};
+}
+
+void VXReelixPlugin::reloadAgainAfterLoads(const LoadState& whenScanned) {
+    if (!whenScanned.isLoading && whenScanned.begun == loadsBegun_)
+        return;
+    scheduleProjectsReload();
+    scheduleEventsReload();
+}
+
 }  // namespace reelix
