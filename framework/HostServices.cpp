@@ -17,8 +17,12 @@ std::atomic<const HostServices*> currentServices = nullptr;
 
 }  // namespace
 
+const HostServices* hostServicesIfAny() {
+    return currentServices.load(std::memory_order_acquire);
+}
+
 const HostServices& hostServices() {
-    if (const HostServices* services = currentServices.load(std::memory_order_acquire))
+    if (const HostServices* services = hostServicesIfAny())
         return *services;
     throw std::logic_error("the host's services are used before a host exists");
 }

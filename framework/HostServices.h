@@ -21,6 +21,9 @@ struct HostServices {
 // Requires: a HostServicesScope exists.
 const HostServices& hostServices();
 
+// nil where no host is in place: items and images may outlive theirs.
+const HostServices* hostServicesIfAny();
+
 // Puts services in place and, when it goes, the ones before it back. Made and destroyed while no other thread
 // uses them.
 class HostServicesScope {

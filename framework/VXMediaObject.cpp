@@ -34,6 +34,13 @@ std::string_view lastingText(std::string_view key) {
     return texts.lasting(key);
 }
 
+// Of a file that nobody reads any more, because the item's host has ended.
+class NoProperties final : public VXMetadataProperties {
+  public:
+    std::optional<platform::Value> valueForKey(std::string_view) const override { return std::nullopt; }
+    platform::Dictionary allValues() const override { return {}; }
+};
+
 std::optional<platform::Size> resolutionOf(const VXMetadataProperties& properties) {
     const auto width = properties.valueForKey(kMDItemPixelWidth);
     const auto height = properties.valueForKey(kMDItemPixelHeight);
@@ -111,9 +118,10 @@ platform::ImageRef VXMediaObject::thumbnailImage() const {
             return thumbnailImage_;
     }
     const std::optional<std::string> file = path();
-    if (!file)
+    const HostServices* const host = hostServicesIfAny();
+    if (!file || !host)
         return nullptr;
-    const platform::ImageRef image = hostServices().thumbnails.thumbnailOfFile(*file);
+    const platform::ImageRef image = host->thumbnails.thumbnailOfFile(*file);
     Locked lock(mutex_);
     if (!thumbnailImage_)  // else another thread was first
         thumbnailImage_ = image;
@@ -181,7 +189,8 @@ platform::Dictionary VXMediaObject::attributes() const {
 }
 
 void VXMediaObject::setSpotlightProperties(VXMetadataPropertiesRef properties) {
-    const bool areOfID = properties && hostServices().metadata.areUnreadPropertiesOfFile(*properties, ID_);
+    const HostServices* const host = hostServicesIfAny();
+    const bool areOfID = properties && host && host->metadata.areUnreadPropertiesOfFile(*properties, ID_);
     VXMetadataPropertiesRef kept = areOfID ? nullptr : properties;
     Locked lock(mutex_);
     propertiesAreOfID_ = areOfID;
@@ -202,7 +211,9 @@ VXMetadataPropertiesRef VXMediaObject::spotlightProperties() const {
 }
 
 VXMetadataPropertiesRef VXMediaObject::spotlightProperties(const std::string& path) {
-    return hostServices().metadata.propertiesForFile(path);
+    if (const HostServices* const host = hostServicesIfAny())
+        return host->metadata.propertiesForFile(path);
+    return std::make_shared<NoProperties>();
 }
 
 std::optional<std::string> VXMediaObject::aliasResolvedPath() const {

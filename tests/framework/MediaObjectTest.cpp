@@ -200,5 +200,26 @@ TEST_F(MediaObjectTest, ALinkKeepsItsOwnPath) {
     EXPECT_EQ(VXMediaObject::aliasResolvedPath(link), link);
 }
 
+TEST(ItemOfAnEndedHost, KnowsItsNameAndNothingOfItsFile) {
+    VXMediaObject movie(VXMediaTypeMovie, "name", "/a.mov");
+    {
+        const testing_support::HostEnvironment environment;
+        const MetadataStore store(std::nullopt, nullptr);
+        const HostServices& fake = hostServices();
+        const HostServicesScope scope(
+            {fake.pathWatcher, fake.imageManager, store, fake.thumbnails, fake.diagnostics});
+        movie.setPath("/a.mov");
+        movie.setSpotlightProperties(VXMediaObject::spotlightProperties("/a.mov"));
+    }
+    EXPECT_EQ(movie.name(), "name");
+    EXPECT_DOUBLE_EQ(movie.duration(), 0);
+    EXPECT_EQ(movie.thumbnailImage(), nullptr);
+    const auto properties = movie.spotlightProperties();
+    ASSERT_NE(properties, nullptr);
+    EXPECT_TRUE(properties->allValues().empty());
+    movie.setSpotlightProperties(properties);
+    EXPECT_EQ(movie.spotlightProperties(), properties);
+}
+
 }  // namespace
 }  // namespace vexo
