@@ -17,6 +17,11 @@ constexpr std::uint32_t folderKinds =
 // What happens to other folders themselves is an event of the folders around them.
 constexpr std::uint32_t topKinds = folderKinds | IN_DELETE_SELF | IN_MOVE_SELF;
 
+// Which files of the folder are hidden, and which attributes the file has whose name follows.
+bool tellsOfOtherFiles(std::string_view name) {
+    return name == ".hidden" || name.starts_with("._");
+}
+
 }  // namespace
 
 class FolderTree::Folder final : public EventListener {
@@ -117,7 +122,7 @@ void FolderTree::heardOfItself(Folder& folder, const FileEvent& event) {
 void FolderTree::heardOfContent(Folder& folder, const FileEvent& event) {
     if (isContentKnown(folder, event.name))
         return;
-    if (folder.package && !typeOfFile(event.name).isMovie)
+    if (tellsOfOtherFiles(event.name) || (folder.package && !typeOfFile(event.name).isMovie))
         return markChanged(folder);
     means_.burst.add(reportedPath_, platform::path::appending(pathBelow(reportedPath_, folder), event.name));
 }

@@ -4,7 +4,7 @@
 // From then on each path is watched, whatever is there and whatever becomes of it, and observers hear, a
 // moment after it happened (ChangeBurst::length) and on any thread:
 // - when something appeared, vanished, was renamed or got other attributes: the folder in which it happened;
-// - when the content of a file changed: the file;
+// - when the content of a file changed: the file, or its folder where the content tells of other files;
 // - of anything inside a package: the package, except for the content of a movie, which is reported itself;
 // - when the watched path itself appeared, vanished or leads elsewhere, when its events were lost, and when
 //   it is a file that changed: the watched path.

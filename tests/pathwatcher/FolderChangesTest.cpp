@@ -88,6 +88,14 @@ TEST_F(FolderChanges, AFileThatIsWrittenAgainAndAgainIsReportedOnceInEachBurst) 
               (Paths{file, namesake}));
 }
 
+TEST_F(FolderChanges, ContentThatTellsOfOtherFilesIsAChangeOfTheFolder) {
+    const std::string hidden = folder.writeFile("sub/.hidden", "a.mov\n");
+    const std::string attributes = folder.writeFile("other/._a.mov", "dates");
+    watch(folder.path());
+    EXPECT_EQ(reportsOf([&] { appendTo(hidden); }), Paths{folder.path("sub")});
+    EXPECT_EQ(reportsOf([&] { appendTo(attributes); }), Paths{folder.path("other")});
+}
+
 TEST_F(FolderChanges, AFileThatReplacesAnotherIsAChangeOfTheFolder) {
     const std::string file = folder.writeFile("sub/clip.mov", "a");
     const std::string replacement = folder.writeFile("sub/.clip.mov.tmp", "b");
