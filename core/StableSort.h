@@ -7,6 +7,8 @@
 
 #include <algorithm>
 #include <cstddef>
+#include <iterator>
+#include <utility>
 #include <vector>
 
 #include "platform/Text.h"
@@ -15,18 +17,19 @@ namespace reelix {
 
 namespace detail {
 
-// Merges two neighbouring runs of `from`; the right element goes first only where the left one is greater.
+// Moves two neighbouring runs of `from` into one; the right element goes first only where the left one is
+// greater.
 template <typename T, typename Comparison>
-void mergeRuns(const std::vector<T>& from, std::size_t begin, std::size_t middle, std::size_t end,
+void mergeRuns(std::vector<T>& from, std::size_t begin, std::size_t middle, std::size_t end,
                std::vector<T>& into, const Comparison& compare) {
     std::size_t left = begin;
     std::size_t right = middle;
     while (left < middle && right < end) {
         const bool rightFirst = compare(from[left], from[right]) == platform::ComparisonResult::descending;
-        into.push_back(from[rightFirst ? right++ : left++]);
+        into.push_back(std::move(from[rightFirst ? right++ : left++]));
     }
-    into.insert(into.end(), from.begin() + left, from.begin() + middle);
-    into.insert(into.end(), from.begin() + right, from.begin() + end);
+    std::move(from.begin() + left, from.begin() + middle, std::back_inserter(into));
+    std::move(from.begin() + right, from.begin() + end, std::back_inserter(into));
 }
 
 }  // namespace detail

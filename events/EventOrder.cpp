@@ -1,6 +1,7 @@
 #include "events/EventOrder.h"
 
 #include "core/ReelixConstants.h"
+#include "core/StableSort.h"
 
 namespace reelix::ReelixSupport {
 namespace {
@@ -14,20 +15,27 @@ ComparisonResult compareNumbers(const T& a, const T& b) {
     return b < a ? ComparisonResult::descending : ComparisonResult::same;
 }
 
-// What the comparisons look at.
+// What the comparisons by year look at.
 struct EventKeys {
-    explicit EventKeys(const vexo::VXMediaGroup& group) : attributes(group.attributes()) {}
-
-    std::optional<double> year() const {
-        const platform::Value* value = platform::find(*attributes, VXReelixEventCreationYear);
-        return value ? value->doubleValue() : std::nullopt;
+    explicit EventKeys(VXMediaGroupRef group)
+        : event(std::move(group)),
+          attributes(event->attributes()),
+          oldest(date(VXReelixEventOldestClipDate)),
+          newest(date(VXReelixEventNewestClipDate)) {
+        if (const platform::Value* value = platform::find(*attributes, VXReelixEventCreationYear))
+            year = value->doubleValue();
     }
+
     platform::DateRef date(std::string_view key) const {
         const platform::Value* value = platform::find(*attributes, key);
         return value ? value->date() : nullptr;
     }
 
-    const std::shared_ptr<const platform::Dictionary> attributes;
+    VXMediaGroupRef event;
+    std::shared_ptr<const platform::Dictionary> attributes;
+    std::optional<double> year;
+    platform::DateRef oldest;
+    platform::DateRef newest;
 };
 
 // A missing date compares as same.
@@ -45,6 +53,30 @@ ComparisonResult compareNames(const vexo::VXMediaGroup& a, const vexo::VXMediaGr
     return platform::caseInsensitiveCompare(*nameOfA, *nameOfB);
 }
 
+ComparisonResult compareOldestFirst(const EventKeys& a, const EventKeys& b) {
+    if (!a.year || !b.year)
+        return ComparisonResult::same;
+    if (const auto byYear = compareNumbers(*a.year, *b.year); byYear != ComparisonResult::same)
+        return byYear;
+    if (!a.oldest || !b.oldest)
+        return ComparisonResult::same;
+    if (const auto byDate = compareDates(a.oldest, b.oldest); byDate != ComparisonResult::same)
+        return byDate;
+    return compareNames(*a.event, *b.event);
+}
+
+ComparisonResult compareNewestFirst(const EventKeys& a, const EventKeys& b) {
+    if (!a.year || !b.year)
+        return ComparisonResult::same;
+    if (const auto byYear = compareNumbers(*a.year, *b.year); byYear != ComparisonResult::same)
+        return platform::opposite(byYear);
+    if (!a.oldest || !b.oldest)
+        return ComparisonResult::same;
+    if (const auto byDate = compareDates(a.newest, b.newest); byDate != ComparisonResult::same)
+        return platform::opposite(byDate);
+    return compareNames(*a.event, *b.event);
+}
+
 bool isEventLibrary(const VXMediaGroupRef& group) {
     return group->typeIdentifier() == vexo::VXReelixEventLibraryGroupTypeIdentifier;
 }
@@ -52,39 +84,21 @@ bool isEventLibrary(const VXMediaGroupRef& group) {
 }  // namespace
 
 ComparisonResult _eventComparisonByYearOldestFirst(const VXMediaGroupRef& a, const VXMediaGroupRef& b) {
-    const EventKeys keysOfA(*a);
-    const EventKeys keysOfB(*b);
-    if (!keysOfA.year() || !keysOfB.year())
-        return ComparisonResult::same;
-    if (const auto byYear = compareNumbers(*keysOfA.year(), *keysOfB.year());
-        byYear != ComparisonResult::same)
-        return byYear;
-
-    const auto oldestOfA = keysOfA.date(VXReelixEventOldestClipDate);
-    const auto oldestOfB = keysOfB.date(VXReelixEventOldestClipDate);
-    if (!oldestOfA || !oldestOfB)
-        return ComparisonResult::same;
-    if (const auto byDate = compareDates(oldestOfA, oldestOfB); byDate != ComparisonResult::same)
-        return byDate;
-    return compareNames(*a, *b);
+    return compareOldestFirst(EventKeys(a), EventKeys(b));
 }
 
 ComparisonResult _eventComparisonByYearNewestFirst(const VXMediaGroupRef& a, const VXMediaGroupRef& b) {
-    const EventKeys keysOfA(*a);
-    const EventKeys keysOfB(*b);
-    if (!keysOfA.year() || !keysOfB.year())
-        return ComparisonResult::same;
-    if (const auto byYear = compareNumbers(*keysOfA.year(), *keysOfB.year());
-        byYear != ComparisonResult::same)
-        return platform::opposite(byYear);
+    return compareNewestFirst(EventKeys(a), EventKeys(b));
+}
 
-    if (!keysOfA.date(VXReelixEventOldestClipDate) || !keysOfB.date(VXReelixEventOldestClipDate))
-        return ComparisonResult::same;
-    const auto byDate =
-        compareDates(keysOfA.date(VXReelixEventNewestClipDate), keysOfB.date(VXReelixEventNewestClipDate));
-    if (byDate != ComparisonResult::same)
-        return platform::opposite(byDate);
-    return compareNames(*a, *b);
+vexo::VXMediaGroupList sortedByYear(const vexo::VXMediaGroupList& events, EventOrder order) {
+    const std::vector<EventKeys> keys(events.begin(), events.end());
+    std::vector<VXMediaGroupRef> sorted;
+    sorted.reserve(keys.size());
+    for (EventKeys& key :
+         stableSorted(keys, order == EventOrder::newestFirst ? compareNewestFirst : compareOldestFirst))
+        sorted.push_back(std::move(key.event));
+    return vexo::VXMediaGroupList(std::move(sorted));
 }
 
 ComparisonResult _eventComparisonAlphabetically(const VXMediaGroupRef& a, const VXMediaGroupRef& b) {

@@ -20,6 +20,12 @@ ComparisonResult _eventComparisonByYearOldestFirst(const vexo::VXMediaGroupRef& 
 ComparisonResult _eventComparisonByYearNewestFirst(const vexo::VXMediaGroupRef& a,
                                                    const vexo::VXMediaGroupRef& b);
 
+enum class EventOrder { oldestFirst, newestFirst };
+
+// Sorted by one of the two comparisons above. What these look at is asked of each event once, and not of two
+// events again and again.
+vexo::VXMediaGroupList sortedByYear(const vexo::VXMediaGroupList& events, EventOrder order);
+
 // _eventComparisonAlphabetically:; nothing in the plug-in sorts by it.
 ComparisonResult _eventComparisonAlphabetically(const vexo::VXMediaGroupRef& a,
                                                 const vexo::VXMediaGroupRef& b);

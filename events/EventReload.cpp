@@ -10,16 +10,12 @@
 namespace reelix {
 
 using platform::Locked;
+using ReelixSupport::EventOrder;
+using ReelixSupport::sortedByYear;
 using vexo::VXMediaGroupList;
 using vexo::VXPathWatcher;
 
 namespace {
-
-using Comparison = platform::ComparisonResult (*)(const vexo::VXMediaGroupRef&, const vexo::VXMediaGroupRef&);
-
-VXMediaGroupList sorted(const VXMediaGroupList& groups, Comparison comparison) {
-    return VXMediaGroupList(stableSorted(groups, comparison));
-}
 
 std::optional<platform::Value> yearOf(const vexo::VXMediaGroup& group) {
     const auto attributes = group.attributes();
@@ -58,11 +54,10 @@ VXReelixPlugin::Group VXReelixPlugin::_reloadReelixEvents(const std::optional<st
     if (isCancelLoadRequestPending())
         return nullptr;
 
-    const Comparison comparison = _mostRecentEventFirst ? &ReelixSupport::_eventComparisonByYearNewestFirst
-                                                        : &ReelixSupport::_eventComparisonByYearOldestFirst;
+    const EventOrder order = _mostRecentEventFirst ? EventOrder::newestFirst : EventOrder::oldestFirst;
     const Group eventLibrary = newEventLibraryGroup(parentID);
     YearGroups years;
-    for (const Group& event : sorted(holder->childGroups(), comparison)) {
+    for (const Group& event : sortedByYear(holder->childGroups(), order)) {
         if (isCancelLoadRequestPending())
             break;
         fileEventUnderItsYear(event, eventLibrary, years);
@@ -70,7 +65,7 @@ VXReelixPlugin::Group VXReelixPlugin::_reloadReelixEvents(const std::optional<st
     for (const Group& year : eventLibrary->childGroups()) {
         if (isCancelLoadRequestPending())
             break;
-        year->setChildGroups(sorted(year->childGroups(), comparison));
+        year->setChildGroups(sortedByYear(year->childGroups(), order));
     }
 
     if (updateRootMediaGroup && !isCancelLoadRequestPending()) {

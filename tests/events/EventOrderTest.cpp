@@ -199,6 +199,24 @@ TEST(SortedEvents, NewestFirst) {
               "late, winter, beach, Camping, early");
 }
 
+TEST(SortedEvents, AreThoseThatTheComparisonsSort) {
+    std::vector<VXMediaGroupRef> events;
+    for (int i = 0; i < 60; ++i) {
+        const auto year = i % 7 == 0 ? std::nullopt : std::optional(2000 + i * 5 % 4);
+        const auto oldest = i % 5 == 0 ? std::nullopt : std::optional(i * 7 % 3);
+        events.push_back(group({std::to_string(i * 31 % 60), year, oldest, i * 11 % 3}));
+    }
+    const vexo::VXMediaGroupList list(events);
+    const auto sorted = [&list](order::EventOrder by) {
+        const auto result = order::sortedByYear(list, by);
+        return std::vector<VXMediaGroupRef>(result.begin(), result.end());
+    };
+    EXPECT_EQ(sorted(order::EventOrder::oldestFirst),
+              reelix::stableSorted(events, order::_eventComparisonByYearOldestFirst));
+    EXPECT_EQ(sorted(order::EventOrder::newestFirst),
+              reelix::stableSorted(events, order::_eventComparisonByYearNewestFirst));
+}
+
 TEST(SortedEvents, EventsWithoutAYearAreAllKept) {
     std::vector<VXMediaGroupRef> events;
     for (int i = 0; i < 50; ++i)
