@@ -7,7 +7,7 @@ namespace vexo {
 // One at a time, of the main thread.
 class Departure {
   public:
-    static constexpr unsigned secondsAtMost = 3;
+    static constexpr unsigned secondsAtMost = 10;  // a busy machine may need some
 
     Departure() = default;
     // The program got away by itself.
