@@ -2,6 +2,7 @@
 #include <gtest/gtest.h>
 
 #include <atomic>
+#include <chrono>
 #include <thread>
 
 #include "framework/pathwatcher/ChangeFollower.h"
@@ -17,13 +18,17 @@ using namespace vexo;
 class EndlessTree final : public FolderAccess {
   public:
     static constexpr int end = 5000;
+    static constexpr int walked = 2;  // listings after which a walk is sure to be under way
 
     explicit EndlessTree(std::atomic<int>& listings) : listings_(listings) {}
 
     PathEntry look(const std::string&) const override { return {PathEntry::Kind::folder, "", 1, 1}; }
     FolderListing list(const std::string&) const override {
-        if (++listings_ == end)
+        const int listing = ++listings_;
+        if (listing == end)
             return {};
+        if (listing > walked)  // leaves the time to close, however busy the machine is
+            std::this_thread::sleep_for(std::chrono::milliseconds(1));
         return {0, /*isEmpty=*/false, {"d"}};
     }
 
@@ -58,7 +63,7 @@ TEST(ClosingAFollower, EndsAWalkThroughALargeTree) {
                             [](const std::string&) {});
 
     std::thread watching([&] { follower.watch("/endless"); });
-    while (listings < 3)
+    while (listings <= EndlessTree::walked)
         std::this_thread::yield();
     follower.close();
     watching.join();
