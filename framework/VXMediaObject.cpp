@@ -218,12 +218,14 @@ VXMetadataPropertiesRef VXMediaObject::spotlightProperties(const std::string& pa
 
 std::optional<std::string> VXMediaObject::aliasResolvedPath() const {
     const std::optional<std::string> itemPath = path();
-    if (!itemPath)
-        return std::nullopt;
+    if (!itemPath || !hostServicesIfAny())
+        return itemPath;
     return platform::services().fileManager.resolvedPath(*itemPath);
 }
 
 std::string VXMediaObject::aliasResolvedPath(const std::string& path) {
+    if (!hostServicesIfAny())  // which come after the platform's and go before them
+        return path;
     return platform::services().fileManager.resolvedPath(path).value_or(path);
 }
 

@@ -212,7 +212,7 @@ class FileMetadata final : public VXMetadataProperties {
 
     Dictionary allValues() const override {
         Dictionary values = mediaValues(media());
-        if (const auto file = foundFile(path_)) {
+        if (const auto file = fileWhileKept()) {
             values.merge(typeValues(*file));
             values.merge(statusValues(*file));
         }
@@ -220,9 +220,15 @@ class FileMetadata final : public VXMetadataProperties {
     }
 
   private:
+    // nil once the cache is gone as well: what finds a file on a volume has gone with it.
+    std::optional<FoundFile> fileWhileKept() const {
+        const auto cache = cache_.lock();
+        return cache ? foundFile(path_) : std::nullopt;
+    }
+
     // The values among which that for `key` would be.
     Dictionary fileValues(std::string_view key) const {
-        const auto file = foundFile(path_);
+        const auto file = fileWhileKept();
         if (!file)
             return {};
         return isTypeKey(key) ? typeValues(*file) : statusValues(*file);

@@ -221,5 +221,24 @@ TEST(ItemOfAnEndedHost, KnowsItsNameAndNothingOfItsFile) {
     EXPECT_EQ(movie.spotlightProperties(), properties);
 }
 
+TEST(ItemOfAnEndedHost, OnAVolumeRaisesNothing) {
+    const std::string file = "/Volumes/Footage/a.mov";
+    VXMediaObject movie(VXMediaTypeMovie, "name", file);
+    {
+        const testing_support::HostEnvironment environment;
+        const MetadataStore store(std::nullopt, nullptr);
+        const HostServices& fake = hostServices();
+        const HostServicesScope scope(
+            {fake.pathWatcher, fake.imageManager, store, fake.thumbnails, fake.diagnostics});
+        movie.setPath(file);
+        movie.setSpotlightProperties(VXMediaObject::spotlightProperties(file));
+        EXPECT_EQ(movie.spotlightProperties()->valueForKey(kMDItemFSName), std::nullopt);
+    }
+    EXPECT_EQ(movie.spotlightProperties()->valueForKey(kMDItemFSName), std::nullopt);
+    EXPECT_TRUE(movie.spotlightProperties()->allValues().empty());
+    EXPECT_EQ(movie.aliasResolvedPath(), file);
+    EXPECT_EQ(VXMediaObject::aliasResolvedPath(file), file);
+}
+
 }  // namespace
 }  // namespace vexo
