@@ -191,6 +191,7 @@ TEST_F(CommandLineTest, QuietLeavesWarningsOut) {
 
 TEST_F(CommandLineTest, AFolderThatCannotBeReadIsOneWarning) {
     const std::string file = home.writeFile("Movies/Reelix Projects", "a file where a folder should be");
+    const testing_support::ScopedEnvironment english("LC_ALL", "C");
     EXPECT_EQ(runVexo({"--home", home.path(), "tree"}).errors,
               "vexo: warning: cannot list " + file + ": Not a directory\n");
 }
