@@ -160,6 +160,7 @@ TEST_F(FaultyPluginTest, ABrokenIconIsNoneAndHarmsNobody) {
     }
 }
 
+// Within what is loaded, however much information for debugging lies behind that.
 TEST_F(FaultyPluginTest, AModuleThatWasCutOffIsLeftOut) {
     const std::string whole = testing_support::contentOf(FAULTY_PLUGIN_MODULE);
     makeBundle({.module = home.writeFile("cut.so", whole.substr(0, 4096))});
