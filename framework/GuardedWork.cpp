@@ -41,17 +41,21 @@ bool runGuarded(const std::function<void()>& work) {
     }
 }
 
-bool recoverFrom(std::exception_ptr failure, const std::function<void()>& work) {
-    if (warnOf(failure) != Failure::brokenArchive)
-        return false;
+bool runGuardedOnce(const std::function<void()>& work) {
     try {
-        const platform::RejectedArchivesAsUnreadable tolerance(warnOfBrokenArchive, nullptr);
         work();
         return true;
     } catch (...) {
         warnOf(std::current_exception());
         return false;
     }
+}
+
+bool recoverFrom(std::exception_ptr failure, const std::function<void()>& work) {
+    if (warnOf(failure) != Failure::brokenArchive)
+        return false;
+    const platform::RejectedArchivesAsUnreadable tolerance(warnOfBrokenArchive, nullptr);
+    return runGuardedOnce(work);
 }
 
 }  // namespace vexo

@@ -11,6 +11,9 @@ namespace vexo {
 // the first or the second run.
 bool runGuarded(const std::function<void()>& work);
 
+// The same for work that must not be done twice: a broken archive ends it like any other failure.
+bool runGuardedOnce(const std::function<void()>& work);
+
 // What `question` answers, or an empty answer where it raises.
 template <typename Question>
 std::invoke_result_t<Question> guardedAnswer(const Question& question) {

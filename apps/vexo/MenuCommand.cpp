@@ -137,7 +137,7 @@ std::string reasonForNothing(const MenuItem& item) {
 
 Problems perform(const MenuItem& item) {
     const auto outcome = observedOutcome();
-    if (!runGuarded([&] { item.perform(item); }))
+    if (!runGuardedOnce([&] { item.perform(item); }))
         return {"'" + item.title + "' failed"};
     MainLoop().runPending();
     platform::services().workspace.waitUntilLaunched();

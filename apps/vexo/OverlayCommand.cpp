@@ -35,7 +35,7 @@ Problems runOverlay(Host& host, const OverlayOptions& options) {
         return found->manager->thumbnailOverlayForMediaObject(found->mediaObject, {found->mediaGroup},
                                                               options.size);
     });
-    if (!overlay)
+    if (!overlay || !overlay->picture())
         return {"the item has no overlay at " + text(options.size) + " points; no file was written"};
     const auto bitmap = guardedAnswer([&] {
         return overlay->picture()->draw(pixels(options.size.width, options.scale),

@@ -152,6 +152,25 @@ TEST_F(FaultyPlugins, WhatWasAskedOfItAloneIsAProblem) {
     }
 }
 
+// What it did before it raised cannot be undone.
+TEST_F(FaultyPlugins, AnActionIsPerformedOnce) {
+    MenuOptions act;
+    act.object = "faulty-clip";
+    act.chosenEntry = 1;
+    const Answer given =
+        answer("perform:archive", [&](Host& host, std::ostream& out) { return runMenu(host, act, out); });
+    EXPECT_THAT(given.problems, ElementsAre("'Act' failed"));
+    EXPECT_THAT(given.warnings, ElementsAre("broken archive 1"));
+}
+
+TEST_F(FaultyPlugins, AnImageWithoutAPictureIsNoOverlay) {
+    const Answer given = answer("noPicture", [&](Host& host, std::ostream&) {
+        return runOverlay(host, {"faulty-clip", {16, 16}, /*scale=*/1, file});
+    });
+    EXPECT_THAT(given.problems, ElementsAre(HasSubstr("has no overlay")));
+    EXPECT_THAT(given.warnings, IsEmpty());
+}
+
 TEST_F(FaultyPlugins, WatchingShowsTheOther) {
     const auto watch = [](Host& host, std::ostream& out) {
         return runWatch(host, {OutputFormat::json, std::chrono::duration<double>(0)}, out);

@@ -1,9 +1,12 @@
 // A plug-in that raises in one operation, which the name of its principal class tells: "FaultyPlugin",
-// "FaultyPlugin:performLoadData" or, for what is no std::exception, "FaultyPlugin:performLoadData:number".
+// "FaultyPlugin:performLoadData" or, for what is no std::exception, "FaultyPlugin:performLoadData:number", or
+// for a broken archive, "FaultyPlugin:perform:archive", which also says how often that was raised. With
+// "FaultyPlugin:noPicture" its image shows none.
 #include <stdexcept>
 
 #include "host/VXConstants.h"
 #include "host/VXMediaManager.h"
+#include "platform/KeyedUnarchiver.h"
 
 namespace {
 
@@ -12,12 +15,16 @@ using vexo::VXMediaObjectRef;
 
 std::string faultyOperation;
 bool raisesNumber = false;
+bool raisesArchiveError = false;
+int archiveErrors = 0;
 
 void enter(std::string_view operation) {
     if (operation != faultyOperation)
         return;
     if (raisesNumber)
         throw 42;
+    if (raisesArchiveError)
+        throw platform::ArchiveError("", "broken archive " + std::to_string(++archiveErrors));
     throw std::runtime_error("fault in " + std::string(operation));
 }
 
@@ -29,6 +36,8 @@ bool readClassName(std::string_view name) {
     name.remove_prefix(std::min(name.size(), ownName.size() + 1));
     faultyOperation = name.substr(0, name.find(':'));
     raisesNumber = name.ends_with(":number");
+    raisesArchiveError = name.ends_with(":archive");
+    archiveErrors = 0;
     return true;
 }
 
@@ -123,7 +132,8 @@ class FaultyPlugin final : public vexo::VXMediaManager {
                                                       const std::vector<VXMediaGroupRef>&,
                                                       platform::Size) override {
         enter("thumbnailOverlayForMediaObject");
-        return std::make_shared<platform::Image>(std::make_shared<FaultyPicture>(), "overlay");
+        auto picture = faultyOperation == "noPicture" ? nullptr : std::make_shared<FaultyPicture>();
+        return std::make_shared<platform::Image>(std::move(picture), "overlay");
     }
 
   private:
