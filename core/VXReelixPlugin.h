@@ -245,6 +245,7 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     Object newRepresentative(const Group& projectGroup, const Object& movie);
 
     void scanEventLibraries(const Group& holder) VX_REQUIRES(_monitor);
+    void watchEventLibrary(const std::string& folder);
     Group newEventLibraryGroup(const std::optional<std::string>& parentID);
     void fileEventUnderItsYear(const Group& event, const Group& eventLibrary, YearGroups& years);
     Group newYearGroup(const std::optional<platform::Value>& year);

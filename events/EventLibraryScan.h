@@ -35,7 +35,7 @@ struct VXReelixPlugin::ScannedEvent {
 
 class VXReelixPlugin::EventLibraryScan {
   public:
-    // The plug-in outlives the last piece of work.
+    // Whoever works on it keeps the plug-in alive.
     EventLibraryScan(VXReelixPlugin& plugin, std::string libraryFolder);
 
     const std::string& libraryFolder() const { return libraryFolder_; }

@@ -87,7 +87,6 @@ void VXReelixPlugin::scanEventLibraries(const Group& holder) {
     _flatEventGroupsList = std::make_unique<Groups>();
     if (!_ReelixEventsSearchPaths)
         return;
-    VXPathWatcher& watcher = VXPathWatcher::sharedPathWatcher();
     for (const std::string& folder : _ReelixEventsSearchPaths->snapshot()) {
         if (isCancelLoadRequestPending())
             return;
@@ -95,9 +94,15 @@ void VXReelixPlugin::scanEventLibraries(const Group& holder) {
             library->setParentID(std::string(vexo::VXReelix));
             holder->addChildGroups(library->childGroups());
         }
-        if (watcher.watchPathIsUnique(platform::path::withoutLastComponent(folder), self()))
-            _watchPath(folder);
+        watchEventLibrary(folder);
     }
+}
+
+// Not where the folder around it is watched already.
+void VXReelixPlugin::watchEventLibrary(const std::string& folder) {
+    VXPathWatcher& watcher = VXPathWatcher::sharedPathWatcher();
+    if (watcher.watchPathIsUnique(platform::path::withoutLastComponent(folder), self()))
+        _watchPath(folder);
 }
 
 VXReelixPlugin::Group VXReelixPlugin::newEventLibraryGroup(const std::optional<std::string>& parentID) {

@@ -7,12 +7,15 @@ namespace reelix {
 
 VXReelixPlugin::EventScansAhead::EventScansAhead(VXReelixPlugin& plugin) : plugin_(plugin) {
     platform::Locked monitor(plugin._monitor);
-    for (const std::string& folder : plugin._ReelixEventsSearchPaths->snapshot())
+    for (const std::string& folder : plugin._ReelixEventsSearchPaths->snapshot()) {
+        plugin.watchEventLibrary(folder);  // else what changes before the load comes to it would go unnoticed
         scans_.push_back(std::make_shared<EventLibraryScan>(plugin, folder));
-    platform::services().dispatcher.detachThread("vexo-scan", plugin.loadThreadPriority(), [scans = scans_] {
+    }
+    const auto help = [plugin = plugin.self(), scans = scans_] {
         for (const auto& scan : scans)
             scan->work().help();
-    });
+    };
+    platform::services().dispatcher.detachThread("vexo-scan", plugin.loadThreadPriority(), help);
     plugin.eventScansAhead_ = this;
 }
 

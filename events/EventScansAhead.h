@@ -17,7 +17,7 @@ class VXReelixPlugin::EventScansAhead {
   public:
     // Of the plug-in's search paths, in their order.
     explicit EventScansAhead(VXReelixPlugin& plugin);
-    // Gives up what nobody took.
+    // Gives up what nobody took, without waiting for what the thread is about to look at.
     ~EventScansAhead();
     EventScansAhead(const EventScansAhead&) = delete;
     EventScansAhead& operator=(const EventScansAhead&) = delete;

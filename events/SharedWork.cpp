@@ -23,6 +23,8 @@ void SharedWork::finish() {
     doPieces();
     abandon();
     Locked lock(mutex_);
+    while (helpers_ > 0)
+        helperLeft_.wait(mutex_);
     if (failure_)
         std::rethrow_exception(failure_);
 }
@@ -30,8 +32,6 @@ void SharedWork::finish() {
 void SharedWork::abandon() {
     Locked lock(mutex_);
     isEnded_ = true;
-    while (helpers_ > 0)
-        helperLeft_.wait(mutex_);
 }
 
 void SharedWork::doPieces() {

@@ -15,7 +15,7 @@ namespace reelix {
 class SharedWork {
   public:
     // `doPiece` takes a piece that nobody has taken, does it, and answers false when there was none. It is
-    // called by several threads at once, and no more once `finish` or `abandon` has returned.
+    // called by several threads at once, and no more once `finish` has returned.
     explicit SharedWork(std::function<bool()> doPiece) : doPiece_(std::move(doPiece)) {}
 
     // Takes part until no piece is left. Never raises.
@@ -23,7 +23,7 @@ class SharedWork {
     // The same, then waits for what helpers have taken. An exception that left a piece ends the work and
     // comes out here.
     void finish() VX_EXCLUDES(mutex_);
-    // Lets no piece be begun any more, and waits for those that were.
+    // Lets no piece be begun any more. Does not wait for those that were.
     void abandon() VX_EXCLUDES(mutex_);
 
   private:

@@ -339,14 +339,16 @@ TEST_F(LoadDriverTest, TheLocationsAreThoseOfTheListsAndNoneBeforeTheFirstLoad) 
 
 // --- Queries -----------------------------------------------------------------------------------------------
 
+// The event libraries come first, because a second thread lists them while the projects are scanned.
 TEST_F(LoadDriverTest, TheQueriesAreRegisteredBeforeTheLibrariesAreScannedAndWatched) {
     load();
-    EXPECT_THAT(watcher->calls,
-                ElementsAre("query " + std::string(projectQuery), "query " + std::string(eventQuery),
-                            "watch " + inHome("Movies/Reelix Projects.localized"), "watch /Reelix Projects",
-                            "watch /Reelix Projects.localized", "watch " + inHome("Movies/Reelix Events"),
-                            "watch " + inHome("Movies/Reelix Events.localized"), "watch /Reelix Events",
-                            "watch /Reelix Events.localized"));
+    EXPECT_THAT(
+        watcher->calls,
+        ElementsAre("query " + std::string(projectQuery), "query " + std::string(eventQuery),
+                    "watch " + inHome("Movies/Reelix Events"),
+                    "watch " + inHome("Movies/Reelix Events.localized"), "watch /Reelix Events",
+                    "watch /Reelix Events.localized", "watch " + inHome("Movies/Reelix Projects.localized"),
+                    "watch /Reelix Projects", "watch /Reelix Projects.localized"));
 }
 
 TEST_F(LoadDriverTest, TheProjectQuerySearchesTheTwoDefaultFoldersOnly) {

@@ -49,6 +49,10 @@ extern "C" long syscall(long number, ...) noexcept {
     for (long& argument : arguments)
         argument = va_arg(list, long);
     va_end(list);
+    if (number == getxattratNumber && isOldKernel) {
+        errno = ENOSYS;
+        return -1;
+    }
     const long result =
         next(number, arguments[0], arguments[1], arguments[2], arguments[3], arguments[4], arguments[5]);
     attributeReads += number == getxattratNumber && !(result < 0 && errno == ENOSYS);
