@@ -130,9 +130,9 @@ void FolderTree::heardOfContent(Folder& folder, const FileEvent& event) {
 // Writing a file is several events in a row, which say the same to a burst.
 bool FolderTree::isContentKnown(const Folder& folder, std::string_view name) {
     const std::uint64_t burst = means_.burst.number();
-    if (latestContent_.watch == folder.watch && latestContent_.burst == burst && latestContent_.name == name)
+    if (latestContent_.folder == &folder && latestContent_.burst == burst && latestContent_.name == name)
         return true;
-    latestContent_ = {folder.watch, std::string(name), burst};
+    latestContent_ = {&folder, std::string(name), burst};
     return false;
 }
 
@@ -149,7 +149,7 @@ void FolderTree::lost(Folder& folder, bool unmounted) {
 // A folder that was moved here may be known, from a listing or because it was here before. What happened in
 // it while it was elsewhere was looked for here, in vain; so it is explored anew.
 void FolderTree::examine(Folder& parent, const std::string& name, Known whatIsKnown) {
-    latestContent_ = {};  // a folder that was moved may have kept its watch
+    latestContent_ = {};  // of a folder that may be gone
     auto found = std::make_unique<Folder>(*this, &parent, name);
     follow(*found);
     const auto known = parent.children.find(name);

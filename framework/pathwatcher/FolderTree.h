@@ -86,10 +86,9 @@ class FolderTree {
     template <typename Visit>
     void visitAll(Visit visit) const;
 
-    // A file whose content changed in a burst. Watches have numbers of their own as long as the tree is
-    // watched.
+    // A file whose content changed in a burst.
     struct Content {
-        int watch = -1;
+        const Folder* folder = nullptr;  // forgotten whenever a folder may have gone
         std::string name;
         std::uint64_t burst = 0;
     };

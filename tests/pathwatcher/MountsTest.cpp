@@ -1,5 +1,6 @@
 // Watched paths on mounts: of every kind by a made-up mount table, and real ones that come and go.
 #include <filesystem>
+#include <fstream>
 
 #include "tests/pathwatcher/FakeMounts.h"
 #include "tests/pathwatcher/WatcherTest.h"
@@ -190,12 +191,13 @@ TEST_F(RealMounts, AFolderThatIsReachedThroughABindMountIsReportedByBothPaths) {
     if (const auto reason = reasonAgainstMounting())
         GTEST_SKIP() << *reason;
     const std::string real = folder.makeFolder("Movies/real"), shown = folder.makeFolder("Movies/shown");
-    folder.makeFolder("Movies/real/sub");
+    const std::string clip = folder.writeFile("Movies/real/sub/a.mov");
     const ScopedMount mount = ScopedMount::bind(real, shown);
     watch(folder.path("Movies"));
     EXPECT_EQ(reportsOf([&] { fs::create_directory(real + "/sub/x"); }),
               (Paths{real + "/sub", shown + "/sub"}));
     EXPECT_EQ(reportsOf([&] { fs::remove_all(shown + "/sub/x"); }), (Paths{real + "/sub", shown + "/sub"}));
+    EXPECT_EQ(reportsOf([&] { std::ofstream(clip) << "content"; }), (Paths{clip, shown + "/sub/a.mov"}));
 }
 
 TEST_F(RealMounts, AMountWhoseServerIsGoneHoldsUpNobody) {
