@@ -10,7 +10,11 @@ void Diagnostics::warn(const std::string& warning) {
     if (!told)
         return;
     log_.log(*told);
-    observers_.notify(*told);
+    try {
+        observers_.notify(*told);
+    } catch (...) {  // what is warned of must not depend on who hears it
+        log_.log("an observer of warnings failed");
+    }
 }
 
 // A library in which everything is broken must not fill memory and log for ever.

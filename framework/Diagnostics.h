@@ -31,7 +31,8 @@ class Diagnostics {
     // the first `mostWarnings` a last one says that the others are left out.
     void warn(const std::string& warning) VX_EXCLUDES(mutex_);
     std::vector<std::string> warnings() const VX_EXCLUDES(mutex_);
-    // Told of each new warning, on the thread that warns, for as long as `owner` lives.
+    // Told of each new warning, on the thread that warns, for as long as `owner` lives. That thread may hold
+    // locks of a plug-in's: an observer doesn't wait for other threads. What one raises is dropped.
     void addWarningObserver(std::weak_ptr<const void> owner, WarningObserver observer);
 
     void log(std::string_view line) { log_.log(line); }

@@ -2,6 +2,8 @@
 
 #include <gmock/gmock.h>
 
+#include <stdexcept>
+
 #include "tests/support/HostEnvironment.h"
 
 namespace vexo {
@@ -15,6 +17,13 @@ class DiagnosticsTest : public testing::Test {
     testing_support::RecordingLog log;
     Diagnostics diagnostics{log, Verbosity::normal};
 };
+
+TEST_F(DiagnosticsTest, AnObserverThatRaisesHarmsNobody) {
+    const auto owner = std::make_shared<int>();
+    diagnostics.addWarningObserver(owner, [](const std::string&) { throw std::runtime_error("deaf"); });
+    EXPECT_NO_THROW(diagnostics.warn("one"));
+    EXPECT_THAT(diagnostics.warnings(), ElementsAre("one"));
+}
 
 TEST_F(DiagnosticsTest, AWarningIsToldOnce) {
     std::vector<std::string> heard;
