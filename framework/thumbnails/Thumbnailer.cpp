@@ -11,7 +11,10 @@ Thumbnailer::Thumbnailer(ThumbnailMaker maker)
       })) {}
 
 platform::ImageRef Thumbnailer::thumbnailOfFile(const std::string& path) {
-    return std::make_shared<platform::Image>(std::make_shared<ThumbnailPicture>(path, standIn_, queue_));
+    auto image =
+        std::make_shared<platform::Image>(std::make_shared<ThumbnailPicture>(path, standIn_, queue_));
+    image->setSize(image->size());  // an image's size stays, whatever its picture becomes
+    return image;
 }
 
 void Thumbnailer::close() {

@@ -3,6 +3,7 @@
 
 #include <array>
 #include <cstring>
+#include <mutex>
 #include <new>
 #include <utility>
 
@@ -149,12 +150,9 @@ class VectorPicture final : public Picture {
   public:
     explicit VectorPicture(Bytes data) : data_(data.begin(), data.end()) {}
 
-    Size naturalSize() const override VX_EXCLUDES(mutex_) {
-        Locked lock(mutex_);
-        return document().size;
-    }
+    Size naturalSize() const override { return document().size; }
     bool isDrawable() const override { return naturalSize() != Size{}; }
-    std::optional<Bitmap> draw(int width, int height) const override VX_EXCLUDES(mutex_) {
+    std::optional<Bitmap> draw(int width, int height) const override {
         if (auto kept = renderings_.find(width, height))
             return kept;
         const Size size = naturalSize();
@@ -172,10 +170,12 @@ class VectorPicture final : public Picture {
         Size size;  // nothing when it can't be drawn
     };
 
-    const Document& document() const VX_REQUIRES(mutex_) {
-        if (!document_)
-            document_ = parsed(std::exchange(data_, {}));
-        return *document_;
+    const Document& document() const {
+        std::call_once(isParsed_, [this] {
+            document_ = parsed(data_);
+            data_ = {};
+        });
+        return document_;
     }
     static Document parsed(const std::vector<std::byte>& data) {
         Handle handle = parsedSVG(data);
@@ -184,15 +184,17 @@ class VectorPicture final : public Picture {
             return {};
         return {std::move(handle), size};
     }
-    bool render(cairo_t* context, Size size) const VX_EXCLUDES(mutex_) {
+    // Even drawing changes the state of a handle. Drawing may take long, so nobody else waits for it.
+    bool render(cairo_t* context, Size size) const VX_EXCLUDES(drawing_) {
         const RsvgRectangle area{0, 0, size.width, size.height};
-        Locked lock(mutex_);
+        Locked lock(drawing_);
         return rsvg_handle_render_document(document().handle.get(), context, &area, nullptr);
     }
 
-    mutable Mutex mutex_;
-    mutable std::vector<std::byte> data_ VX_GUARDED_BY(mutex_);
-    mutable std::optional<Document> document_ VX_GUARDED_BY(mutex_);  // even drawing changes its state
+    mutable std::once_flag isParsed_;
+    mutable std::vector<std::byte> data_;  // until it is parsed
+    mutable Document document_;
+    mutable Mutex drawing_;
     mutable Renderings renderings_;
 };
 

@@ -360,12 +360,14 @@ TEST_F(ItemThumbnails, AreTheSameImageEachTimeAndNoneWithoutAPath) {
 TEST_F(ItemThumbnails, ShowTheMovieOnceDrawn) {
     VXMediaObject item(3, "Clip", "id");
     item.setPath(writeMovie());
-    const auto picture = item.thumbnailImage()->picture();
+    const auto image = item.thumbnailImage();
+    const auto picture = image->picture();
     const auto standIn = picture->draw(64, 64);
     ASSERT_TRUE(standIn);
     EXPECT_NE(middleOf(standIn), red);
     host_.dispatcher.runDueBlocks();
     EXPECT_EQ(middleOf(picture->draw(64, 32)), red);
+    EXPECT_EQ(image->size(), (Size{128, 128}));
 }
 
 TEST_F(ItemThumbnails, SettingItsOwnAgainMakesTheHostRedrawIt) {
