@@ -375,24 +375,41 @@ Problem loadPlugins(Host& host) {
     return std::nullopt;
 }
 
-Problems runWithHost(const HostCommand& command, Arguments& arguments) {
+// Tells what went wrong, and answers the status for it.
+int conclude(Problems problems) {
+    if (!std::cout.flush())
+        problems.push_back("the answer cannot be written to standard output");
+    for (const std::string& problem : problems)
+        report(problem);
+    return problems.empty() ? statusDone : statusFailed;
+}
+
+// What the command raises is told like its other problems: before the end of the host, which may be the last
+// that is heard of the program.
+Problems run(const HostCommand& command, Host& host) {
+    try {
+        const Problem problem = command.needs == Needs::plugins ? loadPlugins(host) : std::nullopt;
+        return problem ? Problems{*problem} : command.run(host);
+    } catch (const std::exception& error) {
+        return {error.what()};
+    }
+}
+
+int runWithHost(const HostCommand& command, Arguments& arguments) {
     if (const Problem problem = checkHome(arguments))
-        return {*problem};
+        return conclude({*problem});
     HostOptions options = command.options;
     options.homeDirectory = arguments.home;
     options.pluginBundles = arguments.plugins;
     options.verbosity = arguments.verbose ? Verbosity::verbose : Verbosity::normal;
-    const Departure departure;  // of the host as well
+    Departure departure;  // of the host as well
     Host host(options);
+    const DepartureAtEnd departureOfHost(departure);
     const auto warningOwner = std::make_shared<int>();
     // A verbose host's log shows warnings already.
     if (!arguments.quiet && !arguments.verbose)
         host.diagnostics().addWarningObserver(warningOwner, showWarning);
-    const Problem problem = command.needs == Needs::plugins ? loadPlugins(host) : std::nullopt;
-    Problems problems = problem ? Problems{*problem} : command.run(host);
-    std::cout.flush();
-    departure.begin();
-    return problems;
+    return conclude(run(command, host));
 }
 
 }  // namespace
@@ -414,13 +431,9 @@ int runCommandLine(int argc, char** argv) {
 
     if (!parser.hostCommand && !parser.plainCommand)
         return refuse("no command was given; try 'vexo --help'");
-    Problems problems =
-        parser.hostCommand ? runWithHost(*parser.hostCommand, arguments) : parser.plainCommand();
-    if (!std::cout.flush())
-        problems.push_back("the answer cannot be written to standard output");
-    for (const std::string& problem : problems)
-        report(problem);
-    return problems.empty() ? statusDone : statusFailed;
+    if (parser.hostCommand)
+        return runWithHost(*parser.hostCommand, arguments);
+    return conclude(parser.plainCommand());
 }
 
 }  // namespace vexo

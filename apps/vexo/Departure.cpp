@@ -19,7 +19,8 @@ void leave(int) {
 }  // namespace
 
 Departure::~Departure() {
-    alarm(0);
+    if (hasBegun_)
+        alarm(0);
 }
 
 void Departure::begin() {
@@ -27,6 +28,7 @@ void Departure::begin() {
     action.sa_handler = leave;
     sigaction(SIGALRM, &action, nullptr);
     alarm(secondsAtMost);
+    hasBegun_ = true;
 }
 
 }  // namespace vexo

@@ -16,7 +16,22 @@ class Departure {
     Departure& operator=(const Departure&) = delete;
 
     // From now on the object has to go within `secondsAtMost`, or the process is ended with a message.
-    static void begin();
+    void begin();
+
+  private:
+    bool hasBegun_ = false;
+};
+
+// Begins a departure when it goes, in whatever way its scope is left.
+class DepartureAtEnd {
+  public:
+    explicit DepartureAtEnd(Departure& departure) : departure_(departure) {}
+    ~DepartureAtEnd() { departure_.begin(); }
+    DepartureAtEnd(const DepartureAtEnd&) = delete;
+    DepartureAtEnd& operator=(const DepartureAtEnd&) = delete;
+
+  private:
+    Departure& departure_;
 };
 
 }  // namespace vexo
