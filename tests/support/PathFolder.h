@@ -43,7 +43,7 @@ class PathFolder final : public platform::Folder {
                                                       std::string_view attribute,
                                                       std::span<char> buffer) const override {
         const auto size = files_.extendedAttribute(pathOf(item), attribute, buffer);
-        return size >= 0 ? std::optional(size) : std::nullopt;
+        return size >= 0 || attributesOf(item) ? std::optional(size) : std::nullopt;
     }
 
   private:
