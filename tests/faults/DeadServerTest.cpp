@@ -4,7 +4,6 @@
 
 #include "tests/support/DeadMount.h"
 #include "tests/support/FileContent.h"
-#include "tests/support/LoopImage.h"
 #include "tests/support/RunningProgram.h"
 #include "tests/support/TemporaryFolder.h"
 
@@ -16,7 +15,7 @@ using testing::HasSubstr;
 using testing::StartsWith;
 
 TEST(DeadServer, DoesNotKeepAProgramThatIsToEnd) {
-    if (const auto reason = reasonAgainstMounting())
+    if (const auto reason = DeadMount::reasonAgainst())
         GTEST_SKIP() << *reason;
     const TemporaryFolder home;
     const ScopedEnvironment cache("XDG_CACHE_HOME", home.makeFolder("cache").c_str());
@@ -28,7 +27,7 @@ TEST(DeadServer, DoesNotKeepAProgramThatIsToEnd) {
 }
 
 TEST(DeadServer, DoesNotHideWhatWentWrongBefore) {
-    if (const auto reason = reasonAgainstMounting())
+    if (const auto reason = DeadMount::reasonAgainst())
         GTEST_SKIP() << *reason;
     const TemporaryFolder home;
     const ScopedEnvironment cache("XDG_CACHE_HOME", home.makeFolder("cache").c_str());

@@ -73,6 +73,14 @@ class UnreadableFolders : public HostileLibraryTest {
     FoundLibrary loadWithout(const std::vector<std::string>& unreadable, mode_t rights = 0) {
         for (const std::string& path : unreadable)
             EXPECT_EQ(chmod(home_.path(path).c_str(), rights), 0) << path;
+        const FoundLibrary library = loadAsOrdinaryUser();
+        for (const std::string& path : unreadable)
+            EXPECT_EQ(chmod(home_.path(path).c_str(), 0700), 0) << path;  // else nobody can remove them
+        return library;
+    }
+
+  private:
+    FoundLibrary loadAsOrdinaryUser() {
         const OrdinaryUser somebody(home_.path());
         return load();
     }

@@ -16,7 +16,6 @@ namespace fs = std::filesystem;
 // Of all notification queues of this process.
 long watchesOfKernel() {
     long watches = 0;
-    std::error_code gone;
     for (const auto& entry : fs::directory_iterator("/proc/self/fdinfo")) {
         const std::string info = contentOf(entry.path());
         for (auto at = info.find("inotify wd:"); at != info.npos; at = info.find("inotify wd:", at + 1))

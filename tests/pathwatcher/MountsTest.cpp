@@ -201,7 +201,7 @@ TEST_F(RealMounts, AFolderThatIsReachedThroughABindMountIsReportedByBothPaths) {
 }
 
 TEST_F(RealMounts, AMountWhoseServerIsGoneHoldsUpNobody) {
-    if (const auto reason = reasonAgainstMounting())
+    if (const auto reason = DeadMount::reasonAgainst())
         GTEST_SKIP() << *reason;
     const std::string mountPoint = folder.makeFolder("Movies/gone"),
                       local = folder.makeFolder("Movies/local");

@@ -52,7 +52,7 @@ void Soak::run() {
 
 void Soak::runSession() {
     ++sessions_;
-    alarm(hangSeconds);
+    alarm(hangSeconds + static_cast<unsigned>(options_.sessionTime.count()));
     std::vector<vexo::VXMediaObjectRef> kept;
     {
         Session session({places_, loop_, ledger_, census_}, nextSeed());

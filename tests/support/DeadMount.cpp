@@ -11,6 +11,8 @@
 #include <cstring>
 #include <stdexcept>
 
+#include "tests/support/LoopImage.h"
+
 namespace testing_support {
 
 namespace {
@@ -23,6 +25,13 @@ void readRequest(int server, Request& request) {
 }
 
 }  // namespace
+
+std::optional<std::string> DeadMount::reasonAgainst() {
+    if (const auto reason = reasonAgainstMounting())
+        return reason;
+    const platform::FileDescriptor device(open("/dev/fuse", O_RDWR | O_CLOEXEC));
+    return device ? std::nullopt : std::optional<std::string>("/dev/fuse can't be opened");
+}
 
 DeadMount::DeadMount(const std::string& mountPoint)
     : mountPoint_(mountPoint), server_(open("/dev/fuse", O_RDWR | O_CLOEXEC)) {
@@ -57,8 +66,8 @@ void DeadMount::greet() const {
 // What the server has read not even the end of a process gets out of.
 void DeadMount::awaitRequest() const {
     pollfd request{server_.number(), POLLIN, 0};
-    if (poll(&request, 1, /*timeout=*/-1) != 1)
-        throw std::runtime_error(std::string("cannot wait for a request: ") + std::strerror(errno));
+    if (poll(&request, 1, /*milliseconds*/ 60'000) != 1)
+        throw std::runtime_error("nobody asks the server");
 }
 
 }  // namespace testing_support

@@ -1,6 +1,7 @@
 // A mount whose server never answers: whoever looks at it waits until the mount goes.
 #pragma once
 
+#include <optional>
 #include <string>
 
 #include "platform/linux/FileDescriptor.h"
@@ -9,13 +10,16 @@ namespace testing_support {
 
 class DeadMount {
   public:
-    // Requires: reasonAgainstMounting answered nil. Raises std::runtime_error when it can't be mounted.
+    // Why this process can't have one; nil when it can.
+    static std::optional<std::string> reasonAgainst();
+
+    // Requires: reasonAgainst answered nil. Raises std::runtime_error when it can't be mounted.
     explicit DeadMount(const std::string& mountPoint);
     ~DeadMount();
     DeadMount(const DeadMount&) = delete;
     DeadMount& operator=(const DeadMount&) = delete;
 
-    // Waits until somebody waits for the server.
+    // Waits until somebody waits for the server, and raises std::runtime_error when nobody does for a minute.
     void awaitRequest() const;
 
   private:
