@@ -109,7 +109,9 @@ std::optional<FileAttributes> LinuxFolder::attributesOf(const FolderItem& item) 
 std::optional<std::ptrdiff_t> LinuxFolder::extendedAttributeOf(const FolderItem& item,
                                                                std::string_view attribute,
                                                                std::span<char> buffer) const {
-    const bool isLikeOthers = isOnFoldersDevice(item);
+    // On the folder's device. A single file onto which one of another is mounted counts as well: nobody does
+    // that to a clip.
+    const bool isLikeOthers = item.kind == FolderItem::Kind::plainFile;
     const auto foreignNames =
         isLikeOthers && !mayHaveForeignNames_ ? ForeignNames::knownToBeMissing : ForeignNames::asked;
     const AttributeAnswer answer = platform::extendedAttribute(
@@ -131,11 +133,6 @@ std::optional<struct statx> LinuxFolder::statusOf(const FolderItem& item, int fl
 
 bool LinuxFolder::isInvisibleByName(const std::string& name) const {
     return name.starts_with('.') || (hiddenNames_ && hiddenNames_->contains(name));
-}
-
-// A single file onto which one of another device is mounted counts as well: nobody does that to a clip.
-bool LinuxFolder::isOnFoldersDevice(const FolderItem& item) const {
-    return item.kind == FolderItem::Kind::plainFile;
 }
 
 std::string LinuxFolder::pathOf(const std::string& name) const {

@@ -56,7 +56,6 @@ class LinuxFolder final : public Folder {
   private:
     std::optional<struct ::statx> statusOf(const FolderItem& item, int flags) const;
     bool isInvisibleByName(const std::string& name) const;
-    bool isOnFoldersDevice(const FolderItem& item) const;
     std::string pathOf(const std::string& name) const;
 
     const FolderListing listing_;
