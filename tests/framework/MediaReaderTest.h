@@ -4,6 +4,7 @@
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/wait.h>
+#include <unistd.h>
 
 #include <cerrno>
 #include <string>
@@ -56,6 +57,13 @@ inline platform::Bitmap frameFor(MediaReader& reader, const std::string& path, i
 
 inline bool hasChildProcess() {
     return waitpid(-1, nullptr, WNOHANG) != -1 || errno != ECHILD;
+}
+
+// Whether none is left. One that was killed may need a moment to go on a busy machine.
+inline bool childProcessesEnd() {
+    for (int i = 0; i < 1000 && hasChildProcess(); ++i)
+        usleep(10'000);
+    return !hasChildProcess();
 }
 
 class RealMediaReader : public testing::Test {
