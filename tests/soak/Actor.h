@@ -1,7 +1,7 @@
 // Somebody who does one thing after another, by chance: with the files of a library, or with a host.
 //
-// The chance is seeded: with the same seed an actor makes the same choices, as long as it finds the same. What
-// it finds depends on how the acts of several actors fall between each other.
+// The chance is seeded: with the same seed an actor makes the same choices, as long as it finds the same.
+// What it finds depends on how the acts of several actors fall between each other.
 #pragma once
 
 #include <cstddef>
