@@ -48,8 +48,9 @@ bool isSupportedMovie(const std::string& clip, bool isPlainFile) {
                        : vexo::VXMediaBrowserUtilities::supportedMovieFile(clip);
 }
 
-bool hasUsableYear(const platform::CalendarDateRef& date) {
-    return date && 0 <= date->yearOfCommonEra() && date->yearOfCommonEra() <= 9999;
+std::optional<int> usableYear(const platform::CalendarDateRef& date) {
+    const int year = date ? date->yearOfCommonEra() : -1;
+    return 0 <= year && year <= 9999 ? std::optional(year) : std::nullopt;
 }
 
 int creationYear(const platform::DateRef& creationDate) {
@@ -166,14 +167,14 @@ std::optional<VXReelixPlugin::EventLibraryScan::ClipDates> VXReelixPlugin::Event
     auto own = valueSize.value_or(0) > 0 ? value.date() : nullptr;
     if (!own)
         own = PathDate::dateFromFileName(item.name, texts_);
-    const bool hasYear = hasUsableYear(own);
-    if (hasYear && valueSize)
-        return ClipDates{own, nullptr, own->yearOfCommonEra()};
+    const std::optional<int> year = usableYear(own);
+    if (year && valueSize)
+        return ClipDates{own, nullptr, *year};
     const auto attributes = folder.attributesOf(item);
     if (!attributes)
         return std::nullopt;
     const auto& creation = attributes->creationDate;
-    return ClipDates{own, creation, hasYear ? own->yearOfCommonEra() : creationYear(creation)};
+    return ClipDates{own, creation, year ? *year : creationYear(creation)};
 }
 
 VXReelixPlugin::Object VXReelixPlugin::EventLibraryScan::newClip(const std::string& name,
