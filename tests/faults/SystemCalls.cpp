@@ -59,8 +59,10 @@ bool fails(const char* function, int descriptor) {
     return fails(function, descriptor, nullptr);
 }
 
-bool takesMode(int flags) {
-    return (flags & O_CREAT) || (flags & O_TMPFILE) == O_TMPFILE;
+// The mode that follows the flags of a call, where they ask for one.
+mode_t modeAfter(int flags, std::va_list arguments) {
+    const bool takesMode = (flags & O_CREAT) || (flags & O_TMPFILE) == O_TMPFILE;
+    return takesMode ? va_arg(arguments, mode_t) : 0;
 }
 
 }  // namespace
@@ -106,25 +108,19 @@ extern "C" {
 
 int open(const char* path, int flags, ...) {
     static const auto real = original(&::open, "open");
-    mode_t mode = 0;
-    if (testing_support::takesMode(flags)) {
-        std::va_list arguments;
-        va_start(arguments, flags);
-        mode = va_arg(arguments, mode_t);
-        va_end(arguments);
-    }
+    std::va_list arguments;
+    va_start(arguments, flags);
+    const mode_t mode = testing_support::modeAfter(flags, arguments);
+    va_end(arguments);
     return fails("open", path) ? -1 : real(path, flags, mode);
 }
 
 int openat(int folder, const char* path, int flags, ...) {
     static const auto real = original(&::openat, "openat");
-    mode_t mode = 0;
-    if (testing_support::takesMode(flags)) {
-        std::va_list arguments;
-        va_start(arguments, flags);
-        mode = va_arg(arguments, mode_t);
-        va_end(arguments);
-    }
+    std::va_list arguments;
+    va_start(arguments, flags);
+    const mode_t mode = testing_support::modeAfter(flags, arguments);
+    va_end(arguments);
     return fails("openat", folder, path) ? -1 : real(folder, path, flags, mode);
 }
 
