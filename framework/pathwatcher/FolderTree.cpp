@@ -80,7 +80,6 @@ FolderTree::~FolderTree() {
 }
 
 int FolderTree::watch() {
-    latestContent_ = {};
     const int error = follow(*top_);
     if (top_->watch >= 0)
         explore(*top_, Discovery::initial);
