@@ -4,6 +4,8 @@ add_library(reelix_objects OBJECT ${PLUGIN_SOURCES})
 target_include_directories(reelix_objects PUBLIC ${CMAKE_SOURCE_DIR})
 target_link_libraries(reelix_objects PRIVATE vexo_settings)
 target_precompile_headers(reelix_objects PRIVATE cmake/Precompiled.h)
+# What tests and fuzz targets link of it. Among the objects is the precompiled header, which is nothing to link.
+set(REELIX_OBJECTS $<FILTER:$<TARGET_OBJECTS:reelix_objects>,EXCLUDE,[gp]ch$>)
 
 set(REELIX_BUNDLE ${CMAKE_BINARY_DIR}/Reelix.vxplugin)
 add_library(Reelix MODULE $<TARGET_OBJECTS:reelix_objects>)
