@@ -1,7 +1,8 @@
 #include "platform/linux/LogText.h"
 
 #include <fmt/format.h>
-#include <glib.h>
+
+#include <system_error>
 
 namespace platform {
 
@@ -36,7 +37,8 @@ std::string printable(std::string_view text) {
 }
 
 std::string failureLine(std::string_view operation, std::string_view path, int error) {
-    return fmt::format("cannot {} {}: {}", operation, printable(path), g_strerror(error));
+    return fmt::format("cannot {} {}: {}", operation, printable(path),
+                       std::generic_category().message(error));
 }
 
 // Paths are absolute, operations hold no slash, and messages no colon.
