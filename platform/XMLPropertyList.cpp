@@ -18,17 +18,17 @@ namespace platform {
 
 namespace {
 
-constexpr std::string_view whitespace = " \t\r\n";
+constexpr std::string_view xmlWhitespace = " \t\r\n";
 
 bool isWhitespace(std::string_view text) {
-    return text.find_first_not_of(whitespace) == std::string_view::npos;
+    return text.find_first_not_of(xmlWhitespace) == std::string_view::npos;
 }
 
 std::string_view trimmed(std::string_view text) {
     if (isWhitespace(text))
         return {};
-    const std::size_t first = text.find_first_not_of(whitespace);
-    return text.substr(first, text.find_last_not_of(whitespace) - first + 1);
+    const std::size_t first = text.find_first_not_of(xmlWhitespace);
+    return text.substr(first, text.find_last_not_of(xmlWhitespace) - first + 1);
 }
 
 // The number that makes up the whole of `text`; nil when it doesn't or is out of range.

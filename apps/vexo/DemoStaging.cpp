@@ -9,20 +9,14 @@
 #include <cstring>
 #include <filesystem>
 
+#include "apps/vexo/Paths.h"
+
 namespace vexo {
 namespace {
 
 namespace fs = std::filesystem;
 
 constexpr const char* advice = "name a folder that does not exist or is empty";
-
-std::string absolutePath(const std::string& path) {
-    std::error_code unknown;
-    std::string absolute = fs::absolute(path, unknown);
-    while (absolute.size() > 1 && absolute.back() == '/')
-        absolute.pop_back();
-    return absolute;
-}
 
 // Nil where `folder` is a folder that is empty.
 std::optional<std::string> occupied(const std::string& folder) {

@@ -110,7 +110,8 @@ using RenderedVersion = ProjectPasteboard;
 using ProjectEntry = ProjectPasteboard;
 
 TEST_F(SupportedPasteboardTypes, AreAListOfOneListOfOneType) {
-    EXPECT_EQ(Value(plugin().supportedPasteboardTypes()), Value(Array{Array{"VXReelixProjectsPboardType"}}));
+    EXPECT_EQ(Value(plugin().supportedPasteboardTypes()),
+              Value(Array{Value(Array{"VXReelixProjectsPboardType"})}));
 }
 
 // --- Groups ------------------------------------------------------------------------------------------------

@@ -23,6 +23,11 @@ class ManyLibrariesTest : public SmallLibraryTest {
         }
         environment.workspace.setRemovableMedia(std::move(media));
     }
+    std::vector<std::string> searchPaths() {
+        ExposedPlugin& scanned = plugin();
+        platform::Locked monitor(scanned._monitor);
+        return *scanned._ReelixSearchPaths;
+    }
 };
 
 TEST_F(ManyLibrariesTest, ThousandsOfSearchPathsAreAllLookedAt) {
@@ -38,13 +43,13 @@ TEST_F(ManyLibrariesTest, ThousandsOfSearchPathsAreAllLookedAt) {
     }
     EXPECT_EQ(projects, 2 * volumes / 100);
     EXPECT_EQ(clips, volumes / 100);
-    EXPECT_GT(plugin()._ReelixSearchPaths->size(), std::size_t{2 * volumes});
+    EXPECT_GT(searchPaths().size(), std::size_t{2 * volumes});
 }
 
 TEST_F(ManyLibrariesTest, EachOfThousandsOfSearchPathsIsWatched) {
     insertMedia();
     load();
-    for (const auto& folder : *plugin()._ReelixSearchPaths)
+    for (const auto& folder : searchPaths())
         EXPECT_FALSE(environment.watcher.watchPathIsUnique(folder, plugin().shared_from_this())) << folder;
 }
 

@@ -23,6 +23,11 @@ class EventReloadTest : public EventsTest {
         }
         return paths;
     }
+    auto searchPathList() {
+        ExposedPlugin& scanned = plugin();
+        platform::Locked monitor(scanned._monitor);
+        return scanned._ReelixEventsSearchPaths;
+    }
     void searchOnly(std::vector<std::string> paths) {
         platform::Locked monitor(plugin()._monitor);
         plugin()._ReelixEventsSearchPaths = std::make_shared<vexo::VXPathList>(std::move(paths));
@@ -134,10 +139,10 @@ TEST_F(EventReloadTest, VolumeThatIsGoneSinceItWasListedIsKnownByItsMountPoint) 
 
 TEST_F(EventReloadTest, SearchPathsArePreparedAnew) {
     searchPaths();
-    const auto before = plugin()._ReelixEventsSearchPaths;
+    const auto before = searchPathList();
     before->append("/added");
     EXPECT_THAT(searchPaths(), testing::Not(testing::Contains("/added")));
-    EXPECT_NE(plugin()._ReelixEventsSearchPaths, before);
+    EXPECT_NE(searchPathList(), before);
 }
 
 // --- The branch --------------------------------------------------------------------------------------------

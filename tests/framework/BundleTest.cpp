@@ -52,7 +52,7 @@ TEST_F(BundleTest, TheBuiltBundleMakesItsPrincipalClass) {
     EXPECT_DOUBLE_EQ(principalClass->versionNumber, 507.3);
     EXPECT_EQ(std::string(principalClass->versionString), "@(#)PROGRAM:Reelix  PROJECT:Vexo-507.3\n");
     EXPECT_EQ(principalClass->supportedPasteboardTypes(),
-              (platform::Array{platform::Array{platform::Value("VXReelixProjectsPboardType")}}));
+              (platform::Array{platform::Value(platform::Array{"VXReelixProjectsPboardType"})}));
 
     const auto manager = principalClass->newObject(result.bundle);
     ASSERT_NE(manager, nullptr);

@@ -155,7 +155,7 @@ std::size_t allocatedBytes() {
 }
 
 TEST_F(StoredMetadataTest, AClipTakesLittleMoreThanItsPathAndItsName) {
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+#if VEXO_SANITIZED
     GTEST_SKIP() << "a sanitizer has an allocator of its own";
 #endif
     const std::string folder = "/home/somebody/Movies/Reelix Events/A day at the lake";

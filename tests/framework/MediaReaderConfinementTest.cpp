@@ -13,11 +13,7 @@ namespace vexo {
 namespace {
 
 // A reader that is built with a sanitizer gives up less.
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-constexpr bool isSanitized = true;
-#else
-constexpr bool isSanitized = false;
-#endif
+constexpr bool isSanitized = VEXO_SANITIZED;
 
 // How many filters of system calls a process is subject to, by its /proc/…/status. A container may have put
 // some on all of its processes.

@@ -55,9 +55,9 @@ void expectQuarters(const platform::Bitmap& frame) {
     EXPECT_EQ(colourAt(frame, 0.75, 0.75), yellow);
 }
 
-using Size = std::pair<int, int>;
+using WidthAndHeight = std::pair<int, int>;
 
-Size sizeOf(const platform::Bitmap& frame) {
+WidthAndHeight sizeOf(const platform::Bitmap& frame) {
     return {frame.width, frame.height};
 }
 
@@ -71,7 +71,7 @@ class MovieFrame : public RealMediaReader {
 TEST_F(MovieFrame, ShowsWhatTheMovieShows) {
     const platform::Bitmap frame = frameOf(beginningWith(black, 0, 10));
     expectQuarters(frame);
-    EXPECT_EQ(sizeOf(frame), Size(64, 48));
+    EXPECT_EQ(sizeOf(frame), WidthAndHeight(64, 48));
     EXPECT_EQ(frame.pixels.size(), 64u * 48u);
 }
 
@@ -82,10 +82,10 @@ TEST_F(MovieFrame, IsOpaque) {
 
 TEST_F(MovieFrame, IsScaledDownToTheLongestSide) {
     const RawMovie movie = beginningWith(black, 0, 10);
-    EXPECT_EQ(sizeOf(frameOf(movie, 32)), Size(32, 24));
-    EXPECT_EQ(sizeOf(frameOf(movie, 10)), Size(10, 8));
-    EXPECT_EQ(sizeOf(frameOf(movie, 1)), Size(1, 1));
-    EXPECT_EQ(sizeOf(frameOf(movie, 0)), Size(1, 1));
+    EXPECT_EQ(sizeOf(frameOf(movie, 32)), WidthAndHeight(32, 24));
+    EXPECT_EQ(sizeOf(frameOf(movie, 10)), WidthAndHeight(10, 8));
+    EXPECT_EQ(sizeOf(frameOf(movie, 1)), WidthAndHeight(1, 1));
+    EXPECT_EQ(sizeOf(frameOf(movie, 0)), WidthAndHeight(1, 1));
     expectQuarters(frameOf(movie, 32));
 }
 
@@ -93,22 +93,23 @@ TEST_F(MovieFrame, IsNeverLargerThanTheLargest) {
     const RawMovie wide{.width = 2048, .height = 16, .frames = 2, .colourAt = [](int, int x, int) {
                             return static_cast<Colour>(x / 8);
                         }};
-    EXPECT_EQ(sizeOf(frameOf(wide, 1'000'000)), Size(largestFrameSide, 8));
+    EXPECT_EQ(sizeOf(frameOf(wide, 1'000'000)), WidthAndHeight(largestFrameSide, 8));
 }
 
 TEST_F(MovieFrame, OfAHighMovieIsAsHighAsTheLongestSide) {
     const RawMovie high{.width = 30, .height = 300, .frames = 2, .colourAt = [](int, int, int y) {
                             return static_cast<Colour>(y);
                         }};
-    EXPECT_EQ(sizeOf(frameOf(high, 100)), Size(10, 100));
+    EXPECT_EQ(sizeOf(frameOf(high, 100)), WidthAndHeight(10, 100));
 }
 
 TEST_F(MovieFrame, OfTheTiniestMovies) {
-    for (const auto& [width, height] : {Size(1, 1), Size(2, 2), Size(1, 40), Size(40, 1), Size(3, 5)}) {
+    for (const auto& [width, height] : {WidthAndHeight(1, 1), WidthAndHeight(2, 2), WidthAndHeight(1, 40),
+                                        WidthAndHeight(40, 1), WidthAndHeight(3, 5)}) {
         const RawMovie tiny{
             .width = width, .height = height, .frames = 3, .colourAt = [](int, int, int) { return yellow; }};
         const platform::Bitmap frame = frameOf(tiny);
-        EXPECT_EQ(sizeOf(frame), Size(width, height));
+        EXPECT_EQ(sizeOf(frame), WidthAndHeight(width, height));
         EXPECT_EQ(colourAt(frame, 0, 0), yellow);
     }
 }
@@ -129,7 +130,7 @@ TEST_F(MovieFrame, OfAMovieWithOneKeyFrameIsALaterOne) {
 
 TEST_F(MovieFrame, OfAMovieThatShowsNothingIsBlack) {
     const platform::Bitmap frame = frameOf(beginningWith(black, 10, 10));
-    EXPECT_EQ(sizeOf(frame), Size(64, 48));
+    EXPECT_EQ(sizeOf(frame), WidthAndHeight(64, 48));
     EXPECT_EQ(colourAt(frame, 0.5, 0.5), black);
 }
 
@@ -171,7 +172,7 @@ TEST_P(TurnedMovieFrame, IsUpright) {
     makeSampleMovie(path, {.size = "640x360", .rotation = turn.degrees});
     const platform::Bitmap frame = frameFor(reader_, path, 320);
 
-    EXPECT_EQ(sizeOf(frame), turn.degrees % 180 == 0 ? Size(320, 180) : Size(180, 320));
+    EXPECT_EQ(sizeOf(frame), turn.degrees % 180 == 0 ? WidthAndHeight(320, 180) : WidthAndHeight(180, 320));
     EXPECT_LT(brightnessAt(frame, turn.darkX, turn.darkY) + 30,
               brightnessAt(frame, turn.lightX, turn.lightY));
     EXPECT_GT(brightnessAt(frame, turn.discX, turn.discY), 170);

@@ -11,7 +11,7 @@ using testing_support::ScopedEnvironment;
 namespace vexo {
 namespace {
 
-const std::string sample = VEXO_SAMPLES_DIR "/movies/clip.mov";
+const std::string clip = VEXO_SAMPLES_DIR "/movies/clip.mov";
 
 TEST(MediaReaderProgram, EndsWhenItsHostGoes) {
     RunningReader program;
@@ -44,9 +44,9 @@ TEST(MediaReaderProgram, ARequestForAFrameWithoutMemoryFails) {
         return program->receive(message, std::chrono::steady_clock::now() + std::chrono::seconds(30));
     };
     ASSERT_EQ(receive(), ReaderProcess::Reception::message);
-    const platform::FileDescriptor movie(open(sample.c_str(), O_RDONLY | O_CLOEXEC));
+    const platform::FileDescriptor movie(open(clip.c_str(), O_RDONLY | O_CLOEXEC));
     ASSERT_TRUE(
-        program->send(encodeRequest({1, contentOf(sample).size(), 10000, 256}), std::array{movie.number()}));
+        program->send(encodeRequest({1, contentOf(clip).size(), 10000, 256}), std::array{movie.number()}));
     ASSERT_EQ(receive(), ReaderProcess::Reception::message);
     EXPECT_EQ(decodeReply(message), (ReaderReply{1, MediaFailure{"there is no memory for a frame"}}));
 }

@@ -3,11 +3,11 @@
 
 #include <gmock/gmock.h>
 
-#include <array>
 #include <atomic>
 #include <nlohmann/json.hpp>
 #include <thread>
 
+#include "tests/framework/FFprobe.h"
 #include "tests/framework/RawMovie.h"
 #include "tests/support/SampleMovie.h"
 
@@ -17,19 +17,6 @@ using testing::HasSubstr;
 
 namespace vexo {
 namespace {
-
-// What FFmpeg's own program says; nil where it is not installed.
-std::optional<nlohmann::json> probed(const std::string& path) {
-    const std::string command =
-        "ffprobe -v error -of json -show_format -show_streams '" + path + "' 2>/dev/null";
-    std::unique_ptr<FILE, int (*)(FILE*)> output(popen(command.c_str(), "r"), pclose);
-    std::string text;
-    std::array<char, 4096> buffer;
-    while (const std::size_t size = fread(buffer.data(), 1, buffer.size(), output.get()))
-        text.append(buffer.data(), size);
-    const auto json = nlohmann::json::parse(text, nullptr, false);
-    return json.is_object() ? std::optional(json) : std::nullopt;
-}
 
 MediaFailure failureFor(MediaReader& reader, const std::string& path) {
     return failureIn(answerFor(reader, path), path);

@@ -21,7 +21,7 @@ using namespace vexo;
 
 namespace {
 
-const MediaReaderAnswer movie = MediaProperties{{"Video"}, 1920, 1080, 2.5, {"h264"}, 86400.25};
+const MediaReaderAnswer sameMovie = MediaProperties{{"Video"}, 1920, 1080, 2.5, {"h264"}, 86400.25};
 
 // Takes every file for the same movie, and does what it is told to while it reads.
 class CountingReader final : public MediaReader {
@@ -29,7 +29,7 @@ class CountingReader final : public MediaReader {
     MediaReaderAnswer read(int) override {
         ++reads;
         whileReading();
-        return movie;
+        return sameMovie;
     }
     MediaFrameAnswer frame(int, int) override { return MediaFailure{"no picture"}; }
 
@@ -77,8 +77,8 @@ void append(const std::string& path, std::string_view content) {
 
 TEST_F(MetadataCacheOfFiles, AFileIsReadOnceAndThenKnown) {
     const std::string path = folder_.writeFile("clip.mov", "content");
-    EXPECT_EQ(cache_.answerForFile(path), movie);
-    EXPECT_EQ(cache_.answerForFile(path), movie);
+    EXPECT_EQ(cache_.answerForFile(path), sameMovie);
+    EXPECT_EQ(cache_.answerForFile(path), sameMovie);
     EXPECT_EQ(reader_->reads, 1);
 }
 
@@ -87,14 +87,14 @@ TEST_F(MetadataCacheOfFiles, RenamingMovingAndLinkingCostNoRead) {
     cache_.answerForFile(path);
     const std::string renamed = folder_.path("renamed.mov");
     rename(path, renamed);
-    EXPECT_EQ(cache_.answerForFile(renamed), movie);
+    EXPECT_EQ(cache_.answerForFile(renamed), sameMovie);
     const std::string moved = folder_.makeFolder("other") + "/moved.mov";
     rename(renamed, moved);
-    EXPECT_EQ(cache_.answerForFile(moved), movie);
+    EXPECT_EQ(cache_.answerForFile(moved), sameMovie);
     const std::string linked = folder_.path("linked.mov");
     ASSERT_EQ(link(moved.c_str(), linked.c_str()), 0);
-    EXPECT_EQ(cache_.answerForFile(linked), movie);
-    EXPECT_EQ(cache_.answerForFile(folder_.makeLink("symbolic.mov", moved)), movie);
+    EXPECT_EQ(cache_.answerForFile(linked), sameMovie);
+    EXPECT_EQ(cache_.answerForFile(folder_.makeLink("symbolic.mov", moved)), sameMovie);
     EXPECT_EQ(reader_->reads, 1);
 }
 
@@ -109,11 +109,11 @@ TEST_F(MetadataCacheOfFiles, AnotherFileUnderTheSameNameIsRead) {
 TEST_F(MetadataCacheOfFiles, AFileThatGrowsWhileItIsReadIsReadAgain) {
     const std::string path = folder_.writeFile("clip.mov", "content");
     reader_->whileReading = [&] { append(path, "more"); };
-    EXPECT_EQ(cache_.answerForFile(path), movie);
+    EXPECT_EQ(cache_.answerForFile(path), sameMovie);
     reader_->whileReading = [] {};
-    EXPECT_EQ(cache_.answerForFile(path), movie);
+    EXPECT_EQ(cache_.answerForFile(path), sameMovie);
     EXPECT_EQ(reader_->reads, 2);
-    EXPECT_EQ(cache_.answerForFile(path), movie);
+    EXPECT_EQ(cache_.answerForFile(path), sameMovie);
     EXPECT_EQ(reader_->reads, 2);
 }
 
@@ -133,8 +133,8 @@ TEST_F(MetadataCacheOfFiles, AFileThatIsMovedWhileItIsReadIsKnownAfterwards) {
     const std::string path = folder_.writeFile("clip.mov", "content");
     const std::string moved = folder_.path("moved.mov");
     reader_->whileReading = [&] { rename(path, moved); };
-    EXPECT_EQ(cache_.answerForFile(path), movie);
-    EXPECT_EQ(cache_.answerForFile(moved), movie);
+    EXPECT_EQ(cache_.answerForFile(path), sameMovie);
+    EXPECT_EQ(cache_.answerForFile(moved), sameMovie);
     EXPECT_EQ(reader_->reads, 1);
 }
 
@@ -146,8 +146,8 @@ TEST_F(MetadataCacheOfFiles, AFileWhoseAnswerIsDamagedIsReadAgainOnce) {
     EXPECT_EQ(sqlite3_exec(database, "UPDATE files SET pixelWidth = -1", nullptr, nullptr, nullptr),
               SQLITE_OK);
     sqlite3_close(database);
-    EXPECT_EQ(cache_.answerForFile(path), movie);
-    EXPECT_EQ(cache_.answerForFile(path), movie);
+    EXPECT_EQ(cache_.answerForFile(path), sameMovie);
+    EXPECT_EQ(cache_.answerForFile(path), sameMovie);
     EXPECT_EQ(reader_->reads, 2);
 }
 
@@ -165,7 +165,7 @@ TEST_F(MetadataCacheOfFiles, AKnownFileIsAnsweredWhileAnotherIsRead) {
     };
     cache_.answerForFile(slow);
     EXPECT_EQ(status, std::future_status::ready);
-    EXPECT_EQ(answer.get(), movie);
+    EXPECT_EQ(answer.get(), sameMovie);
 }
 
 TEST_F(MetadataCacheOfFiles, AFileThatCannotBeReadIsAnsweredWhileAnotherIsRead) {
@@ -192,7 +192,7 @@ TEST_F(MetadataCacheOfFiles, ThreadsThatAskWhileAFileIsReadWaitForItsAnswer) {
     };
     std::vector<std::thread> threads;
     for (int i = 0; i < threadCount; ++i)
-        threads.emplace_back([&] { EXPECT_EQ(cache_.answerForFile(path), movie); });
+        threads.emplace_back([&] { EXPECT_EQ(cache_.answerForFile(path), sameMovie); });
     for (std::thread& thread : threads)
         thread.join();
     EXPECT_EQ(reader_->reads, 1);
@@ -219,5 +219,5 @@ TEST_F(MetadataCacheOfFiles, AFileThatMayNotBeReadHasAReasonUntilItMay) {
     ASSERT_EQ(chmod(path.c_str(), 0), 0);
     expectNoAnswer(path, "Permission denied");
     ASSERT_EQ(chmod(path.c_str(), 0400), 0);
-    EXPECT_EQ(cache_.answerForFile(path), movie);
+    EXPECT_EQ(cache_.answerForFile(path), sameMovie);
 }

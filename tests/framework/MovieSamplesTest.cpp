@@ -13,6 +13,7 @@
 
 #include "framework/metadata/FileTypes.h"
 #include "framework/metadata/MetadataStore.h"
+#include "tests/framework/FFprobe.h"
 #include "tests/support/FileContent.h"
 #include "tests/support/Program.h"
 #include "tests/support/SampleMovie.h"
@@ -116,15 +117,6 @@ bool isMovieType(const std::string& contentType) {
 }
 
 // --- What ffprobe says
-
-// nil where it is not installed.
-std::optional<json> probed(const std::string& path) {
-    const Outcome outcome =
-        runProgram("ffprobe", {"-v", "error", "-of", "json", "-show_format", "-show_streams", path});
-    if (outcome.status == -1)
-        return std::nullopt;
-    return json::parse(outcome.output);
-}
 
 // A cover picture is no video.
 bool isVideo(const json& stream) {

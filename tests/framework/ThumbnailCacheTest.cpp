@@ -10,6 +10,7 @@
 #include <fstream>
 
 #include "platform/URL.h"
+#include "tests/support/Pixels.h"
 #include "tests/support/Program.h"
 #include "tests/support/TemporaryFolder.h"
 
@@ -20,13 +21,6 @@ using testing::HasSubstr;
 using testing::Not;
 
 namespace {
-
-constexpr std::uint32_t red = 0xffff0000;
-constexpr std::uint32_t blue = 0xff0000ff;
-
-Bitmap plain(int width, int height, std::uint32_t colour = red) {
-    return {width, height, std::vector<std::uint32_t>(std::size_t(width) * std::size_t(height), colour)};
-}
 
 mode_t modeOf(const std::string& path) {
     struct stat status {};
@@ -57,19 +51,19 @@ class SharedThumbnails : public testing::Test {
 }  // namespace
 
 TEST_F(SharedThumbnails, AreFoundAsTheyWereStored) {
-    cache_.store(subject_, ThumbnailSize::large, plain(256, 144));
+    cache_.store(subject_, ThumbnailSize::large, plainBitmap(256, 144));
     const auto found = cache_.find(subject_, ThumbnailSize::large);
     ASSERT_TRUE(found);
     EXPECT_EQ(found->width, 256);
     EXPECT_EQ(found->height, 144);
-    EXPECT_EQ(found->pixels, plain(256, 144).pixels);
+    EXPECT_EQ(found->pixels, plainBitmap(256, 144).pixels);
 }
 
 TEST_F(SharedThumbnails, LieWhereOtherProgramsLookForThem) {
-    cache_.store(subject_, ThumbnailSize::normal, plain(128, 72));
-    cache_.store(subject_, ThumbnailSize::large, plain(256, 144));
-    cache_.store(subject_, ThumbnailSize::xLarge, plain(512, 288));
-    cache_.store(subject_, ThumbnailSize::xxLarge, plain(1024, 576));
+    cache_.store(subject_, ThumbnailSize::normal, plainBitmap(128, 72));
+    cache_.store(subject_, ThumbnailSize::large, plainBitmap(256, 144));
+    cache_.store(subject_, ThumbnailSize::xLarge, plainBitmap(512, 288));
+    cache_.store(subject_, ThumbnailSize::xxLarge, plainBitmap(1024, 576));
     cache_.storeFailure(subject_);
     EXPECT_THAT(files(),
                 testing::UnorderedElementsAre("thumbnails/normal/" + name_, "thumbnails/large/" + name_,
@@ -78,7 +72,7 @@ TEST_F(SharedThumbnails, LieWhereOtherProgramsLookForThem) {
 }
 
 TEST_F(SharedThumbnails, AreForTheUserAlone) {
-    cache_.store(subject_, ThumbnailSize::large, plain(2, 2));
+    cache_.store(subject_, ThumbnailSize::large, plainBitmap(2, 2));
     cache_.storeFailure(subject_);
     for (const char* folder : {"thumbnails", "thumbnails/large", "thumbnails/fail"})
         EXPECT_EQ(modeOf(folder_.path(folder)), 0700u) << folder;
@@ -97,7 +91,7 @@ TEST_F(SharedThumbnails, AreValidByTheRulesOfAnotherProgram) {
     };
     EXPECT_THAT(told(), Not(HasSubstr("thumbnail::path")));
 
-    cache_.store(subject, ThumbnailSize::large, plain(256, 144));
+    cache_.store(subject, ThumbnailSize::large, plainBitmap(256, 144));
     EXPECT_THAT(told(), HasSubstr("thumbnails/large/"));
     EXPECT_THAT(told(), HasSubstr("thumbnail::is-valid: TRUE"));
 
@@ -106,7 +100,7 @@ TEST_F(SharedThumbnails, AreValidByTheRulesOfAnotherProgram) {
 }
 
 TEST_F(SharedThumbnails, CountForOneStateOfOneFile) {
-    cache_.store(subject_, ThumbnailSize::large, plain(2, 2));
+    cache_.store(subject_, ThumbnailSize::large, plainBitmap(2, 2));
     ThumbnailSubject changed = subject_;
     changed.modificationTime += 1;
     EXPECT_FALSE(cache_.find(changed, ThumbnailSize::large));
@@ -115,32 +109,32 @@ TEST_F(SharedThumbnails, CountForOneStateOfOneFile) {
     const std::string path = folder_.path("thumbnails/large/" + name_);
     ThumbnailSubject other = subject_;
     other.uri += "x";
-    const auto png = encodedThumbnail(other, plain(2, 2));
+    const auto png = encodedThumbnail(other, plainBitmap(2, 2));
     std::ofstream(path).write(reinterpret_cast<const char*>(png.data()), std::ssize(png));
     EXPECT_FALSE(cache_.find(subject_, ThumbnailSize::large));
 }
 
 TEST_F(SharedThumbnails, ALargerOneServesAsWell) {
-    cache_.store(subject_, ThumbnailSize::xLarge, plain(512, 288));
-    cache_.store(subject_, ThumbnailSize::xxLarge, plain(1024, 576));
+    cache_.store(subject_, ThumbnailSize::xLarge, plainBitmap(512, 288));
+    cache_.store(subject_, ThumbnailSize::xxLarge, plainBitmap(1024, 576));
     EXPECT_EQ(cache_.find(subject_, ThumbnailSize::normal)->width, 512);
     EXPECT_EQ(cache_.find(subject_, ThumbnailSize::xxLarge)->width, 1024);
 }
 
 TEST_F(SharedThumbnails, ASmallerOneDoesNot) {
-    cache_.store(subject_, ThumbnailSize::normal, plain(128, 72));
+    cache_.store(subject_, ThumbnailSize::normal, plainBitmap(128, 72));
     EXPECT_FALSE(cache_.find(subject_, ThumbnailSize::large));
 }
 
 TEST_F(SharedThumbnails, OneThatIsLargerThanItsFolderAllowsIsNone) {
-    cache_.store(subject_, ThumbnailSize::normal, plain(129, 72));
+    cache_.store(subject_, ThumbnailSize::normal, plainBitmap(129, 72));
     EXPECT_FALSE(cache_.find(subject_, ThumbnailSize::normal));
 }
 
 TEST_F(SharedThumbnails, ANewOneReplacesTheOld) {
-    cache_.store(subject_, ThumbnailSize::large, plain(2, 2, red));
-    cache_.store(subject_, ThumbnailSize::large, plain(2, 2, blue));
-    EXPECT_EQ(cache_.find(subject_, ThumbnailSize::large)->pixels, plain(2, 2, blue).pixels);
+    cache_.store(subject_, ThumbnailSize::large, plainBitmap(2, 2, opaqueRed));
+    cache_.store(subject_, ThumbnailSize::large, plainBitmap(2, 2, opaqueBlue));
+    EXPECT_EQ(cache_.find(subject_, ThumbnailSize::large)->pixels, plainBitmap(2, 2, opaqueBlue).pixels);
     EXPECT_EQ(files().size(), 1u);
 }
 
@@ -161,7 +155,7 @@ TEST_F(SharedThumbnails, AreNotKeptOfAFileThatMayStillChangeInItsSecond) {
         stat(folder_.writeFile("now", std::to_string(attempt)).c_str(), &status);
         ThumbnailSubject fresh = subject_;
         fresh.modificationTime = status.st_mtim.tv_sec;
-        cache_.store(fresh, ThumbnailSize::large, plain(2, 2));
+        cache_.store(fresh, ThumbnailSize::large, plainBitmap(2, 2));
         struct stat after {};
         stat(folder_.writeFile("now", "after").c_str(), &after);
         if (after.st_mtim.tv_sec != fresh.modificationTime)
@@ -173,7 +167,7 @@ TEST_F(SharedThumbnails, AreNotKeptOfAFileThatMayStillChangeInItsSecond) {
 }
 
 TEST_F(SharedThumbnails, DamagedOnesAreNone) {
-    const auto png = encodedThumbnail(subject_, plain(40, 30));
+    const auto png = encodedThumbnail(subject_, plainBitmap(40, 30));
     const std::string whole(reinterpret_cast<const char*>(png.data()), png.size());
     ASSERT_TRUE(decodedThumbnail(bytesOf(whole), subject_, 256));
     for (std::size_t length = 0; length < whole.size(); ++length)
@@ -191,7 +185,7 @@ TEST_F(SharedThumbnails, WhatIsNoPlainFileIsNone) {
 }
 
 TEST_F(SharedThumbnails, TimesWithAFractionCount) {
-    const auto png = encodedThumbnail(subject_, plain(4, 4));
+    const auto png = encodedThumbnail(subject_, plainBitmap(4, 4));
     std::string text(reinterpret_cast<const char*>(png.data()), png.size());
     // Longer by two characters: the length of the chunk and its checksum have to follow, so Python writes it.
     const std::string path = folder_.path("fraction.png");
@@ -212,7 +206,7 @@ TEST_F(SharedThumbnails, TimesWithAFractionCount) {
 }
 
 TEST_F(SharedThumbnails, TransparencySurvives) {
-    const Bitmap faint = plain(2, 2, 0x80400000);
+    const Bitmap faint = plainBitmap(2, 2, 0x80400000);
     cache_.store(subject_, ThumbnailSize::large, faint);
     const auto found = cache_.find(subject_, ThumbnailSize::large);
     ASSERT_TRUE(found);
@@ -221,7 +215,7 @@ TEST_F(SharedThumbnails, TransparencySurvives) {
 
 TEST_F(SharedThumbnails, WithoutAFolderNothingIsKept) {
     const ThumbnailCache none{std::nullopt};
-    none.store(subject_, ThumbnailSize::large, plain(2, 2));
+    none.store(subject_, ThumbnailSize::large, plainBitmap(2, 2));
     none.storeFailure(subject_);
     EXPECT_FALSE(none.find(subject_, ThumbnailSize::large));
     EXPECT_FALSE(none.isKnownToFail(subject_));
@@ -229,7 +223,7 @@ TEST_F(SharedThumbnails, WithoutAFolderNothingIsKept) {
 
 TEST_F(SharedThumbnails, AFolderThatCannotBeMadeIsDoneWithout) {
     folder_.writeFile("thumbnails");
-    cache_.store(subject_, ThumbnailSize::large, plain(2, 2));
+    cache_.store(subject_, ThumbnailSize::large, plainBitmap(2, 2));
     EXPECT_FALSE(cache_.find(subject_, ThumbnailSize::large));
     EXPECT_THAT(files(), testing::ElementsAre("thumbnails"));
 }

@@ -12,6 +12,7 @@
 #include "host/VXMediaObject.h"
 #include "platform/linux/LinuxDispatcher.h"
 #include "tests/support/HostEnvironment.h"
+#include "tests/support/Pixels.h"
 #include "tests/support/SampleMovie.h"
 
 using namespace testing_support;
@@ -22,13 +23,6 @@ using testing::ElementsAre;
 
 namespace {
 
-constexpr std::uint32_t red = 0xffff0000;
-constexpr std::uint32_t green = 0xff00ff00;
-
-Bitmap plain(int width, int height, std::uint32_t colour) {
-    return {width, height, std::vector<std::uint32_t>(std::size_t(width) * std::size_t(height), colour)};
-}
-
 std::uint32_t middleOf(const std::optional<Bitmap>& bitmap) {
     return bitmap ? bitmap->pixels.at(std::size_t(bitmap->height / 2 * bitmap->width + bitmap->width / 2))
                   : 0;
@@ -38,14 +32,14 @@ std::uint32_t middleOf(const std::optional<Bitmap>& bitmap) {
 class ThumbnailPictures : public testing::Test {
   protected:
     std::shared_ptr<ThumbnailPicture> picture(const std::string& path = "/clip.mov") {
-        return std::make_shared<ThumbnailPicture>(path, platform::pictureWithBitmap(plain(8, 8, green)),
-                                                  queue_);
+        return std::make_shared<ThumbnailPicture>(
+            path, platform::pictureWithBitmap(plainBitmap(8, 8, opaqueGreen)), queue_);
     }
 
     HostEnvironment host_;
     std::vector<std::string> made_;  // "path side"
     std::function<std::optional<Bitmap>(const std::string&, int)> make_ = [](const std::string&, int side) {
-        return plain(side, side / 2, red);
+        return plainBitmap(side, side / 2, opaqueRed);
     };
     const std::shared_ptr<ThumbnailQueue> queue_ = newQueue(ThumbnailQueue::mostBytes);
 
@@ -76,11 +70,11 @@ TEST_F(ThumbnailPictures, ShowAStandInUntilTheThumbnailIsThere) {
     const auto owner = std::make_shared<int>();
     image->addObserver(owner, [&] { ++told; });
 
-    EXPECT_EQ(middleOf(image->draw(100, 50)), green);
+    EXPECT_EQ(middleOf(image->draw(100, 50)), opaqueGreen);
     EXPECT_EQ(told, 0);
     host_.dispatcher.runDueBlocks();
     EXPECT_EQ(told, 1);
-    EXPECT_EQ(middleOf(image->draw(100, 50)), red);
+    EXPECT_EQ(middleOf(image->draw(100, 50)), opaqueRed);
     EXPECT_EQ(image->naturalSize(), (Size{128, 64}));
     host_.dispatcher.runDueBlocks();
     EXPECT_THAT(made_, ElementsAre("/clip.mov 100"));
@@ -92,8 +86,8 @@ TEST_F(ThumbnailPictures, TheStandInKeepsItsProportions) {
     EXPECT_EQ(drawn->width, 30);
     EXPECT_EQ(drawn->height, 10);
     EXPECT_EQ(drawn->pixels.at(5 * 30 + 9), 0u);
-    EXPECT_EQ(drawn->pixels.at(5 * 30 + 10), green);
-    EXPECT_EQ(drawn->pixels.at(5 * 30 + 19), green);
+    EXPECT_EQ(drawn->pixels.at(5 * 30 + 10), opaqueGreen);
+    EXPECT_EQ(drawn->pixels.at(5 * 30 + 19), opaqueGreen);
     EXPECT_EQ(drawn->pixels.at(5 * 30 + 20), 0u);
     EXPECT_FALSE(picture()->draw(0, 10));
 }
@@ -103,7 +97,7 @@ TEST_F(ThumbnailPictures, ALargerDrawingAsksForMorePixels) {
     image->draw(100, 50);
     host_.dispatcher.runDueBlocks();
     image->draw(80, 40);
-    EXPECT_EQ(middleOf(image->draw(300, 150)), red);  // the small one, while the larger one is made
+    EXPECT_EQ(middleOf(image->draw(300, 150)), opaqueRed);  // the small one, while the larger one is made
     host_.dispatcher.runDueBlocks();
     EXPECT_THAT(made_, ElementsAre("/clip.mov 100", "/clip.mov 300"));
 }
@@ -113,7 +107,7 @@ TEST_F(ThumbnailPictures, AMovieWithoutAThumbnailKeepsTheStandInAndIsNotTriedAga
     const auto image = picture();
     image->draw(10, 10);
     host_.dispatcher.runDueBlocks();
-    EXPECT_EQ(middleOf(image->draw(10, 10)), green);
+    EXPECT_EQ(middleOf(image->draw(10, 10)), opaqueGreen);
     host_.dispatcher.runDueBlocks();
     EXPECT_EQ(made_.size(), 1u);
 }
@@ -126,27 +120,27 @@ TEST_F(ThumbnailPictures, ARefreshTellsObserversAndLooksAnewAtTheNextDrawing) {
     image->draw(10, 10);
     host_.dispatcher.runDueBlocks();
 
-    make_ = [](const std::string&, int side) { return plain(side, side, green); };
+    make_ = [](const std::string&, int side) { return plainBitmap(side, side, opaqueGreen); };
     image->refresh();
     EXPECT_EQ(told, 2);
-    EXPECT_EQ(middleOf(image->draw(10, 10)), red);  // until it is known better
+    EXPECT_EQ(middleOf(image->draw(10, 10)), opaqueRed);  // until it is known better
     host_.dispatcher.runDueBlocks();
     EXPECT_EQ(told, 3);
-    EXPECT_EQ(middleOf(image->draw(10, 10)), green);
+    EXPECT_EQ(middleOf(image->draw(10, 10)), opaqueGreen);
 }
 
 TEST_F(ThumbnailPictures, WhatWasMadeBeforeARefreshDoesNotCountAfterIt) {
     const auto image = picture();
     make_ = [&](const std::string&, int side) {
         image->refresh();  // the file changes while its thumbnail is made
-        return plain(side, side, red);
+        return plainBitmap(side, side, opaqueRed);
     };
     image->draw(10, 10);
     host_.dispatcher.runDueBlocks();
-    make_ = [](const std::string&, int side) { return plain(side, side, green); };
+    make_ = [](const std::string&, int side) { return plainBitmap(side, side, opaqueGreen); };
     image->draw(10, 10);
     host_.dispatcher.runDueBlocks();
-    EXPECT_EQ(middleOf(image->draw(10, 10)), green);
+    EXPECT_EQ(middleOf(image->draw(10, 10)), opaqueGreen);
 }
 
 TEST_F(ThumbnailPictures, TheLastOneDrawnComesFirst) {
@@ -181,21 +175,21 @@ TEST_F(ThumbnailPictures, AMakerThatRaisesCostsOneThumbnailAlone) {
     make_ = [](const std::string& path, int side) -> std::optional<Bitmap> {
         if (path == "/bad")
             throw std::bad_alloc();
-        return plain(side, side, red);
+        return plainBitmap(side, side, opaqueRed);
     };
     const auto good = picture("/good"), bad = picture("/bad");
     good->draw(1, 1);
     bad->draw(1, 1);
     host_.dispatcher.runDueBlocks();
-    EXPECT_EQ(middleOf(good->draw(1, 1)), red);
-    EXPECT_EQ(middleOf(bad->draw(1, 1)), green);
+    EXPECT_EQ(middleOf(good->draw(1, 1)), opaqueRed);
+    EXPECT_EQ(middleOf(bad->draw(1, 1)), opaqueGreen);
 }
 
 TEST_F(ThumbnailPictures, TheOldestPixelsAreGivenBackWhenThereAreTooMany) {
     const auto queue = newQueue(3 * 10 * 5 * 4);
     const auto newPicture = [&](const std::string& path) {
-        return std::make_shared<ThumbnailPicture>(path, platform::pictureWithBitmap(plain(8, 8, green)),
-                                                  queue);
+        return std::make_shared<ThumbnailPicture>(
+            path, platform::pictureWithBitmap(plainBitmap(8, 8, opaqueGreen)), queue);
     };
     std::vector<std::shared_ptr<ThumbnailPicture>> pictures;
     for (const char* path : {"/1", "/2", "/3", "/4"}) {
@@ -203,12 +197,12 @@ TEST_F(ThumbnailPictures, TheOldestPixelsAreGivenBackWhenThereAreTooMany) {
         pictures.back()->draw(10, 5);
         host_.dispatcher.runDueBlocks();
     }
-    EXPECT_EQ(middleOf(pictures[1]->draw(10, 5)), red);
-    EXPECT_EQ(middleOf(pictures[3]->draw(10, 5)), red);
-    EXPECT_EQ(middleOf(pictures[0]->draw(10, 5)), green);  // and asks for them again
+    EXPECT_EQ(middleOf(pictures[1]->draw(10, 5)), opaqueRed);
+    EXPECT_EQ(middleOf(pictures[3]->draw(10, 5)), opaqueRed);
+    EXPECT_EQ(middleOf(pictures[0]->draw(10, 5)), opaqueGreen);  // and asks for them again
     host_.dispatcher.runDueBlocks();
-    EXPECT_EQ(middleOf(pictures[0]->draw(10, 5)), red);
-    EXPECT_EQ(middleOf(pictures[1]->draw(10, 5)), green);
+    EXPECT_EQ(middleOf(pictures[0]->draw(10, 5)), opaqueRed);
+    EXPECT_EQ(middleOf(pictures[1]->draw(10, 5)), opaqueGreen);
 }
 
 TEST_F(ThumbnailPictures, AfterClosingNothingIsMade) {
@@ -223,7 +217,7 @@ TEST_F(ThumbnailPictures, AfterClosingNothingIsMade) {
 
 namespace {
 
-// Answers with a red picture, or the failure that a test sets, and counts.
+// Answers with a opaqueRed picture, or the failure that a test sets, and counts.
 class ScriptedFrames final : public MediaReader {
   public:
     MediaReaderAnswer read(int) override { return MediaFailure{"not asked for here"}; }
@@ -233,7 +227,7 @@ class ScriptedFrames final : public MediaReader {
             whileReading();
         if (failure)
             return *failure;
-        return plain(longestSide, longestSide / 2, red);
+        return plainBitmap(longestSide, longestSide / 2, opaqueRed);
     }
 
     std::optional<MediaFailure> failure;
@@ -364,9 +358,9 @@ TEST_F(ItemThumbnails, ShowTheMovieOnceDrawn) {
     const auto picture = image->picture();
     const auto standIn = picture->draw(64, 64);
     ASSERT_TRUE(standIn);
-    EXPECT_NE(middleOf(standIn), red);
+    EXPECT_NE(middleOf(standIn), opaqueRed);
     host_.dispatcher.runDueBlocks();
-    EXPECT_EQ(middleOf(picture->draw(64, 32)), red);
+    EXPECT_EQ(middleOf(picture->draw(64, 32)), opaqueRed);
     EXPECT_EQ(image->size(), (Size{128, 128}));
 }
 
@@ -380,7 +374,8 @@ TEST_F(ItemThumbnails, SettingItsOwnAgainMakesTheHostRedrawIt) {
     item.setThumbnailImage(item.thumbnailImage());
     EXPECT_EQ(told, 1);
 
-    const auto other = std::make_shared<platform::Image>(platform::pictureWithBitmap(plain(1, 1, red)));
+    const auto other =
+        std::make_shared<platform::Image>(platform::pictureWithBitmap(plainBitmap(1, 1, opaqueRed)));
     item.setThumbnailImage(other);
     EXPECT_EQ(item.thumbnailImage(), other);
     EXPECT_EQ(told, 1);

@@ -14,7 +14,7 @@ using testing::IsEmpty;
 using testing::SizeIs;
 
 // How deep a library is made that is to be as deep as can be: a look at a path takes as long as the path.
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+#if VEXO_SANITIZED
 constexpr int manyLevels = 500;
 #else
 constexpr int manyLevels = 1900;

@@ -9,7 +9,7 @@ using namespace testing_support;
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+#if VEXO_SANITIZED
 constexpr int veryMany = 10'000;
 #else
 constexpr int veryMany = 100'000;

@@ -14,14 +14,6 @@ namespace fs = std::filesystem;
 
 namespace {
 
-std::string at(const vexo::WatchState& state) {
-    using How = vexo::WatchState::How;
-    return (state.how == How::events    ? "events: "
-            : state.how == How::polling ? "polling: "
-                                        : "none: ") +
-           state.why;
-}
-
 // Folders of the disk stand for mounts of whatever kind the test says.
 class PretendedMounts : public WatcherTest {
   protected:
@@ -58,7 +50,7 @@ TEST_F(PretendedMounts, APathOnANetworkMountIsPolled) {
     const std::string path = folder.makeFolder("nas/Movies/sub");
     mounts.add(folder.path("nas"), "nfs4", "server:/movies");
     watcher().watchPath(folder.path("nas/Movies"), observer);
-    EXPECT_EQ(at(watcher().watchStateOf(path)), "polling: network file system (nfs4); looked at every 0 s");
+    EXPECT_EQ(stateOf(path), "polling: network file system (nfs4); looked at every 0 s");
     ASSERT_TRUE(isReported(folder.path("nas/Movies")));  // by the first look
     observer->calls.clear();
     folder.writeFile("nas/Movies/sub/new");
@@ -71,10 +63,9 @@ TEST_F(PretendedMounts, AMountBelowAWatchedFolderIsPolledAndTheRestIsNot) {
     folder.makeFolder("Movies/nas/sub");
     mounts.add(folder.path("Movies/nas"), "fuse.sshfs", "me@server:/");
     watcher().watchPath(folder.path("Movies"), observer);
-    EXPECT_EQ(at(watcher().watchStateOf(folder.path("Movies/nas/sub"))),
+    EXPECT_EQ(stateOf(folder.path("Movies/nas/sub")),
               "polling: network file system (fuse.sshfs); looked at every 0 s");
-    EXPECT_EQ(at(watcher().watchStateOf(folder.path("Movies/local"))),
-              "events: watched through " + folder.path("Movies"));
+    EXPECT_EQ(stateOf(folder.path("Movies/local")), "events: watched through " + folder.path("Movies"));
     ASSERT_TRUE(isReported(folder.path("Movies/nas")));
     observer->calls.clear();
     folder.writeFile("Movies/nas/sub/new");
@@ -100,7 +91,7 @@ TEST_F(PretendedMounts, TheKernelsOwnFileSystemsAreLeftAlone) {
     watch(folder.path());
     watch(folder.path("proc/1"));
     EXPECT_THAT(follower().watchedFolders(), testing::ElementsAre(folder.path()));
-    EXPECT_EQ(at(watcher().watchStateOf(folder.path("proc/1"))),
+    EXPECT_EQ(stateOf(folder.path("proc/1")),
               "none: file system that does not tell of changes (proc); not watched");
 }
 
@@ -109,10 +100,10 @@ TEST_F(PretendedMounts, AMountThatComesAndGoesIsReportedAndWatchedAsItIs) {
     watch(path);
     mounts.add(folder.path("nas"), "nfs4", "server:/");
     EXPECT_THAT(reportsOf([&] { mountsChanged(); }), Contains(path));
-    EXPECT_THAT(at(watcher().watchStateOf(path)), testing::StartsWith("polling: "));
+    EXPECT_THAT(stateOf(path), testing::StartsWith("polling: "));
     mounts.remove(folder.path("nas"));
     EXPECT_THAT(reportsOf([&] { mountsChanged(); }), Contains(path));
-    EXPECT_EQ(at(watcher().watchStateOf(path)), "events: watched through " + path);
+    EXPECT_EQ(stateOf(path), "events: watched through " + path);
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("nas/Movies/x"); }), Paths{path});
 }
 
@@ -133,7 +124,7 @@ TEST_F(PretendedMounts, TheNameOfAVolumeIsFollowedToWhereItIsMounted) {
     const std::string path = "/Volumes/Watched Disk/Movies";
     folder.makeFolder("disk/Movies/sub");
     watch(path);
-    EXPECT_THAT(at(watcher().watchStateOf(path)), testing::StartsWith("events: does not exist; "));
+    EXPECT_THAT(stateOf(path), testing::StartsWith("events: does not exist; "));
     environment.mounts.list = {{folder.path("disk"), "/dev/sdb1", "ext4", "Watched Disk"}};
     mounts.add(folder.path("disk"), "ext4", "/dev/sdb1");
     EXPECT_EQ(reportsOf([&] { mountsChanged(); }), Paths{path});
@@ -160,7 +151,7 @@ TEST_F(RealMounts, AVolumeThatIsTakenOutAndPutInIsFollowed) {
     }
     settle();
     EXPECT_EQ(observer->paths(), Paths{path});
-    EXPECT_THAT(at(watcher().watchStateOf(path)), testing::StartsWith("events: does not exist; "));
+    EXPECT_THAT(stateOf(path), testing::StartsWith("events: does not exist; "));
     EXPECT_THAT(warnings, testing::IsSubsetOf({path + " was unmounted"}));
 
     observer->calls.clear();
@@ -208,7 +199,7 @@ TEST_F(RealMounts, AMountWhoseServerIsGoneHoldsUpNobody) {
     const DeadMount mount(mountPoint);
     watch(folder.path("Movies"));
     watch(mountPoint + "/Library");
-    EXPECT_EQ(at(watcher().watchStateOf(mountPoint + "/Library")),
+    EXPECT_EQ(stateOf(mountPoint + "/Library"),
               "polling: network file system (fuse.sshfs); looked at every 0 s");
     mount.awaitRequest();  // the polling hangs from now on
     EXPECT_EQ(reportsOf([&] { fs::create_directory(local + "/x"); }), Paths{local});

@@ -17,14 +17,6 @@ namespace {
 
 using PathsOnDisk = WatcherTest;
 
-std::string at(const vexo::WatchState& state) {
-    using How = vexo::WatchState::How;
-    return (state.how == How::events    ? "events: "
-            : state.how == How::polling ? "polling: "
-                                        : "none: ") +
-           state.why;
-}
-
 }  // namespace
 
 TEST_F(PathsOnDisk, APathThatAppearsWithAllAboveItIsFound) {
@@ -192,7 +184,7 @@ TEST_F(PathsOnDisk, AFolderThatMayNotBeReadIsWatchedOnceItMay) {
     const std::string own = folder.makeFolder("Own/sub");
     chmod(folder.path("Own").c_str(), 0000);
     watch(folder.path("Own"));
-    EXPECT_THAT(at(watcher().watchStateOf(folder.path("Own"))),
+    EXPECT_THAT(stateOf(folder.path("Own")),
                 "none: " + folder.path("Own") + " cannot be watched: Permission denied");
     EXPECT_EQ(reportsOf([&] { chmod(folder.path("Own").c_str(), 0700); }), Paths{folder.path("Own")});
     EXPECT_EQ(reportsOf([&] { folder.makeFolder("Own/sub/x"); }), Paths{own});
@@ -214,7 +206,7 @@ TEST_F(PathsOnDisk, APathBelowAFolderThatMayNotBeReadIsPolled) {
     chmod(folder.path("dark").c_str(), 0300);
     const std::string path = folder.path("dark/Movies");
     watch(path);
-    EXPECT_EQ(at(watcher().watchStateOf(path)), "polling: does not exist; looked at every 0 s");
+    EXPECT_EQ(stateOf(path), "polling: does not exist; looked at every 0 s");
     fs::create_directories(path + "/sub");
     EXPECT_TRUE(settleUntil([&] { return observer->paths() == Paths{path}; }));
     EXPECT_EQ(reportsOf([&] { fs::create_directory(path + "/sub/x"); }), Paths{path + "/sub"});
@@ -243,7 +235,7 @@ TEST_F(PathsOnDisk, WhatSeveralRegistrationsCoverIsReportedOnce) {
 TEST_F(PathsOnDisk, PathsThatAreNotAbsoluteAreLeftAlone) {
     watch("XXX");
     watch("");
-    EXPECT_EQ(at(watcher().watchStateOf("XXX")), "none: it is no absolute path");
+    EXPECT_EQ(stateOf("XXX"), "none: it is no absolute path");
 }
 
 TEST_F(PathsOnDisk, TheStateOfAPathSaysHowItIsWatched) {
@@ -252,13 +244,12 @@ TEST_F(PathsOnDisk, TheStateOfAPathSaysHowItIsWatched) {
     watch(folder.path("Movies"));
     watch(missing);
     watch(file);
-    EXPECT_EQ(at(watcher().watchStateOf(path)), "events: watched through " + folder.path("Movies"));
-    EXPECT_EQ(at(watcher().watchStateOf(missing)),
-              "events: does not exist; " + folder.path() + " is watched for it");
-    EXPECT_EQ(at(watcher().watchStateOf(missing + "/x")),
+    EXPECT_EQ(stateOf(path), "events: watched through " + folder.path("Movies"));
+    EXPECT_EQ(stateOf(missing), "events: does not exist; " + folder.path() + " is watched for it");
+    EXPECT_EQ(stateOf(missing + "/x"),
               "events: " + missing + " does not exist; " + folder.path() + " is watched for it");
-    EXPECT_EQ(at(watcher().watchStateOf(file)), "events: watched through " + folder.path());
-    EXPECT_EQ(at(watcher().watchStateOf(folder.path("other"))), "none: nobody watches it");
+    EXPECT_EQ(stateOf(file), "events: watched through " + folder.path());
+    EXPECT_EQ(stateOf(folder.path("other")), "none: nobody watches it");
 }
 
 TEST_F(PathsOnDisk, APathThatNobodyWantsAnyMoreIsGivenUp) {

@@ -84,6 +84,16 @@ class WatcherTest : public testing::Test {
         return observer->paths();
     }
 
+    // How and why the path is watched as it is: "events: ...", "polling: ..." or "none: ...".
+    std::string stateOf(const std::string& path) {
+        using How = vexo::WatchState::How;
+        const vexo::WatchState state = watcher().watchStateOf(path);
+        return (state.how == How::events    ? "events: "
+                : state.how == How::polling ? "polling: "
+                                            : "none: ") +
+               state.why;
+    }
+
     HostEnvironment environment;
     TemporaryFolder folder;
     std::shared_ptr<RecordingObserver> observer = std::make_shared<RecordingObserver>();

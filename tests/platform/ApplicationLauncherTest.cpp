@@ -7,8 +7,8 @@
 
 #include "platform/linux/LinuxWorkspace.h"
 #include "tests/platform/CollectedLog.h"
-#include "tests/platform/FakeMountTable.h"
 #include "tests/support/DesktopBus.h"
+#include "tests/support/FakeMountTable.h"
 #include "tests/support/Mailbox.h"
 
 using namespace platform;

@@ -5,15 +5,16 @@
 #include <cmath>
 #include <limits>
 
+#include "tests/platform/OddNumbers.h"
 #include "tests/support/TemporaryFolder.h"
 
 namespace platform {
 namespace {
 
+using testing_support::infinity;
+using testing_support::notANumber;
 using testing_support::ScopedEnvironment;
 
-constexpr double infinity = std::numeric_limits<double>::infinity();
-constexpr double notANumber = std::numeric_limits<double>::quiet_NaN();
 constexpr double day = 86400;
 
 std::string iso(double secondsSinceReferenceDate) {

@@ -408,15 +408,15 @@ TEST(LinuxDispatcher, ADelayedBlockDoesNotHoldUpLaterOnes) {
 TEST(LinuxDispatcher, DestructionWaitsForTheBlocksThatRun) {
     CollectedLog log;
     std::atomic<int> finished = 0;
+    std::promise<void> inBackground, onThread;
+    const auto slow = [&](std::promise<void>& started) {
+        started.set_value();
+        for (int i = 0; i < 1000; ++i)
+            std::this_thread::yield();
+        ++finished;
+    };
     {
         LinuxDispatcher dispatcher(log);
-        std::promise<void> inBackground, onThread;
-        const auto slow = [&](std::promise<void>& started) {
-            started.set_value();
-            for (int i = 0; i < 1000; ++i)
-                std::this_thread::yield();
-            ++finished;
-        };
         dispatcher.asyncInBackground([&] { slow(inBackground); });
         dispatcher.detachThread("slow", 0.5, [&] { slow(onThread); });
         inBackground.get_future().wait();
@@ -429,9 +429,9 @@ TEST(LinuxDispatcher, ABlockThatRunsDuringDestructionMayHandOverOthers) {
     CollectedLog log;
     auto held = std::make_shared<int>(1);
     const std::weak_ptr<int> watched = held;
+    std::promise<void> started;
     {
         LinuxDispatcher dispatcher(log);
-        std::promise<void> started;
         dispatcher.detachThread("handing over", 0.5, [&dispatcher, &started, held = std::move(held)] {
             started.set_value();
             for (int i = 0; i < 1000; ++i) {

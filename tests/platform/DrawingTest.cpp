@@ -4,28 +4,28 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
-#include <limits>
 #include <thread>
 
 #include "platform/Duration.h"
+#include "tests/platform/OddNumbers.h"
+#include "tests/support/Pixels.h"
 
 namespace platform {
 namespace {
 
 using testing::Each;
 using testing::Not;
+using testing_support::infinity;
+using testing_support::notANumber;
+using testing_support::opaqueBlue;
+using testing_support::opaqueRed;
+using testing_support::pixel;
+using testing_support::transparent;
 
-constexpr double infinity = std::numeric_limits<double>::infinity();
-constexpr double notANumber = std::numeric_limits<double>::quiet_NaN();
 constexpr double oddNumbers[] = {notANumber, infinity, -infinity, 1e9, -1e9, 1e308, -1e308, 0, -1, 0.5};
 
-constexpr std::uint32_t transparent = 0, opaqueRed = 0xffff0000, opaqueBlue = 0xff0000ff;
 constexpr Color red{1, 0, 0, 1};
 constexpr Color clear{0, 0, 0, 0};
-
-std::uint32_t pixel(const Bitmap& bitmap, int x, int y) {
-    return bitmap.pixels[std::size_t(y * bitmap.width + x)];
-}
 
 // At `scale` pixels a point.
 Bitmap pixelsOf(Drawing& drawing, int scale = 1) {
@@ -61,7 +61,7 @@ AttributedString boldText(std::string text, double size = 10) {
     return {std::move(text), boldSystemFontOfSize(size), whiteColor};
 }
 
-Image redBesideBlue() {
+Image redBesideBlueImage() {
     return Image(pictureWithBitmap({2, 1, {opaqueRed, opaqueBlue}}));
 }
 
@@ -121,7 +121,7 @@ TEST(Drawing, WhatLiesOutsideLeavesNoMark) {
     for (const Rect& rect : {Rect{0, -1, 6, 1}, Rect{0, 4, 6, 1}, Rect{-2, 0, 2, 4}, Rect{6, 0, 2, 4}}) {
         drawing.fillRect(rect);
         drawing.fillRoundedRect(rect, 1);
-        drawing.drawImage(redBesideBlue(), rect);
+        drawing.drawImage(redBesideBlueImage(), rect);
         drawing.drawString(boldText("|||"), rect);
     }
     EXPECT_THAT(pixelsOf(drawing).pixels, Each(transparent));
@@ -159,7 +159,7 @@ TEST(Drawing, ARadiusMayBeAnyNumber) {
 TEST(Drawing, AnImageFillsItsRectangleAtEveryScale) {
     for (const int scale : {1, 2, 3}) {
         Drawing drawing({6, 4});
-        drawing.drawImage(redBesideBlue(), {1, 1, 2, 1});
+        drawing.drawImage(redBesideBlueImage(), {1, 1, 2, 1});
         const Bitmap bitmap = pixelsOf(drawing, scale);
         EXPECT_EQ(extentOf(bitmap), (Extent{scale, 2 * scale, 3 * scale, 3 * scale}));
         EXPECT_EQ(pixel(bitmap, scale, 2 * scale), opaqueRed);
@@ -218,7 +218,7 @@ TEST(Drawing, OddNumbersDrawNothingOrFillTheImage) {
             for (const Rect& rect : {Rect{position, 1, extent, 9}, Rect{1, position, 9, extent}}) {
                 drawing.fillRect(rect);
                 drawing.fillRoundedRect(rect, 3);
-                drawing.drawImage(redBesideBlue(), rect);
+                drawing.drawImage(redBesideBlueImage(), rect);
                 drawing.drawString(boldText("0:00"), rect);
             }
             EXPECT_EQ(pixelsOf(drawing).pixels.size(), 400u) << position << ", " << extent;
@@ -229,7 +229,7 @@ TEST(Drawing, OddNumbersDrawNothingOrFillTheImage) {
 TEST(Drawing, StaysDrawableAfterOddNumbers) {
     Drawing drawing({6, 4});
     drawing.fillRect({notANumber, 0, 1, 1});
-    drawing.drawImage(redBesideBlue(), {0, 0, infinity, 1e9});
+    drawing.drawImage(redBesideBlueImage(), {0, 0, infinity, 1e9});
     drawing.drawString(boldText("0:00", notANumber), {0, 0, 6, 4});
     drawing.setColor(red);
     drawing.fillRect({0, 0, 6, 1});
@@ -321,7 +321,7 @@ TEST(Drawing, IsMadeAndDrawnOnManyThreadsAtOnce) {
         Drawing drawing({40, 20});
         drawing.setColor(red);
         drawing.fillRect({0, 0, 40, 10});
-        drawing.drawImage(redBesideBlue(), {2, 2, 8, 4});
+        drawing.drawImage(redBesideBlueImage(), {2, 2, 8, 4});
         drawing.drawString(text, {4, 4, text.size().width, text.size().height});
         return drawing.image();
     };

@@ -16,7 +16,7 @@
 #include "platform/linux/HiddenNames.h"
 #include "platform/linux/LinuxFileManager.h"
 #include "tests/platform/CollectedLog.h"
-#include "tests/platform/FakeMountTable.h"
+#include "tests/support/FakeMountTable.h"
 #include "tests/support/TemporaryFolder.h"
 
 using namespace platform;

@@ -10,7 +10,7 @@
 
 #include "platform/linux/LinuxFileManager.h"
 #include "tests/platform/CollectedLog.h"
-#include "tests/platform/FakeMountTable.h"
+#include "tests/support/FakeMountTable.h"
 #include "tests/support/PathFolder.h"
 #include "tests/support/TemporaryFolder.h"
 

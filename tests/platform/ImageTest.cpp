@@ -7,15 +7,18 @@
 #include <thread>
 
 #include "tests/support/HostEnvironment.h"
+#include "tests/support/Pixels.h"
 #include "tests/support/TemporaryFolder.h"
 
 namespace platform {
 namespace {
 
 using testing::Each;
+using testing_support::opaqueBlue;
+using testing_support::opaqueRed;
+using testing_support::pixel;
 using testing_support::TemporaryFolder;
-
-constexpr std::uint32_t opaqueRed = 0xffff0000, opaqueBlue = 0xff0000ff, transparent = 0;
+using testing_support::transparent;
 
 std::shared_ptr<const Picture> pictureOf(std::string_view text) {
     return pictureWithData(std::as_bytes(std::span(text)));
@@ -40,13 +43,10 @@ std::shared_ptr<const Picture> pngPictureOf(const Bitmap& bitmap) {
     return pictureWithData(pngData(bitmap));
 }
 
-std::uint32_t pixel(const Bitmap& bitmap, int x, int y) {
-    return bitmap.pixels[std::size_t(y * bitmap.width + x)];
-}
-
 auto startOfImageData(std::vector<std::byte>& png) {
-    const std::string_view marker = "IDAT";
-    return std::ranges::search(png, std::as_bytes(std::span(marker))).begin();
+    const std::string_view name = "IDAT";
+    const auto marker = std::as_bytes(std::span(name));
+    return std::search(png.begin(), png.end(), marker.begin(), marker.end());
 }
 
 TEST(Image, TakesItsSizeFromThePicture) {

@@ -368,7 +368,8 @@ TEST(KeyedUnarchiver, WhatIsNoKeyedArchiveIsRejectedWhenItIsOpened) {
         {"other-version", "of an unknown version"},
     };
     for (const auto& [name, problem] : expected)
-        EXPECT_EQ(errorOf([&] { KeyedUnarchiver(sample(name), nullptr); }), name + ": " + problem);
+        EXPECT_EQ(errorOf([&, &file = name] { KeyedUnarchiver(sample(file), nullptr); }),
+                  name + ": " + problem);
     EXPECT_EQ(errorOf([] { KeyedUnarchiver(std::make_unique<MemoryByteSource>(Data{}, "e"), nullptr); }),
               "e: there is no value");
 }

@@ -5,7 +5,7 @@
 
 #include "platform/linux/LinuxWorkspace.h"
 #include "tests/platform/CollectedLog.h"
-#include "tests/platform/FakeMountTable.h"
+#include "tests/support/FakeMountTable.h"
 
 namespace platform {
 namespace {
@@ -31,7 +31,7 @@ class MountObservers : public testing::Test {
             });
     }
 
-    FakeMountTable table;
+    testing_support::FakeMountTable table;
     CollectedLog log;
     LinuxWorkspace workspace{table, log};
     const std::shared_ptr<int> observer = std::make_shared<int>();

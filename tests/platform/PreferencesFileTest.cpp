@@ -12,6 +12,7 @@
 #include "platform/linux/FileDescriptor.h"
 #include "platform/linux/LinuxUserDefaults.h"
 #include "tests/platform/CollectedLog.h"
+#include "tests/platform/FileBytes.h"
 #include "tests/support/OrdinaryUser.h"
 #include "tests/support/TemporaryFolder.h"
 
@@ -22,6 +23,7 @@ using testing::AllOf;
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
+using testing_support::repeated;
 
 class PreferencesFileTest : public testing::Test {
   protected:
@@ -54,13 +56,6 @@ class PreferencesFileTest : public testing::Test {
     CollectedLog log;
     LinuxUserDefaults defaults{folder.path(), "odd", &log};
 };
-
-std::string repeated(std::string_view text, int times) {
-    std::string result;
-    for (int i = 0; i < times; ++i)
-        result += text;
-    return result;
-}
 
 std::string propertyList(const std::string& content) {
     return "<plist version=\"1.0\">" + content + "</plist>";

@@ -9,9 +9,12 @@
 #include <cstdlib>
 #include <limits>
 
+#include "tests/platform/FileBytes.h"
 #include "tests/support/TemporaryFolder.h"
 
 using namespace platform;
+using testing_support::bigEndian;
+using testing_support::repeated;
 using testing_support::TemporaryFolder;
 
 namespace {
@@ -22,13 +25,6 @@ std::span<const std::byte> bytesOf(std::string_view text) {
 
 std::string textOf(std::span<const std::byte> bytes) {
     return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
-}
-
-std::string bigEndian(std::uint64_t number, int width) {
-    std::string text;
-    for (int i = width; i-- > 0;)
-        text += static_cast<char>(number >> (8 * i));
-    return text;
 }
 
 // A binary property list of objects that are written out, the first on top, with references of one byte.
@@ -46,13 +42,6 @@ std::string binaryList(const std::vector<std::string>& objects) {
 
 std::string xmlList(const std::string& content) {
     return R"(<?xml version="1.0" encoding="UTF-8"?><plist version="1.0">)" + content + "</plist>";
-}
-
-std::string repeated(const std::string& text, int times) {
-    std::string result;
-    for (int i = 0; i < times; ++i)
-        result += text;
-    return result;
 }
 
 Value readFrom(std::string_view file) {

@@ -5,14 +5,11 @@
 #include <utility>
 #include <vector>
 
-using SidecarAttributes = std::vector<std::pair<std::string, std::string>>;
+#include "tests/platform/FileBytes.h"
 
-inline std::string bigEndian(std::uint64_t number, int width) {
-    std::string bytes;
-    for (int shift = 8 * (width - 1); shift >= 0; shift -= 8)
-        bytes += static_cast<char>(number >> shift);
-    return bytes;
-}
+namespace testing_support {
+
+using SidecarAttributes = std::vector<std::pair<std::string, std::string>>;
 
 // A file with an empty resource fork and the attributes, laid out as the system that invented it does.
 inline std::string sidecarWithAttributes(const SidecarAttributes& attributes) {
@@ -42,3 +39,5 @@ inline std::string sidecarWithAttributes(const SidecarAttributes& attributes) {
             bigEndian(attributes.size(), 2);
     return file + list + values;
 }
+
+}  // namespace testing_support

@@ -8,6 +8,9 @@ using platform::appleDoublePath;
 using platform::attributeInAppleDouble;
 using testing::Eq;
 using testing::Optional;
+using testing_support::bigEndian;
+using testing_support::SidecarAttributes;
+using testing_support::sidecarWithAttributes;
 
 namespace {
 

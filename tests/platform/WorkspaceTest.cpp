@@ -6,8 +6,8 @@
 #include "platform/linux/LinuxFileManager.h"
 #include "platform/linux/LinuxWorkspace.h"
 #include "tests/platform/CollectedLog.h"
-#include "tests/platform/FakeMountTable.h"
 #include "tests/platform/StandInServices.h"
+#include "tests/support/FakeMountTable.h"
 #include "tests/support/FakeWorkspace.h"
 #include "tests/support/TemporaryFolder.h"
 
@@ -40,7 +40,7 @@ class LinuxWorkspaceTest : public testing::Test {
     const LinuxWorkspace workspace_{mounts_, log_};
 };
 
-const std::string svg = R"(<svg xmlns="http://www.w3.org/2000/svg" width="8" height="8"/>)";
+const std::string emptyVector = R"(<svg xmlns="http://www.w3.org/2000/svg" width="8" height="8"/>)";
 
 }  // namespace
 
@@ -90,7 +90,7 @@ TEST_F(LinuxWorkspaceTest, TheBundlePathIsTheProgram) {
 }
 
 TEST_F(LinuxWorkspaceTest, TheIconIsThePictureThatTheEntryNames) {
-    folder_.writeFile("data/icons/hicolor/scalable/apps/viewer.svg", svg);
+    folder_.writeFile("data/icons/hicolor/scalable/apps/viewer.svg", emptyVector);
     CollectedLog log;
     LinuxFileManager files(std::nullopt, mounts_, log, [](std::string_view) { return false; });
     StandInServices others;

@@ -2,7 +2,7 @@
 
 #include "framework/TreeWalk.h"
 
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+#if VEXO_SANITIZED
 // GCC has the function in its libraries and lacks the header that declares it.
 extern "C" std::size_t __sanitizer_get_current_allocated_bytes();
 #else
@@ -16,15 +16,17 @@ using platform::Locked;
 void Census::take(const vexo::VXMediaGroupRef& root) {
     if (!root)
         return;
-    Locked lock(mutex_);
-    std::erase_if(known_, [](const auto& each) { return each.expired(); });
-    vexo::visitGroups(root, [this](const vexo::VXMediaGroupRef& group) {
-        known_.insert(group);
+    Known found;
+    vexo::visitGroups(root, [&](const vexo::VXMediaGroupRef& group) {
+        found.insert(group);
         for (const vexo::VXMediaObjectRef& item :
              group->ownMediaObjects().value_or(vexo::VXMediaObjectList()))
-            known_.insert(item);
+            found.insert(item);
         return true;
     });
+    Locked lock(mutex_);
+    std::erase_if(known_, [](const auto& each) { return each.expired(); });
+    known_.merge(found);
 }
 
 std::size_t Census::living() {
@@ -34,7 +36,7 @@ std::size_t Census::living() {
 }
 
 std::size_t allocatedBytes() {
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+#if VEXO_SANITIZED
     return __sanitizer_get_current_allocated_bytes();
 #else
     const struct mallinfo2 memory = mallinfo2();

@@ -22,6 +22,7 @@
 #include "platform/UserDefaults.h"
 #include "platform/linux/LinuxFileManager.h"
 #include "platform/linux/MountTable.h"
+#include "tests/support/FakeMountTable.h"
 #include "tests/support/FakeWorkspace.h"
 #include "tests/support/TemporaryFolder.h"
 #include "tests/support/VirtualDispatcher.h"
@@ -57,13 +58,6 @@ class FakeUserDefaults final : public platform::UserDefaults {
     Domains stored_ VX_GUARDED_BY(mutex_);
     Domains seen_ VX_GUARDED_BY(mutex_);
     platform::Dictionary process_ VX_GUARDED_BY(mutex_);
-};
-
-// Volumes as a test sets them.
-class FakeMountTable final : public platform::MountTable {
-  public:
-    std::vector<platform::Mount> mounts() const override { return list; }
-    std::vector<platform::Mount> list;
 };
 
 // Metadata as a test sets it by path. Movies are told by the extensions mov, mp4, m4v, 3gp and dv. Counts how

@@ -47,8 +47,9 @@ class WatchingTest : public PluginTest {
         return static_cast<std::size_t>(std::count(requests.begin(), requests.end(), delayedReload));
     }
     std::vector<std::string> eventsSearchPaths() {
-        platform::Locked monitor(plugin()._monitor);
-        const auto& paths = plugin()._ReelixEventsSearchPaths;
+        ExposedPlugin& watching = plugin();
+        platform::Locked monitor(watching._monitor);
+        const auto paths = watching._ReelixEventsSearchPaths;
         return paths ? paths->snapshot() : std::vector<std::string>{"<none>"};
     }
 

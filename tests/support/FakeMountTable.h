@@ -5,6 +5,8 @@
 
 #include "platform/linux/MountTable.h"
 
+namespace testing_support {
+
 class FakeMountTable final : public platform::MountTable {
   public:
     std::vector<platform::Mount> mounts() const override {
@@ -15,3 +17,5 @@ class FakeMountTable final : public platform::MountTable {
     std::vector<platform::Mount> list;
     mutable int questions = 0;
 };
+
+}  // namespace testing_support
