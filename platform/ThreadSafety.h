@@ -1,5 +1,5 @@
 // Locks that Clang's thread-safety analysis understands, and the words in which fields and functions
-// state what guards them. GCC ignores the words; `./test --lint` has Clang check them.
+// state what guards them. GCC ignores the words; `./test asan` has Clang check them.
 #pragma once
 
 #include <mutex>
