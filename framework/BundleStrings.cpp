@@ -77,6 +77,8 @@ std::optional<std::string> BundleStrings::stringForKey(std::string_view key) con
     if (found == texts_.end() || !found->second.english)
         return std::nullopt;
     const Text& text = found->second;
+    if (text.translations.empty())
+        return text.english;
     for (const char* const* language = g_get_language_names(); *language; ++language) {
         // English has no translations, but must stop the search for those who prefer it to another language.
         if (std::string_view(*language) == "en")

@@ -86,12 +86,15 @@ class Player {
         const TextLine* line = isEmpty(partInside(size_, step.rect)) ? nullptr : lineOf(step.text);
         if (!line)
             return;
-        cairo_save(context_);
-        if (!holds(step.rect, line->size()))
+        const bool isClipped = !holds(step.rect, line->size());
+        if (isClipped) {
+            cairo_save(context_);
             clipToPixelsOf(partInside(size_, step.rect));
+        }
         setColor(step.text.color());
         line->draw(context_, step.rect.x, top(step.rect));
-        cairo_restore(context_);
+        if (isClipped)
+            cairo_restore(context_);
     }
 
   private:
@@ -111,17 +114,14 @@ class Player {
         cairo_arc(context_, left, upper, radius, 2 * quarter, 3 * quarter);
         cairo_close_path(context_);
     }
-    // In pixels, so that a bitmap of just the right size is copied and not filtered.
     void draw(const Bitmap& bitmap, const Rect& rect) const {
         const CairoSurface surface = surfaceOf(bitmap);
-        cairo_save(context_);
-        cairo_identity_matrix(context_);
-        cairo_translate(context_, rect.x * pixelsPerPointX_, top(rect) * pixelsPerPointY_);
-        cairo_scale(context_, rect.width * pixelsPerPointX_ / bitmap.width,
-                    rect.height * pixelsPerPointY_ / bitmap.height);
         cairo_set_source_surface(context_, surface.get(), 0, 0);
+        cairo_matrix_t pixelsOfPoints;
+        cairo_matrix_init_scale(&pixelsOfPoints, bitmap.width / rect.width, bitmap.height / rect.height);
+        cairo_matrix_translate(&pixelsOfPoints, -rect.x, -top(rect));
+        cairo_pattern_set_matrix(cairo_get_source(context_), &pixelsOfPoints);
         cairo_paint(context_);
-        cairo_restore(context_);
     }
     // Whole pixels: the edge of a clip that cuts through some would be blurred, and drawing slow.
     void clipToPixelsOf(const Rect& rect) const {

@@ -56,24 +56,26 @@ std::vector<cairo_glyph_t> glyphsOf(const PangoGlyphString& string, double& left
 class Lines {
   public:
     const TextLine* find(const AttributedString& text) {
-        Key key{text.text(), text.font().size, text.font().bold};
-        const auto known = lines_.find(key);
+        const auto known = lines_.find(text);
         if (known != lines_.end())
             return &known->second;
         if (lines_.size() >= mostLines)
             lines_.clear();
-        return &lines_.try_emplace(std::move(key), newLayout(text)).first->second;
+        return &lines_.try_emplace(text, newLayout(text)).first->second;
     }
 
   private:
-    struct Key {
-        std::string text;
-        double fontSize;
-        bool bold;
-        bool operator==(const Key&) const = default;
-    };
+    // A colour does not change how a text is laid out.
     struct HashOfText {
-        std::size_t operator()(const Key& key) const { return std::hash<std::string>()(key.text); }
+        std::size_t operator()(const AttributedString& text) const {
+            return std::hash<std::string>()(text.text());
+        }
+    };
+    struct LooksAlike {
+        bool operator()(const AttributedString& one, const AttributedString& other) const {
+            return one.text() == other.text() && one.font().size == other.font().size &&
+                   one.font().bold == other.font().bold;
+        }
     };
 
     // More than the thumbnails in sight.
@@ -89,7 +91,7 @@ class Lines {
     }
 
     const TextOwned<PangoContext> context_ = newContext();
-    std::unordered_map<Key, TextLine, HashOfText> lines_;
+    std::unordered_map<AttributedString, TextLine, HashOfText, LooksAlike> lines_;
 };
 
 }  // namespace
@@ -117,6 +119,8 @@ std::vector<TextLine::Run> TextLine::runsOf(PangoLayout* layout) {
 }
 
 void TextLine::draw(cairo_t* context, double left, double top) const {
+    cairo_matrix_t before;
+    cairo_get_matrix(context, &before);
     cairo_translate(context, left, top + baseline_);
     for (const Run& run : runs_) {
         cairo_set_scaled_font(context, run.font.get());
@@ -124,6 +128,7 @@ void TextLine::draw(cairo_t* context, double left, double top) const {
     }
     if (boxes_)
         pango_cairo_show_layout_line(context, pango_layout_get_line_readonly(boxes_.get(), 0));
+    cairo_set_matrix(context, &before);
 }
 
 const TextLine* lineOf(const AttributedString& text) {

@@ -27,7 +27,7 @@ class TextLine {
     explicit TextLine(TextOwned<PangoLayout> layout);
 
     Size size() const { return size_; }  // in points
-    // Draws it in the context's colour, its upper left corner there, whither the origin is moved.
+    // Draws it in the context's colour, its upper left corner there.
     void draw(cairo_t* context, double left, double top) const;
 
   private:
