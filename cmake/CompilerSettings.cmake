@@ -9,9 +9,9 @@ if(CMAKE_CXX_COMPILER_ID STREQUAL "Clang")
 endif()
 # What is said of files compiled as one, and holds for none of them alone: that a local name hides another file's
 # constant, and that what only one file sees is part of a class of a header.
-if(CMAKE_UNITY_BUILD)
-    target_compile_options(vexo_settings INTERFACE -Wno-shadow $<$<CXX_COMPILER_ID:GNU>:-Wno-subobject-linkage>)
-endif()
+set(of_several_files $<BOOL:$<TARGET_PROPERTY:UNITY_BUILD>>)
+target_compile_options(vexo_settings INTERFACE $<${of_several_files}:-Wno-shadow>
+                       $<$<AND:${of_several_files},$<CXX_COMPILER_ID:GNU>>:-Wno-subobject-linkage>)
 # GCC 12 reports members of a std::variant as uninitialized that are not the one it holds, and copies beyond the
 # end (or onto itself) in the strings that "literal" + std::string makes, both only when it optimizes.
 if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
