@@ -10,9 +10,13 @@
 #include <cstring>
 #include <memory>
 
+#include "platform/linux/Uninterrupted.h"
+
 namespace vexo {
 
 namespace {
+
+using platform::uninterrupted;
 
 struct FolderCloser {
     void operator()(DIR* folder) const { closedir(folder); }
@@ -25,10 +29,10 @@ PathEntry::Kind kindOf(mode_t mode) {
     return S_ISLNK(mode) ? PathEntry::Kind::link : PathEntry::Kind::other;
 }
 
-std::string targetOfLink(const std::string& path) {
-    char target[PATH_MAX];
-    const ssize_t length = readlink(path.c_str(), target, sizeof target);
-    return length > 0 ? std::string(target, static_cast<std::size_t>(length)) : std::string();
+PathEntry missingForError(int error) {
+    PathEntry entry;
+    entry.error = error;
+    return entry;
 }
 
 bool isDotOrDotDot(const char* name) {
@@ -39,19 +43,26 @@ bool isDotOrDotDot(const char* name) {
 
 PathEntry DiskAccess::look(const std::string& path) const {
     struct stat status {};
-    if (fstatat(AT_FDCWD, path.c_str(), &status, AT_SYMLINK_NOFOLLOW | AT_NO_AUTOMOUNT) != 0)
-        return {};
-    const PathEntry::Kind kind = kindOf(status.st_mode);
-    return {kind, kind == PathEntry::Kind::link ? targetOfLink(path) : "", status.st_dev, status.st_ino};
+    constexpr int flags = AT_SYMLINK_NOFOLLOW | AT_NO_AUTOMOUNT;
+    if (uninterrupted([&] { return fstatat(AT_FDCWD, path.c_str(), &status, flags); }) != 0)
+        return missingForError(errno);
+    PathEntry entry{kindOf(status.st_mode), "", status.st_dev, status.st_ino};
+    if (entry.kind != PathEntry::Kind::link)
+        return entry;
+    char target[PATH_MAX];
+    const ssize_t length = uninterrupted([&] { return readlink(path.c_str(), target, sizeof target); });
+    if (length < 0)
+        return missingForError(errno);
+    entry.target.assign(target, static_cast<std::size_t>(length));
+    return entry;
 }
 
 FolderListing DiskAccess::list(const std::string& path) const {
     FolderListing listing;
-    const OpenFolder folder(opendir(path.c_str()));
+    const OpenFolder folder(uninterrupted([&] { return opendir(path.c_str()); }));
     if (!folder)
         return {errno, true, {}};
-    errno = 0;
-    while (const dirent* const entry = readdir(folder.get())) {
+    while (const dirent* const entry = uninterrupted([&] { return readdir(folder.get()); })) {
         if (isDotOrDotDot(entry->d_name))
             continue;
         listing.isEmpty = false;

@@ -15,6 +15,7 @@ struct PathEntry {
     std::string target;  // of a link
     dev_t device = 0;    // these two tell entries of one path from one another
     ino_t inode = 0;
+    int error = 0;  // errno where it can't be looked at; it's missing then
 
     bool operator==(const PathEntry&) const = default;
 };
@@ -30,7 +31,6 @@ class FolderAccess {
   public:
     virtual ~FolderAccess() = default;
 
-    // What can't be looked at is missing.
     virtual PathEntry look(const std::string& path) const = 0;
     virtual FolderListing list(const std::string& folder) const = 0;
 };

@@ -7,6 +7,8 @@
 #include <cstring>
 #include <utility>
 
+#include "platform/linux/Uninterrupted.h"
+
 namespace vexo {
 
 namespace {
@@ -24,8 +26,9 @@ WatchResult InotifyEvents::add(const std::string& folder, std::uint32_t kinds) {
         queue_ = platform::FileDescriptor(inotify_init1(IN_NONBLOCK | IN_CLOEXEC));
     if (!queue_)
         return {-1, errno};
-    const int watch = inotify_add_watch(queue_.number(), folder.c_str(),
-                                        kinds | IN_ONLYDIR | IN_DONT_FOLLOW | IN_MASK_ADD | IN_EXCL_UNLINK);
+    const std::uint32_t mask = kinds | IN_ONLYDIR | IN_DONT_FOLLOW | IN_MASK_ADD | IN_EXCL_UNLINK;
+    const int watch =
+        platform::uninterrupted([&] { return inotify_add_watch(queue_.number(), folder.c_str(), mask); });
     return watch >= 0 ? WatchResult{watch, 0} : WatchResult{-1, errno};
 }
 

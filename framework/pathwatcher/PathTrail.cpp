@@ -114,9 +114,13 @@ bool PathTrail::guard(const std::string& folder, const std::string& name) {
         hasBlindSpot_ = true;
         return true;
     }
-    explanation_ = explanationOf(folder, error);
-    means_.warnOfFailure(folder, error);
+    explainFailure(folder, error);
     return false;
+}
+
+void PathTrail::explainFailure(const std::string& path, int error) {
+    explanation_ = explanationOf(path, error);
+    means_.warnOfFailure(path, error);
 }
 
 bool PathTrail::enter(std::string& folder, const std::string& child, Names& names) {
@@ -132,7 +136,10 @@ bool PathTrail::enter(std::string& folder, const std::string& child, Names& name
         case PathEntry::Kind::missing:
             break;
     }
-    return stopAt(End::missing, child, names);
+    if (isNatural(entry_.error))
+        return stopAt(End::missing, child, names);
+    explainFailure(child, entry_.error);
+    return stopAt(End::failure, child, names);
 }
 
 // False for a link that leads nowhere, or in a circle.

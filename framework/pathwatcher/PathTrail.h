@@ -58,6 +58,7 @@ class PathTrail {
     void follow(Names names);
     bool step(std::string& folder, Names& names);
     bool guard(const std::string& folder, const std::string& name);
+    void explainFailure(const std::string& path, int error);
     bool enter(std::string& folder, const std::string& child, Names& names);
     bool followLink(std::string& folder, Names& names);
     bool stopAtFile(const std::string& path);

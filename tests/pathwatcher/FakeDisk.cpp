@@ -69,10 +69,10 @@ class FakeDisk::Access final : public vexo::FolderAccess {
     vexo::PathEntry look(const std::string& path) const override {
         const NodeRef node = disk_.find(path);
         disk_.afterLook();
-        if (!node)
-            return {};
         using Kind = vexo::PathEntry::Kind;
-        return {node->isFolder ? Kind::folder : Kind::other, "", 1, node->number};
+        if (!node)
+            return {Kind::missing, "", 0, 0, ENOENT};
+        return {node->isFolder ? Kind::folder : Kind::other, "", 1, node->number, 0};
     }
 
     vexo::FolderListing list(const std::string& folder) const override {

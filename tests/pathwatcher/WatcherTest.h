@@ -44,6 +44,11 @@ class WatcherTest : public testing::Test {
         observer->calls.clear();
     }
 
+    // With a watcher that has watched nothing yet.
+    void startAnew() {
+        follower_.reset();
+        watcher_.reset();
+    }
     vexo::PathWatcher& watcher() {
         if (!watcher_) {
             watcher_ = std::make_unique<vexo::PathWatcher>(seamMaker);
