@@ -78,8 +78,9 @@ class Image {
 
 // A picture of the bytes of an SVG or PNG file, which it copies, never nil. An SVG is parsed when something
 // is first asked of its picture. Damaged bytes give a picture that is not drawable; so do pictures of more
-// than 16384 points a side or 64 Mi points in all, and SVG that is compressed, declares entities or tells no
-// size. Nothing outside the bytes is loaded, whatever an SVG refers to.
+// than 16384 points a side or 64 Mi points in all, and SVG that is compressed or not in UTF-8, declares
+// entities, embeds files, tells no size, or is larger or has more elements than any icon needs. Nothing
+// outside the bytes is loaded, whatever an SVG refers to.
 std::shared_ptr<const Picture> pictureWithData(std::span<const std::byte> data);
 
 // A picture of those pixels; one that is not drawable for a bitmap that lacks some or has too many.
