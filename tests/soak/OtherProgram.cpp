@@ -1,5 +1,7 @@
 #include <signal.h>
 
+#include <stdexcept>
+
 #include "tests/soak/Actors.h"
 #include "tests/support/RunningProgram.h"
 
@@ -25,6 +27,9 @@ class OtherProgram final : public Actor {
     }
 
   private:
+    // Of a program that says why. A crash and what the sanitizers find have others.
+    static constexpr int ordinaryFailure = 1;
+
     RunningProgram vexo(std::vector<std::string> arguments) const {
         arguments.insert(arguments.begin(),
                          {"--home", places_.home, "--plugin", REELIX_BUNDLE_DIR, "--quiet"});
@@ -33,10 +38,12 @@ class OtherProgram final : public Actor {
     bool ends(RunningProgram& program) {
         while (program.nextLine()) {
         }
-        const bool isWell = program.wait() == 0;
-        if (!isWell)
+        const int status = program.wait();
+        if (status != 0 && status != ordinaryFailure)
+            throw std::runtime_error("vexo ended with status " + std::to_string(status));
+        if (status != 0)
             count("FAILED");
-        return isWell;
+        return status == 0;
     }
 
     bool readTree() {
