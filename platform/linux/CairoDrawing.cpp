@@ -114,6 +114,8 @@ class Player {
         cairo_arc(context_, left, upper, radius, 2 * quarter, 3 * quarter);
         cairo_close_path(context_);
     }
+    // The matrix of the source, unlike that of the context, need not be put back. A bitmap of just the right
+    // size comes out as a shift by whole pixels, which is copied and not filtered.
     void draw(const Bitmap& bitmap, const Rect& rect) const {
         const CairoSurface surface = surfaceOf(bitmap);
         cairo_set_source_surface(context_, surface.get(), 0, 0);
