@@ -64,9 +64,10 @@ std::optional<std::string> homeDirectoryInPasswordDatabase() {
 
 LinuxFileManager::LinuxFileManager(std::optional<std::string> homeDirectory, const MountTable& mountTable,
                                    SystemLog& systemLog, PackageTest isPackageExtension,
-                                   std::string volumesFolder)
+                                   std::string volumesFolder, std::chrono::milliseconds patience)
     : homeDirectory_(std::move(homeDirectory)),
       mountTable_(mountTable),
+      reach_(mountTable, systemLog, patience),
       systemLog_(systemLog),
       isPackageExtension_(std::move(isPackageExtension)),
       volumesPrefix_(std::move(volumesFolder) + "/"),
@@ -196,7 +197,7 @@ std::optional<std::string> LinuxFileManager::kernelPath(const std::string& path)
         return std::nullopt;
     while (real->size() > 1 && real->back() == '/')
         real->pop_back();
-    return real;
+    return reach_.isInReach(*real) ? real : std::nullopt;
 }
 
 std::optional<std::string> LinuxFileManager::mountPointOfVolume(std::string_view displayName) const {

@@ -1,7 +1,8 @@
 // The file system of the machine.
 //
-// What exists but can't be read is a line in the system log; what does not exist is not.
-// Callable from any thread.
+// What exists but can't be read is a line in the system log; what does not exist is not. What lies on a mount
+// that doesn't answer counts as missing (MountReach), and the line is about the mount. Callable from any
+// thread.
 #pragma once
 
 #include <functional>
@@ -13,6 +14,7 @@
 #include "platform/SystemLog.h"
 #include "platform/linux/HiddenNames.h"
 #include "platform/linux/LinuxFolder.h"
+#include "platform/linux/MountReach.h"
 #include "platform/linux/MountTable.h"
 
 struct statx;
@@ -24,10 +26,12 @@ class LinuxFileManager final : public FileManager {
     using PackageTest = std::function<bool(std::string_view extension)>;
 
     // `mountTable` and `systemLog` must outlive the manager. `isPackageExtension` is asked on any thread.
-    // `volumesFolder` is for tests, which can't make entries in the real one.
+    // `volumesFolder` is for tests, which can't make entries in the real one, and `patience` with servers is
+    // for those that haven't any.
     LinuxFileManager(std::optional<std::string> homeDirectory, const MountTable& mountTable,
                      SystemLog& systemLog, PackageTest isPackageExtension,
-                     std::string volumesFolder = "/Volumes");
+                     std::string volumesFolder = "/Volumes",
+                     std::chrono::milliseconds patience = MountReach::usualPatience);
 
     // HOME where it is an absolute path, else what the password database says; nil when neither knows one.
     static std::optional<std::string> userHomeDirectory();
@@ -51,7 +55,7 @@ class LinuxFileManager final : public FileManager {
     enum class Links { follow, lookAt };
 
     // The resolved path without slashes at its end, behind which the kernel would follow a link; nil when it
-    // can't name anything.
+    // can't name anything, or nothing that can be looked at.
     std::optional<std::string> kernelPath(const std::string& path) const;
     std::optional<std::string> mountPointOfVolume(std::string_view displayName) const;
     std::optional<struct ::statx> statusOfItem(const std::string& kernelPath, Links links) const;
@@ -63,6 +67,7 @@ class LinuxFileManager final : public FileManager {
 
     const std::optional<std::string> homeDirectory_;
     const MountTable& mountTable_;
+    const MountReach reach_;
     SystemLog& systemLog_;
     const PackageTest isPackageExtension_;
     const std::string volumesPrefix_;  // "/Volumes/"

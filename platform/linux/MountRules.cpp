@@ -136,6 +136,18 @@ std::vector<Volume> volumesAmong(const std::vector<MountEntry>& entries,
     return Selection(entries, isFolder).volumes();
 }
 
+// What is mounted last at a place hides what was mounted there before.
+std::set<std::string, std::less<>> servedMountPoints(const std::vector<MountEntry>& entries) {
+    std::set<std::string, std::less<>> mountPoints;
+    for (const MountEntry& entry : entries) {
+        if (mayNotAnswer(entry))
+            mountPoints.insert(entry.path);
+        else
+            mountPoints.erase(entry.path);
+    }
+    return mountPoints;
+}
+
 bool isInside(std::string_view path, std::string_view folder) {
     if (folder == "/")
         return path.starts_with("/");

@@ -16,6 +16,7 @@
 #pragma once
 
 #include <functional>
+#include <set>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -41,6 +42,9 @@ struct Volume {
 // The volumes in mount order, "/" first. `isFolder` is asked only about mount points that answer at once.
 std::vector<Volume> volumesAmong(const std::vector<MountEntry>& entries,
                                  const std::function<bool(const std::string& path)>& isFolder);
+
+// The mount points of network and FUSE file systems, whose server or program may be gone.
+std::set<std::string, std::less<>> servedMountPoints(const std::vector<MountEntry>& entries);
 
 // Whether `path` is `folder` or lies below it.
 bool isInside(std::string_view path, std::string_view folder);

@@ -4,7 +4,6 @@
 #include <gio/gunixmounts.h>
 #include <poll.h>
 
-#include "platform/linux/MountRules.h"
 #include "platform/linux/VolumeProperties.h"
 
 namespace platform {
@@ -15,7 +14,19 @@ std::string textOrEmpty(const char* text) {
     return text ? text : "";
 }
 
-std::vector<MountEntry> readMountEntries() {
+std::vector<Mount> volumesOf(const std::vector<MountEntry>& entries) {
+    std::vector<Mount> mounts;
+    for (const Volume& volume : volumesAmong(entries, isFolderOrUnknown)) {
+        const MountEntry& entry = volume.entry;
+        mounts.push_back(
+            {entry.path, entry.device, entry.fileSystem, displayNameOfVolume(volume), isRemovable(entry)});
+    }
+    return mounts;
+}
+
+}  // namespace
+
+std::vector<MountEntry> mountEntries() {
     std::vector<MountEntry> entries;
     GList* const list = g_unix_mounts_get(nullptr);
     for (GList* link = list; link; link = link->next) {
@@ -29,30 +40,25 @@ std::vector<MountEntry> readMountEntries() {
     return entries;
 }
 
-std::vector<Mount> readMounts() {
-    const auto entries = readMountEntries();
-    std::vector<Mount> mounts;
-    for (const Volume& volume : volumesAmong(entries, isFolderOrUnknown)) {
-        const MountEntry& entry = volume.entry;
-        mounts.push_back(
-            {entry.path, entry.device, entry.fileSystem, displayNameOfVolume(volume), isRemovable(entry)});
-    }
-    return mounts;
-}
-
-}  // namespace
-
 SystemMountTable::SystemMountTable() : changes_(open("/proc/self/mountinfo", O_RDONLY | O_CLOEXEC)) {}
 
 std::vector<Mount> SystemMountTable::mounts() const {
-    return *snapshot();
+    return snapshot()->volumes;
+}
+
+MountTable::MountPoints SystemMountTable::servedMountPoints() const {
+    const auto current = snapshot();
+    return {current, &current->servedMountPoints};
 }
 
 // Whoever needs the table while another thread reads it waits for that thread instead of reading it as well.
-SystemMountTable::Snapshot SystemMountTable::snapshot() const {
+std::shared_ptr<const SystemMountTable::Snapshot> SystemMountTable::snapshot() const {
     Locked lock(mutex_);
-    if (hasChanged() || !current_)
-        current_ = std::make_shared<const std::vector<Mount>>(readMounts());
+    if (hasChanged() || !current_) {
+        const auto entries = mountEntries();
+        current_ = std::make_shared<const Snapshot>(
+            Snapshot{volumesOf(entries), platform::servedMountPoints(entries)});
+    }
     return current_;
 }
 

@@ -10,6 +10,7 @@
 using namespace platform;
 using testing::ElementsAre;
 using testing::Eq;
+using testing::IsEmpty;
 using testing::Optional;
 
 namespace {
@@ -191,6 +192,22 @@ TEST(VolumeProperties, WhatTheDesktopMountedIsRemovable) {
 }
 
 // --- The kernel's table
+
+TEST(MountRules, NetworkAndFUSEMountsMayNotAnswer) {
+    EXPECT_THAT(servedMountPoints({root,
+                                   {"/mnt/nas", "nas:/export", "nfs4", "/"},
+                                   {"/mnt/ssh", "me@host:/", "fuse.sshfs", "/"},
+                                   {"/media/stick", "/dev/sdb1", "fuseblk", "/"},
+                                   disk("/media/card", "/dev/sdc1", "vfat"),
+                                   {"/proc", "proc", "proc", "/"}}),
+                ElementsAre("/media/stick", "/mnt/nas", "/mnt/ssh"));
+}
+
+TEST(MountRules, WhatIsMountedLastAtAPlaceDecidesWhetherItAnswers) {
+    const MountEntry share{"/mnt/a", "nas:/export", "nfs4", "/"};
+    EXPECT_THAT(servedMountPoints({root, share, disk("/mnt/a", "/dev/sdb1")}), IsEmpty());
+    EXPECT_THAT(servedMountPoints({root, disk("/mnt/a", "/dev/sdb1"), share}), ElementsAre("/mnt/a"));
+}
 
 TEST(SystemMountTable, BeginsWithTheRoot) {
     const SystemMountTable table;

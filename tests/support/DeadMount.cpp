@@ -9,6 +9,7 @@
 #include <array>
 #include <cerrno>
 #include <cstring>
+#include <filesystem>
 #include <stdexcept>
 
 #include "tests/support/LoopImage.h"
@@ -35,7 +36,9 @@ std::optional<std::string> DeadMount::reasonAgainst() {
 
 DeadMount::DeadMount(const std::string& mountPoint)
     : mountPoint_(mountPoint), server_(open("/dev/fuse", O_RDWR | O_CLOEXEC)) {
-    const std::string options = fmt::format("fd={},rootmode=40000,user_id=0,group_id=0", server_.number());
+    const char* const rootMode = std::filesystem::is_directory(mountPoint) ? "40000" : "100000";
+    const std::string options =
+        fmt::format("fd={},rootmode={},user_id=0,group_id=0", server_.number(), rootMode);
     if (!server_ || mount("me@gone:/", mountPoint.c_str(), "fuse.sshfs", 0, options.c_str()) != 0)
         throw std::runtime_error(std::string("cannot mount: ") + std::strerror(errno));
     greet();

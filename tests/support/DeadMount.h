@@ -13,7 +13,8 @@ class DeadMount {
     // Why this process can't have one; nil when it can.
     static std::optional<std::string> reasonAgainst();
 
-    // Requires: reasonAgainst answered nil. Raises std::runtime_error when it can't be mounted.
+    // At a folder or a file. Requires: reasonAgainst answered nil. Raises std::runtime_error when it can't be
+    // mounted.
     explicit DeadMount(const std::string& mountPoint);
     ~DeadMount();
     DeadMount(const DeadMount&) = delete;

@@ -14,7 +14,10 @@ class FakeMountTable final : public platform::MountTable {
         return list;
     }
 
+    MountPoints servedMountPoints() const override { return served; }
+
     std::vector<platform::Mount> list;
+    MountPoints served = std::make_shared<const std::set<std::string, std::less<>>>();
     mutable int questions = 0;
 };
 

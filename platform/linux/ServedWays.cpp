@@ -1,0 +1,87 @@
+#include "platform/linux/ServedWays.h"
+
+#include <unistd.h>
+
+#include <climits>
+#include <deque>
+#include <vector>
+
+#include "platform/Path.h"
+#include "platform/linux/Uninterrupted.h"
+
+namespace platform {
+
+namespace {
+
+constexpr int mostLinks = 40;  // as many as the kernel follows
+constexpr std::size_t mostFoldersKept = 1024;
+
+std::optional<std::string> targetOfLink(const std::string& path) {
+    char target[PATH_MAX];
+    const ssize_t length = uninterrupted([&] { return readlink(path.c_str(), target, sizeof target); });
+    return length < 0 ? std::nullopt : std::optional(std::string(target, static_cast<std::size_t>(length)));
+}
+
+}  // namespace
+
+// A path that the kernel refuses leads nowhere.
+std::optional<std::string> ServedWays::mountPointOnTheWayTo(const std::string& path) {
+    if (served_->empty() || !path.starts_with('/') || path.size() >= PATH_MAX)
+        return std::nullopt;
+    Way way = wayTo(path);
+    return way.endsAtMount ? std::optional(std::move(way.path)) : std::nullopt;
+}
+
+// From the nearest folder that was followed before.
+ServedWays::Way ServedWays::wayTo(const std::string& path) {
+    std::vector<std::string> names;
+    std::string folder = path;
+    while (folder != "/" && !ways_.contains(folder)) {
+        names.push_back(path::lastComponent(folder));
+        folder = path::withoutLastComponent(folder);
+    }
+    Way way = folder == "/" ? begin() : ways_.at(folder);
+    for (; !names.empty() && !way.endsAtMount; names.pop_back()) {
+        if (folder != "/")
+            keep(folder, way);
+        goOn(way, names.back());
+        folder = path::appending(folder, names.back());
+    }
+    return way;
+}
+
+// Behind a link that leads in a circle the kernel goes no further either.
+void ServedWays::goOn(Way& way, std::string name) const {
+    std::deque<std::string> names{std::move(name)};
+    for (int linksFollowed = 0; !names.empty() && !way.endsAtMount && linksFollowed <= mostLinks;) {
+        const std::string next = std::move(names.front());
+        names.pop_front();
+        if (next == "..")
+            way.path = path::withoutLastComponent(way.path);
+        if (next == "." || next == "..")
+            continue;
+        std::string child = path::appending(way.path, next);
+        way.endsAtMount = served_->contains(child);
+        const auto target = way.endsAtMount ? std::nullopt : targetOfLink(child);
+        if (!target) {
+            way.path = std::move(child);
+            continue;
+        }
+        ++linksFollowed;
+        std::vector<std::string> inside = path::components(*target);
+        if (!inside.empty() && inside.front() == "/") {
+            way = begin();
+            inside.erase(inside.begin());
+        }
+        names.insert(names.begin(), inside.begin(), inside.end());
+    }
+}
+
+// A scan goes through one folder after another, so starting over costs it little.
+void ServedWays::keep(const std::string& folder, const Way& way) {
+    if (ways_.size() == mostFoldersKept)
+        ways_.clear();
+    ways_.emplace(folder, way);
+}
+
+}  // namespace platform
