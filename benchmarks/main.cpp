@@ -19,9 +19,12 @@ class Table final : public benchmark::BenchmarkReporter {
         return true;
     }
     void ReportRuns(const std::vector<Run>& runs) override {
-        for (const Run& run : runs)
+        for (const Run& run : runs) {
             fmt::print("{:<{}}  {}\n", run.benchmark_name(), nameWidth_, textOf(run));
+            hasFailures_ = hasFailures_ || run.error_occurred;
+        }
     }
+    bool hasFailures() const { return hasFailures_; }
 
   private:
     static std::string textOf(const Run& run) {
@@ -41,6 +44,7 @@ class Table final : public benchmark::BenchmarkReporter {
     static constexpr std::string_view ratioPrefix = "to_";
 
     std::size_t nameWidth_ = 0;
+    bool hasFailures_ = false;
 };
 
 }  // namespace
@@ -52,4 +56,5 @@ int main(int argc, char** argv) {
     Table table;
     benchmark::RunSpecifiedBenchmarks(&table);
     benchmark::Shutdown();
+    return table.hasFailures() ? 1 : 0;
 }
