@@ -121,6 +121,10 @@ class FileManager {
     // The path with "/Volumes/<display name>" replaced by the volume's mount point; any other path as it is.
     // nil where no volume has the name.
     virtual std::optional<std::string> resolvedPath(const std::string& path) const = 0;
+
+    // Whether what lies at the path, or would, can be looked at without waiting for a server that is gone.
+    // The operations above ask that themselves; whoever asks the system by itself asks this first.
+    virtual bool isInReach(const std::string& /*path*/) const { return true; }
 };
 
 }  // namespace platform

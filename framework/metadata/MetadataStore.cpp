@@ -45,8 +45,8 @@ std::optional<std::string> realPathOf(const std::string& path) {
 // nil for what is not there or out of reach; `errno` then says why. Follows links.
 std::optional<FoundFile> foundFile(const std::string& path) {
     auto real = realPathOf(path);
-    if (!real) {
-        errno = ENOENT;
+    if (!real || !platform::services().fileManager.isInReach(*real)) {
+        errno = real ? ETIMEDOUT : ENOENT;
         return std::nullopt;
     }
     FoundFile file{path, std::move(*real), {}};

@@ -1,20 +1,19 @@
 #include "framework/pathwatcher/PolledTree.h"
 
-#include <dirent.h>
 #include <fcntl.h>
 #include <sys/stat.h>
 
 #include <algorithm>
 #include <cerrno>
-#include <cstring>
 #include <functional>
-#include <memory>
 #include <set>
-#include <string_view>
 #include <utility>
 
 #include "framework/pathwatcher/PackageName.h"
 #include "platform/Path.h"
+#include "platform/linux/LinuxFolder.h"
+#include "platform/linux/MountReach.h"
+#include "platform/linux/Uninterrupted.h"
 
 namespace vexo {
 
@@ -22,10 +21,7 @@ namespace {
 
 namespace path = platform::path;
 
-struct FolderCloser {
-    void operator()(DIR* folder) const { closedir(folder); }
-};
-using OpenFolder = std::unique_ptr<DIR, FolderCloser>;
+using platform::uninterrupted;
 
 class Signature {
   public:
@@ -59,35 +55,31 @@ std::uint64_t signatureOf(const struct stat& status) {
         .value();
 }
 
-bool isDotOrDotDot(const char* name) {
-    return std::strcmp(name, ".") == 0 || std::strcmp(name, "..") == 0;
-}
-
 struct FolderLook {
     std::uint64_t signature = 0;  // 0 for an empty one
     std::vector<std::string> folders;
 };
 
 // The entries are summed up, because servers list them in any order.
-void add(FolderLook& look, int folder, const char* name) {
+void add(FolderLook& look, int folder, const std::string& name) {
     struct stat status {};
-    if (fstatat(folder, name, &status, AT_SYMLINK_NOFOLLOW | AT_NO_AUTOMOUNT) != 0)
+    constexpr int flags = AT_SYMLINK_NOFOLLOW | AT_NO_AUTOMOUNT;
+    if (uninterrupted([&] { return fstatat(folder, name.c_str(), &status, flags); }) != 0)
         return;
-    look.signature += Signature(std::hash<std::string_view>()(name), signatureOf(status)).value();
+    look.signature += Signature(std::hash<std::string>()(name), signatureOf(status)).value();
     if (S_ISDIR(status.st_mode))
-        look.folders.emplace_back(name);
+        look.folders.push_back(name);
 }
 
 FolderLook lookInto(const std::string& folder, const std::atomic<bool>& stopped) {
-    FolderLook look;
-    const OpenFolder open(opendir(folder.c_str()));
-    if (!open)
+    const auto listing = platform::FolderListing::open(folder);
+    if (!listing)
         return {Signature(errno).value(), {}};
-    while (const dirent* const entry = readdir(open.get())) {
+    FolderLook look;
+    for (const platform::FolderItem& item : listing->items) {
         if (stopped)
             break;
-        if (!isDotOrDotDot(entry->d_name))
-            add(look, dirfd(open.get()), entry->d_name);
+        add(look, dirfd(listing->folder.get()), item.name);
     }
     return look;
 }
@@ -95,16 +87,25 @@ FolderLook lookInto(const std::string& folder, const std::atomic<bool>& stopped)
 }  // namespace
 
 std::vector<std::string> PolledTree::look(const std::atomic<bool>& stopped) {
+    const bool wasAway = awaitServer();
     Appearance now = appearance(stopped);
-    if (stopped || (isKnown_ && now == known_))
+    if (stopped || (isKnown_ && !wasAway && now == known_))
         return {};
     std::swap(known_, now);
-    return std::exchange(isKnown_, true) ? changesSince(now) : std::vector{reported("")};
+    return std::exchange(isKnown_, true) && !wasAway ? changesSince(now) : std::vector{reported("")};
+}
+
+// What the kernel has cached would be answered without the server.
+bool PolledTree::awaitServer() const {
+    const auto begun = clock_();
+    struct statx status {};
+    statx(AT_FDCWD, place_.path.c_str(), AT_STATX_FORCE_SYNC | AT_NO_AUTOMOUNT, STATX_BASIC_STATS, &status);
+    return clock_() - begun >= platform::MountReach::usualPatience;
 }
 
 PolledTree::Appearance PolledTree::appearance(const std::atomic<bool>& stopped) const {
     struct stat status {};
-    if (stat(place_.path.c_str(), &status) != 0)
+    if (uninterrupted([&] { return stat(place_.path.c_str(), &status); }) != 0)
         return {};
     Appearance appearance{signatureOf(status), {}};
     if (S_ISDIR(status.st_mode) && place_.depth == PolledPlace::Depth::tree)

@@ -4,7 +4,9 @@
 #pragma once
 
 #include <atomic>
+#include <chrono>
 #include <cstdint>
+#include <functional>
 #include <map>
 #include <string>
 #include <vector>
@@ -15,13 +17,16 @@ namespace vexo {
 
 class PolledTree {
   public:
-    explicit PolledTree(PolledPlace place) : place_(std::move(place)) {}
+    using Clock = std::function<std::chrono::steady_clock::time_point()>;
+
+    explicit PolledTree(PolledPlace place, Clock clock = std::chrono::steady_clock::now)
+        : place_(std::move(place)), clock_(std::move(clock)) {}
 
     const PolledPlace& place() const { return place_; }
 
     // Looks at all of it, for as long as a server takes. Answers what changed since the last look, each path
-    // once: at the first look the place itself. `stopped` ends the look early; its answer is then worth
-    // nothing.
+    // once: at the first look the place itself, and at one that had to wait for the server so long that
+    // others took the place for missing. `stopped` ends the look early; its answer is then worth nothing.
     std::vector<std::string> look(const std::atomic<bool>& stopped);
 
   private:
@@ -34,6 +39,8 @@ class PolledTree {
         Signatures folders;
     };
 
+    // Whether that took too long.
+    bool awaitServer() const;
     Appearance appearance(const std::atomic<bool>& stopped) const;
     Signatures folders(const std::atomic<bool>& stopped) const;
     std::vector<std::string> changesSince(const Appearance& before) const;
@@ -41,6 +48,7 @@ class PolledTree {
     bool isExcluded(const std::string& path) const;
 
     const PolledPlace place_;
+    const Clock clock_;
     bool isKnown_ = false;
     Appearance known_;
 };

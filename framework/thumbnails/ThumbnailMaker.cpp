@@ -37,8 +37,9 @@ ThumbnailMaker::ThumbnailMaker(ThumbnailCache cache, std::shared_ptr<MediaReader
 
 std::optional<platform::Bitmap> ThumbnailMaker::thumbnailOf(const std::string& path, int side) const {
     // Other programs know the file by its real path.
-    const auto realPath = platform::services().fileManager.resolvedPath(path);
-    const auto subject = realPath ? subjectAt(*realPath) : std::nullopt;
+    const platform::FileManager& files = platform::services().fileManager;
+    const auto realPath = files.resolvedPath(path);
+    const auto subject = realPath && files.isInReach(*realPath) ? subjectAt(*realPath) : std::nullopt;
     if (!subject)
         return std::nullopt;
     const ThumbnailSize size = thumbnailSizeFor(side);

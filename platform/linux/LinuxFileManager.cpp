@@ -71,7 +71,7 @@ LinuxFileManager::LinuxFileManager(std::optional<std::string> homeDirectory, con
       systemLog_(systemLog),
       isPackageExtension_(std::move(isPackageExtension)),
       volumesPrefix_(std::move(volumesFolder) + "/"),
-      folderServices_{hiddenNames_, isPackageExtension_, systemLog_} {}
+      folderServices_{hiddenNames_, reach_, isPackageExtension_, systemLog_} {}
 
 std::optional<std::string> LinuxFileManager::userHomeDirectory() {
     const char* const home = std::getenv("HOME");
@@ -182,6 +182,7 @@ std::optional<std::string> LinuxFileManager::resolvedPath(const std::string& pat
     const std::string name = path.substr(volumesPrefix_.size(), nameEnd - volumesPrefix_.size());
     struct stat status {};
     if (name.empty() || name == "." || name == ".." ||
+        mountTable_.servedMountPoints()->contains(volumesPrefix_ + name) ||
         uninterrupted([&] { return lstat((volumesPrefix_ + name).c_str(), &status); }) == 0)
         return path;
     const auto mountPoint = mountPointOfVolume(name);
@@ -189,6 +190,11 @@ std::optional<std::string> LinuxFileManager::resolvedPath(const std::string& pat
         return std::nullopt;
     const std::string rest = path.substr(nameEnd);
     return *mountPoint == "/" && !rest.empty() ? rest : *mountPoint + rest;
+}
+
+bool LinuxFileManager::isInReach(const std::string& path) const {
+    const auto real = resolvedPath(path);
+    return real && reach_.isInReach(*real);
 }
 
 std::optional<std::string> LinuxFileManager::kernelPath(const std::string& path) const {

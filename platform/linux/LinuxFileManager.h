@@ -50,6 +50,7 @@ class LinuxFileManager final : public FileManager {
     std::optional<std::string> fileSystemTypeNameAtPath(const std::string& path) const override;
     std::unique_ptr<ByteSource> openFileAtPath(const std::string& path) const override;
     std::optional<std::string> resolvedPath(const std::string& path) const override;
+    bool isInReach(const std::string& path) const override;
 
   private:
     enum class Links { follow, lookAt };

@@ -97,18 +97,20 @@ std::optional<std::uint32_t> LinuxFolder::flagsOf(const FolderItem& item) const 
 bool LinuxFolder::isPlainFile(const FolderItem& item) const {
     if (item.kind != FolderItem::Kind::other)
         return item.kind == FolderItem::Kind::plainFile;
-    const auto status = statusOf(item, /*flags=*/0);
+    const auto status = isInReach(item) ? statusOf(item, /*flags=*/0) : std::nullopt;
     return status && S_ISREG(status->stx_mode);
 }
 
 std::optional<FileAttributes> LinuxFolder::attributesOf(const FolderItem& item) const {
-    const auto status = statusOf(item, /*flags=*/0);
+    const auto status = isInReach(item) ? statusOf(item, /*flags=*/0) : std::nullopt;
     return status ? std::optional(attributesFromStatus(*status)) : std::nullopt;
 }
 
 std::optional<std::ptrdiff_t> LinuxFolder::extendedAttributeOf(const FolderItem& item,
                                                                std::string_view attribute,
                                                                std::span<char> buffer) const {
+    if (!isInReach(item))
+        return std::nullopt;
     // On the folder's device. A single file onto which one of another is mounted counts as well: nobody does
     // that to a clip.
     const bool isLikeOthers = item.kind == FolderItem::Kind::plainFile;
@@ -122,6 +124,10 @@ std::optional<std::ptrdiff_t> LinuxFolder::extendedAttributeOf(const FolderItem&
         services_.systemLog.log(
             failureLine("read an attribute of", pathOf(item.name), static_cast<int>(-answer.size)));
     return isOfFoundFile(answer.size) ? std::optional(answer.size) : std::nullopt;
+}
+
+bool LinuxFolder::isInReach(const FolderItem& item) const {
+    return item.kind != FolderItem::Kind::other || services_.reach.isInReach(pathOf(item.name));
 }
 
 std::optional<struct statx> LinuxFolder::statusOf(const FolderItem& item, int flags) const {

@@ -16,6 +16,7 @@
 #include "platform/FileManager.h"
 #include "platform/SystemLog.h"
 #include "platform/linux/HiddenNames.h"
+#include "platform/linux/MountReach.h"
 
 struct statx;
 
@@ -39,6 +40,7 @@ class LinuxFolder final : public Folder {
     // What it asks for what the kernel doesn't tell.
     struct Services {
         const HiddenNames& hiddenNames;
+        const MountReach& reach;
         const std::function<bool(std::string_view extension)>& isPackageExtension;
         SystemLog& systemLog;
     };
@@ -54,6 +56,8 @@ class LinuxFolder final : public Folder {
                                                       std::span<char> buffer) const override;
 
   private:
+    // Not behind a link to a mount that doesn't answer.
+    bool isInReach(const FolderItem& item) const;
     std::optional<struct ::statx> statusOf(const FolderItem& item, int flags) const;
     bool isInvisibleByName(const std::string& name) const;
     std::string pathOf(const std::string& name) const;

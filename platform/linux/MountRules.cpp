@@ -64,6 +64,11 @@ bool mayNotAnswer(const MountEntry& entry) {
     return isNetworkFileSystem(entry.fileSystem, entry.device) || isFuse(entry.fileSystem);
 }
 
+// Neither by the kernel nor by a program that has the disk to itself, which is as good as its disk.
+bool isServedByAnother(const MountEntry& entry) {
+    return entry.fileSystem == "autofs" || (mayNotAnswer(entry) && entry.fileSystem != "fuseblk");
+}
+
 // One that is mounted over has disappeared.
 bool isMountedOver(const std::vector<MountEntry>& entries, std::size_t index) {
     return std::any_of(entries.begin() + static_cast<std::ptrdiff_t>(index) + 1, entries.end(),
@@ -136,11 +141,12 @@ std::vector<Volume> volumesAmong(const std::vector<MountEntry>& entries,
     return Selection(entries, isFolder).volumes();
 }
 
-// What is mounted last at a place hides what was mounted there before.
+// What is mounted last at a place hides what was mounted there before, as it hides the automounter that did
+// it.
 std::set<std::string, std::less<>> servedMountPoints(const std::vector<MountEntry>& entries) {
     std::set<std::string, std::less<>> mountPoints;
     for (const MountEntry& entry : entries) {
-        if (mayNotAnswer(entry))
+        if (isServedByAnother(entry))
             mountPoints.insert(entry.path);
         else
             mountPoints.erase(entry.path);

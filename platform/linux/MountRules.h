@@ -43,7 +43,8 @@ struct Volume {
 std::vector<Volume> volumesAmong(const std::vector<MountEntry>& entries,
                                  const std::function<bool(const std::string& path)>& isFolder);
 
-// The mount points of network and FUSE file systems, whose server or program may be gone.
+// The mount points of network and FUSE file systems, whose server or program may be gone, and of what is
+// mounted when it is looked at, which may be one. Local disks are none, whoever drives them.
 std::set<std::string, std::less<>> servedMountPoints(const std::vector<MountEntry>& entries);
 
 // Whether `path` is `folder` or lies below it.

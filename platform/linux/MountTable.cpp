@@ -42,23 +42,40 @@ std::vector<MountEntry> mountEntries() {
 
 SystemMountTable::SystemMountTable() : changes_(open("/proc/self/mountinfo", O_RDONLY | O_CLOEXEC)) {}
 
+// The table with what was made of it. Volumes are looked at for their names, and disks may sleep; so only
+// whoever asks for volumes waits for that.
+class SystemMountTable::Snapshot {
+  public:
+    explicit Snapshot(std::vector<MountEntry> entries)
+        : entries_(std::move(entries)), servedMountPoints_(platform::servedMountPoints(entries_)) {}
+
+    const std::vector<Mount>& volumes() const {
+        std::call_once(volumesMade_, [this] { volumes_ = volumesOf(entries_); });
+        return volumes_;
+    }
+    const std::set<std::string, std::less<>>& servedMountPoints() const { return servedMountPoints_; }
+
+  private:
+    const std::vector<MountEntry> entries_;
+    const std::set<std::string, std::less<>> servedMountPoints_;
+    mutable std::once_flag volumesMade_;
+    mutable std::vector<Mount> volumes_;
+};
+
 std::vector<Mount> SystemMountTable::mounts() const {
-    return snapshot()->volumes;
+    return snapshot()->volumes();
 }
 
 MountTable::MountPoints SystemMountTable::servedMountPoints() const {
     const auto current = snapshot();
-    return {current, &current->servedMountPoints};
+    return {current, &current->servedMountPoints()};
 }
 
 // Whoever needs the table while another thread reads it waits for that thread instead of reading it as well.
 std::shared_ptr<const SystemMountTable::Snapshot> SystemMountTable::snapshot() const {
     Locked lock(mutex_);
-    if (hasChanged() || !current_) {
-        const auto entries = mountEntries();
-        current_ = std::make_shared<const Snapshot>(
-            Snapshot{volumesOf(entries), platform::servedMountPoints(entries)});
-    }
+    if (hasChanged() || !current_)
+        current_ = std::make_shared<const Snapshot>(mountEntries());
     return current_;
 }
 

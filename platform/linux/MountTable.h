@@ -53,10 +53,7 @@ class SystemMountTable final : public MountTable {
     MountPoints servedMountPoints() const override VX_EXCLUDES(mutex_);
 
   private:
-    struct Snapshot {
-        std::vector<Mount> volumes;
-        std::set<std::string, std::less<>> servedMountPoints;
-    };
+    class Snapshot;
 
     std::shared_ptr<const Snapshot> snapshot() const VX_EXCLUDES(mutex_);
     bool hasChanged() const VX_REQUIRES(mutex_);

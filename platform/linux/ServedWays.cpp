@@ -4,7 +4,7 @@
 
 #include <climits>
 #include <deque>
-#include <vector>
+#include <optional>
 
 #include "platform/Path.h"
 #include "platform/linux/Uninterrupted.h"
@@ -25,11 +25,10 @@ std::optional<std::string> targetOfLink(const std::string& path) {
 }  // namespace
 
 // A path that the kernel refuses leads nowhere.
-std::optional<std::string> ServedWays::mountPointOnTheWayTo(const std::string& path) {
+std::vector<std::string> ServedWays::mountPointsOnTheWayTo(const std::string& path) {
     if (served_->empty() || !path.starts_with('/') || path.size() >= PATH_MAX)
-        return std::nullopt;
-    Way way = wayTo(path);
-    return way.endsAtMount ? std::optional(std::move(way.path)) : std::nullopt;
+        return {};
+    return wayTo(path).mountPoints;
 }
 
 // From the nearest folder that was followed before.
@@ -41,7 +40,7 @@ ServedWays::Way ServedWays::wayTo(const std::string& path) {
         folder = path::withoutLastComponent(folder);
     }
     Way way = folder == "/" ? begin() : ways_.at(folder);
-    for (; !names.empty() && !way.endsAtMount; names.pop_back()) {
+    for (; !names.empty(); names.pop_back()) {
         if (folder != "/")
             keep(folder, way);
         goOn(way, names.back());
@@ -50,10 +49,16 @@ ServedWays::Way ServedWays::wayTo(const std::string& path) {
     return way;
 }
 
+ServedWays::Way ServedWays::begin() const {
+    Way way;
+    enter(way, "/");
+    return way;
+}
+
 // Behind a link that leads in a circle the kernel goes no further either.
 void ServedWays::goOn(Way& way, std::string name) const {
     std::deque<std::string> names{std::move(name)};
-    for (int linksFollowed = 0; !names.empty() && !way.endsAtMount && linksFollowed <= mostLinks;) {
+    for (int linksFollowed = 0; !names.empty() && linksFollowed <= mostLinks;) {
         const std::string next = std::move(names.front());
         names.pop_front();
         if (next == "..")
@@ -61,20 +66,26 @@ void ServedWays::goOn(Way& way, std::string name) const {
         if (next == "." || next == "..")
             continue;
         std::string child = path::appending(way.path, next);
-        way.endsAtMount = served_->contains(child);
-        const auto target = way.endsAtMount ? std::nullopt : targetOfLink(child);
+        const bool mayBeRead = way.mountPoints.empty() && !served_->contains(child);
+        const auto target = mayBeRead ? targetOfLink(child) : std::nullopt;
         if (!target) {
-            way.path = std::move(child);
+            enter(way, std::move(child));
             continue;
         }
         ++linksFollowed;
         std::vector<std::string> inside = path::components(*target);
         if (!inside.empty() && inside.front() == "/") {
-            way = begin();
+            way.path = "/";
             inside.erase(inside.begin());
         }
         names.insert(names.begin(), inside.begin(), inside.end());
     }
+}
+
+void ServedWays::enter(Way& way, std::string child) const {
+    way.path = std::move(child);
+    if (served_->contains(way.path))
+        way.mountPoints.push_back(way.path);
 }
 
 // A scan goes through one folder after another, so starting over costs it little.

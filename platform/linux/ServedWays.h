@@ -1,13 +1,12 @@
-// Which network or FUSE mount a path leads to, found out without a look at anything that lies on one: links
-// on the way are followed, and the first such mount ends it.
+// Which network and FUSE mounts a path leads through, found out without a look at anything that lies on one.
+// Links are followed as far as the first such mount; what lies below it is told by the path alone.
 //
-// Remembers the folders it has followed, so it is thrown away before they may lead elsewhere. Not
-// thread-safe.
+// Remembers the folders it has followed, so one that changes counts once this is made anew. Not thread-safe.
 #pragma once
 
-#include <optional>
 #include <string>
 #include <unordered_map>
+#include <vector>
 
 #include "platform/linux/MountTable.h"
 
@@ -17,18 +16,19 @@ class ServedWays {
   public:
     explicit ServedWays(MountTable::MountPoints served) : served_(std::move(served)) {}
 
-    // nil where nothing that is looked at on the way lies on one.
-    std::optional<std::string> mountPointOnTheWayTo(const std::string& path);
+    // Their mount points, in the order in which they are entered.
+    std::vector<std::string> mountPointsOnTheWayTo(const std::string& path);
 
   private:
     struct Way {
-        std::string path;  // without links
-        bool endsAtMount = false;
+        std::string path;  // without links, up to the first mount
+        std::vector<std::string> mountPoints;
     };
 
     Way wayTo(const std::string& path);
-    Way begin() const { return {"/", served_->contains("/")}; }
+    Way begin() const;
     void goOn(Way& way, std::string name) const;
+    void enter(Way& way, std::string child) const;
     void keep(const std::string& folder, const Way& way);
 
     const MountTable::MountPoints served_;

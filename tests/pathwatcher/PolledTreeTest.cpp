@@ -21,12 +21,15 @@ namespace {
 
 class PolledTreeTest : public testing::Test {
   protected:
-    PolledTree polled(PolledPlace::Depth depth = PolledPlace::Depth::tree) {
+    PolledPlace place(PolledPlace::Depth depth = PolledPlace::Depth::tree) const {
         PolledPlace place;
         place.path = folder_.path("place");
         place.depth = depth;
         place.reportedPath = "/Movies";
-        return PolledTree(place);
+        return place;
+    }
+    PolledTree polled(PolledPlace::Depth depth = PolledPlace::Depth::tree) const {
+        return PolledTree(place(depth));
     }
     // The folder is called /Movies in reports.
     std::vector<std::string> changes(PolledTree& tree) { return tree.look(stopped_); }
@@ -45,6 +48,21 @@ TEST_F(PolledTreeTest, TheFirstLookReportsThePlaceAndTheNextNothing) {
     write("a/b/c");
     PolledTree tree = polled();
     EXPECT_THAT(changes(tree), ElementsAre("/Movies"));
+    EXPECT_THAT(changes(tree), ElementsAre());
+}
+
+TEST_F(PolledTreeTest, APlaceThatWasAwayIsReportedThoughNothingInItChanged) {
+    using namespace std::chrono_literals;
+    write("file");
+    std::chrono::steady_clock::time_point now;
+    auto away = 0s;
+    PolledTree tree(place(), [&] { return now += away; });
+    changes(tree);
+    away = 9s;
+    EXPECT_THAT(changes(tree), ElementsAre());
+    away = 10s;
+    EXPECT_THAT(changes(tree), ElementsAre("/Movies"));
+    away = 0s;
     EXPECT_THAT(changes(tree), ElementsAre());
 }
 

@@ -2,7 +2,6 @@
 #include <gmock/gmock.h>
 
 #include <chrono>
-#include <thread>
 
 #include "platform/linux/LinuxFileManager.h"
 #include "platform/linux/MountReach.h"
@@ -14,9 +13,11 @@
 
 using namespace platform;
 using namespace std::chrono_literals;
+using testing::AllOf;
 using testing::Each;
 using testing::ElementsAre;
 using testing::IsEmpty;
+using testing::SizeIs;
 using testing_support::DeadMount;
 using testing_support::FakeMountTable;
 using testing_support::ScopedMount;
@@ -39,8 +40,8 @@ class ServedWaysTest : public testing::Test {
   protected:
     ServedWaysTest() { served_ = theseAlone({folder_.makeFolder("served"), folder_.path("a/served")}); }
 
-    std::optional<std::string> mountPointOnTheWayTo(std::string_view relative) {
-        return ServedWays(served_).mountPointOnTheWayTo(folder_.path(relative));
+    std::vector<std::string> mountPointsOnTheWayTo(std::string_view relative) {
+        return ServedWays(served_).mountPointsOnTheWayTo(folder_.path(relative));
     }
 
     const TemporaryFolder folder_;
@@ -66,17 +67,19 @@ class DeadServerReach : public testing::Test {
 
 }  // namespace
 
-TEST_F(ServedWaysTest, EndAtTheFirstServedMount) {
-    EXPECT_EQ(mountPointOnTheWayTo("served"), served);
-    EXPECT_EQ(mountPointOnTheWayTo("served/a/b"), served);
-    EXPECT_EQ(mountPointOnTheWayTo("a/served/b"), folder_.path("a/served"));
+TEST_F(ServedWaysTest, TellWhichMountsAPathLeadsThrough) {
+    for (const char* const path : {"served", "served/", "served/a/b", "served/../a", "a/../served"})
+        EXPECT_THAT(mountPointsOnTheWayTo(path), ElementsAre(served)) << path;
+    EXPECT_THAT(mountPointsOnTheWayTo("a/served/b"), ElementsAre(folder_.path("a/served")));
+    for (const char* const path : {"", "a", "served2", "a/b/served", "missing/x", "\xFF"})
+        EXPECT_THAT(mountPointsOnTheWayTo(path), IsEmpty()) << path;
 }
 
-TEST_F(ServedWaysTest, LeadElsewhereAsWell) {
-    for (const char* const path : {"a", "served2", "a/b/served", "missing/x", "served/../x", "served/.."})
-        EXPECT_EQ(mountPointOnTheWayTo(path),
-                  std::string_view(path).starts_with("served/") ? std::optional(served) : std::nullopt)
-            << path;
+TEST_F(ServedWaysTest, TellEachMountOnTheWay) {
+    served_ = theseAlone({served, served + "/a/inner"});
+    EXPECT_THAT(mountPointsOnTheWayTo("served/a/inner/b"), ElementsAre(served, served + "/a/inner"));
+    served_ = theseAlone({"/", served});
+    EXPECT_THAT(mountPointsOnTheWayTo("served/b"), ElementsAre("/", served));
 }
 
 TEST_F(ServedWaysTest, FollowLinks) {
@@ -87,9 +90,9 @@ TEST_F(ServedWaysTest, FollowLinks) {
     folder_.makeLink("chain", "folder/up/.");
     folder_.makeLink("away", "/");
     for (const char* const path : {"absolute", "relative/a", "folder/up", "folder/up/b", "below", "chain"})
-        EXPECT_EQ(mountPointOnTheWayTo(path), served) << path;
-    EXPECT_EQ(mountPointOnTheWayTo("away/usr"), std::nullopt);
-    EXPECT_EQ(mountPointOnTheWayTo("away" + served), served);
+        EXPECT_THAT(mountPointsOnTheWayTo(path), ElementsAre(served)) << path;
+    EXPECT_THAT(mountPointsOnTheWayTo("away/usr"), IsEmpty());
+    EXPECT_THAT(mountPointsOnTheWayTo("away" + served), ElementsAre(served));
 }
 
 TEST_F(ServedWaysTest, ThatLeadNowhereEnd) {
@@ -97,29 +100,23 @@ TEST_F(ServedWaysTest, ThatLeadNowhereEnd) {
     folder_.makeLink("circle of two/a", "b");
     folder_.makeLink("circle of two/b", "a/x");
     for (const char* const path : {"circle", "circle/a", "circle of two/a", "circle of two/b/c"})
-        EXPECT_EQ(mountPointOnTheWayTo(path), std::nullopt) << path;
+        EXPECT_THAT(mountPointsOnTheWayTo(path), IsEmpty()) << path;
     std::string deep;
     while (deep.size() < 10'000)
         deep += "deep/";
-    EXPECT_EQ(mountPointOnTheWayTo(deep), std::nullopt);
+    EXPECT_THAT(mountPointsOnTheWayTo("served/" + deep), IsEmpty());
     for (const char* const odd : {"", "relative/path", "."})
-        EXPECT_EQ(ServedWays(theseAlone({"/"})).mountPointOnTheWayTo(odd), std::nullopt) << odd;
-}
-
-TEST_F(ServedWaysTest, BeginAtARootThatMayBeServed) {
-    ServedWays ways(theseAlone({"/"}));
-    for (const char* const path : {"/", "/a", "/a/b"})
-        EXPECT_EQ(ways.mountPointOnTheWayTo(path), "/") << path;
+        EXPECT_THAT(ServedWays(theseAlone({"/"})).mountPointsOnTheWayTo(odd), IsEmpty()) << odd;
 }
 
 TEST_F(ServedWaysTest, AreTheSameTheSecondTimeAndAfterManyOthers) {
     folder_.makeLink("link", "served");
     ServedWays ways(served_);
     for (int round = 0; round < 2; ++round) {
-        EXPECT_EQ(ways.mountPointOnTheWayTo(folder_.path("link/a/b")), served);
-        EXPECT_EQ(ways.mountPointOnTheWayTo(folder_.path("a/b/c")), std::nullopt);
+        EXPECT_THAT(ways.mountPointsOnTheWayTo(folder_.path("link/a/b")), ElementsAre(served));
+        EXPECT_THAT(ways.mountPointsOnTheWayTo(folder_.path("a/b/c")), IsEmpty());
         for (int i = 0; i < 3000; ++i)
-            ASSERT_EQ(ways.mountPointOnTheWayTo(folder_.path(std::to_string(i) + "/x")), std::nullopt);
+            ASSERT_THAT(ways.mountPointsOnTheWayTo(folder_.path(std::to_string(i) + "/x")), IsEmpty());
     }
 }
 
@@ -146,19 +143,45 @@ TEST_F(DeadServerReach, WhatLiesOnTheMountIsOutOfReachAndTheRestIsNot) {
     mount_->awaitRequest();
 }
 
-TEST_F(DeadServerReach, AServerThatAnswersAfterAllIsInReach) {
+TEST_F(DeadServerReach, IsInReachWhenItAnswersAfterAll) {
     const MountReach reach(table_, log_, nextToNone);
     EXPECT_FALSE(reach.isInReach(gone_));
-    mount_.reset();  // ends all waiting with an error
+    mount_.reset();  // the folder answers in its stead
     const auto deadline = std::chrono::steady_clock::now() + 60s;
-    while (!reach.isInReach(gone_) && std::chrono::steady_clock::now() < deadline)
-        std::this_thread::yield();
-    EXPECT_TRUE(reach.isInReach(gone_));
+    bool isInReach = false;
+    while (!isInReach && std::chrono::steady_clock::now() < deadline)
+        isInReach = reach.isInReach(gone_);
+    EXPECT_TRUE(isInReach);
+}
+
+TEST_F(DeadServerReach, IsAskedOnceForAll) {
+    const MountReach reach(table_, log_, nextToNone);
+    for (int i = 0; i < 20; ++i)
+        EXPECT_FALSE(reach.isInReach(gone_));
+    mount_->takeRequest();
+    EXPECT_FALSE(reach.isInReach(gone_));
+    EXPECT_FALSE(mount_->hasRequest());
+}
+
+TEST_F(DeadServerReach, AnotherMountThatAppearsDoesNotHaveItAskedAgain) {
+    const MountReach reach(table_, log_, nextToNone, /*freshness=*/0ms);
+    EXPECT_FALSE(reach.isInReach(gone_));
+    mount_->takeRequest();
+    table_.served = theseAlone({gone_, "/elsewhere"});
+    EXPECT_FALSE(reach.isInReach(gone_));
+    EXPECT_FALSE(mount_->hasRequest());
+}
+
+TEST_F(DeadServerReach, HidesWhatIsMountedBelowOneThatAnswers) {
+    table_.served = theseAlone({folder_.path(), gone_});
+    const MountReach reach(table_, log_, /*patience=*/3s);
+    EXPECT_FALSE(reach.isInReach(gone_ + "/a"));
+    EXPECT_THAT(log_.lines(), ElementsAre(lineAbout(gone_)));
 }
 
 TEST_F(DeadServerReach, NoOperationOnFilesWaitsForIt) {
     const LinuxFileManager files(
-        std::nullopt, table_, log_, [](std::string_view) { return false; }, "/Volumes", nextToNone);
+        std::nullopt, table_, log_, [](std::string_view) { return false; }, folder_.path(), nextToNone);
     const std::string item = gone_ + "/item";
     EXPECT_EQ(files.kindOfItemAtPath(item), std::nullopt);
     EXPECT_EQ(files.contentsOfDirectoryAtPath(gone_), std::nullopt);
@@ -169,8 +192,24 @@ TEST_F(DeadServerReach, NoOperationOnFilesWaitsForIt) {
     EXPECT_LT(files.extendedAttribute(item, "date", {}), 0);
     EXPECT_EQ(files.fileSystemTypeNameAtPath(gone_), std::nullopt);
     EXPECT_EQ(files.openFileAtPath(item), nullptr);
-    EXPECT_THAT(log_.lines(), Each(lineAbout(gone_)));
+    EXPECT_FALSE(files.isInReach(item));
+    EXPECT_THAT(log_.lines(), AllOf(SizeIs(10), Each(lineAbout(gone_))));
+    EXPECT_EQ(files.resolvedPath(item), item);  // a volume by its place
     EXPECT_EQ(files.kindOfItemAtPath(folder_.path()), FileKind::directory);
+}
+
+TEST_F(DeadServerReach, ALinkThatLeadsThereHoldsUpNoFolder) {
+    folder_.makeLink("event/clip.mov", gone_ + "/clip.mov");
+    const LinuxFileManager files(
+        std::nullopt, table_, log_, [](std::string_view) { return false; }, "/Volumes", nextToNone);
+    const auto folder = files.openFolderAtPath(folder_.path("event"));
+    ASSERT_TRUE(folder);
+    ASSERT_THAT(folder->items(), SizeIs(1));
+    const FolderItem& link = folder->items().front();
+    EXPECT_EQ(folder->flagsOf(link), 0u);
+    EXPECT_FALSE(folder->isPlainFile(link));
+    EXPECT_EQ(folder->attributesOf(link), std::nullopt);
+    EXPECT_EQ(folder->extendedAttributeOf(link, "date", {}), std::nullopt);
 }
 
 TEST_F(DeadServerReach, TheKernelsTableNamesIt) {

@@ -16,6 +16,8 @@
 
 namespace testing_support {
 
+using namespace std::chrono_literals;
+
 namespace {
 
 using Request = std::array<char, FUSE_MIN_READ_BUFFER>;
@@ -66,11 +68,24 @@ void DeadMount::greet() const {
         throw std::runtime_error(std::string("cannot greet the kernel: ") + std::strerror(errno));
 }
 
-// What the server has read not even the end of a process gets out of.
+void DeadMount::takeRequest() const {
+    awaitRequest();
+    Request request{};
+    readRequest(server_.number(), request);
+}
+
+bool DeadMount::hasRequest() const {
+    return isAsked(0ms);
+}
+
 void DeadMount::awaitRequest() const {
-    pollfd request{server_.number(), POLLIN, 0};
-    if (poll(&request, 1, /*milliseconds*/ 60'000) != 1)
+    if (!isAsked(1min))
         throw std::runtime_error("nobody asks the server");
+}
+
+bool DeadMount::isAsked(std::chrono::milliseconds wait) const {
+    pollfd request{server_.number(), POLLIN, 0};
+    return poll(&request, 1, static_cast<int>(wait.count())) == 1;
 }
 
 }  // namespace testing_support

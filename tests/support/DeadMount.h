@@ -1,6 +1,7 @@
 // A mount whose server never answers: whoever looks at it waits until the mount goes.
 #pragma once
 
+#include <chrono>
 #include <optional>
 #include <string>
 
@@ -20,11 +21,17 @@ class DeadMount {
     DeadMount(const DeadMount&) = delete;
     DeadMount& operator=(const DeadMount&) = delete;
 
+    // Whether somebody waits for the server, but for those whose requests were taken.
+    bool hasRequest() const;
     // Waits until somebody waits for the server, and raises std::runtime_error when nobody does for a minute.
     void awaitRequest() const;
+    // Waits for a request as well, and takes it without ever answering, as a server does that waits for
+    // another machine. The kernel lets nobody go who waits for that, not even when it is killed.
+    void takeRequest() const;
 
   private:
     void greet() const;
+    bool isAsked(std::chrono::milliseconds wait) const;
 
     const std::string mountPoint_;
     platform::FileDescriptor server_;
