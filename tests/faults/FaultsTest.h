@@ -55,12 +55,36 @@ class FaultsTest : public PluginTest {
             EXPECT_TRUE(whole.contains(entry) || standsForPartOf(entry, whole)) << "made up: " << entry;
     }
 
+    // Of several things that go wrong, each does at each index. With a sanitizer, which takes its time, each
+    // of them does at some indexes, and at each index one of them.
+    static std::size_t firstIndex(std::size_t number) { return VEXO_SANITIZED ? number : 0; }
+    static std::size_t indexStep(std::size_t count) { return VEXO_SANITIZED ? count : 1; }
+
   private:
     // Whether it is the next best movie of a project: one that stands for the project in the place of
     // another.
     static bool standsForPartOf(const TreeEntry& entry, const TreeEntries& whole) {
         return std::ranges::any_of(whole, [&](const TreeEntry& known) { return known.item == entry.item; });
     }
+};
+
+// What is read while something goes wrong.
+enum class Reading { load, reload };
+
+// Of either reading, of a library with no fault of its own.
+class ReadingFaultsTest : public FaultsTest, public testing::WithParamInterface<Reading> {
+  protected:
+    ReadingFaultsTest() : FaultsTest(Documents::allWell) {}
+
+    // A load begins from nothing.
+    void begin() {
+        if (GetParam() == Reading::load) {
+            dropPlugin();
+            clearProcessCaches();
+        }
+        plugin();
+    }
+    TreeEntries nextTree() { return GetParam() == Reading::load ? loadTree() : reloadTree(); }
 };
 
 }  // namespace testing_support

@@ -13,6 +13,7 @@ struct BundleParts {
     std::string principalClass = "FaultyPlugin";
     std::string module = FAULTY_PLUGIN_MODULE;  // linked to; empty for none
     std::string strings = "[Strings]\nName=Faulty\n";
+    int interfaceVersion = 1;
 };
 
 // Makes `name` in the folder, in place of what was there, and answers its path.
@@ -23,8 +24,8 @@ inline std::string makeBundle(const TemporaryFolder& folder, const std::string& 
                      "<plist version=\"1.0\"><dict><key>CFBundleIdentifier</key><string>" + parts.identifier +
                          "</string><key>CFBundleExecutable</key><string>Module.so</string>"
                          "<key>NSPrincipalClass</key><string>" +
-                         parts.principalClass +
-                         "</string><key>VXHostInterfaceVersion</key><integer>1</integer></dict></plist>");
+                         parts.principalClass + "</string><key>VXHostInterfaceVersion</key><integer>" +
+                         std::to_string(parts.interfaceVersion) + "</integer></dict></plist>");
     folder.writeFile(name + "/Contents/Resources/Strings.ini", parts.strings);
     if (!parts.module.empty())
         folder.makeLink(name + "/Contents/Linux/Module.so", parts.module);

@@ -1,4 +1,5 @@
 // A host beside whose plug-in others are broken: it says what is wrong and goes on with the healthy one.
+#include <elf.h>
 #include <gmock/gmock.h>
 
 #include <chrono>
@@ -36,6 +37,11 @@ class FaultyPluginTest : public testing::Test {
     void makeBundle(const BundleParts& parts) const {
         testing_support::makeBundle(home, "plugins/Faulty.vxplugin", parts);
     }
+    std::string moduleForAnotherMachine() const {
+        std::string module = testing_support::contentOf(FAULTY_PLUGIN_MODULE);
+        module[offsetof(Elf64_Ehdr, e_machine)] ^= 3;  // at the same place in modules of 32 bits
+        return home.writeFile("other.so", module);
+    }
     // What the host warns of while it finds the plug-ins, with the healthy one at hand.
     std::vector<std::string> warningsOfFinding() {
         findPlugins();
@@ -70,6 +76,8 @@ TEST_F(FaultyPluginTest, BundlesWithoutAPieceAreLeftOut) {
         {{.module = "/etc/passwd"}, "' cannot be loaded: it is no module"},
         {{.module = home.makeFifo("pipe")}, "' cannot be loaded: it cannot be read"},
         {{.module = EMPTY_MODULE}, "' is no plug-in's: it exports no VXPluginPrincipalClass"},
+        {{.module = moduleForAnotherMachine()},
+         "' cannot be loaded: it was built for another kind of machine"},
         {{.module = UNRESOLVED_MODULE}, "aFunctionThatNoLibraryHas"},
         {{.principalClass = "Nobody"}, "' has no principal class named 'Nobody'"},
     };
@@ -81,6 +89,12 @@ TEST_F(FaultyPluginTest, BundlesWithoutAPieceAreLeftOut) {
                     ElementsAre(AllOf(StartsWith("the code of '" + bundle), HasSubstr(warning))));
         host.reset();
     }
+}
+
+TEST_F(FaultyPluginTest, OneForAnotherInterfaceIsLeftOut) {
+    makeBundle({.interfaceVersion = 99});
+    EXPECT_THAT(warningsOfFinding(),
+                ElementsAre(AllOf(HasSubstr(faulty), HasSubstr("built for version 99"))));
 }
 
 TEST_F(FaultyPluginTest, OneThatDoesNotWantToBeIsLeftOut) {

@@ -9,6 +9,7 @@
 #include <thread>
 
 #include "framework/metadata/MetadataStore.h"
+#include "tests/support/HostEnvironment.h"
 #include "tests/support/SampleMovie.h"
 #include "tests/support/TemporaryFolder.h"
 
@@ -73,6 +74,7 @@ TEST_F(HostTest, AHostThatDoesNotStayReadsNoClip) {
         host.startLoading();
         ASSERT_TRUE(host.waitUntilLoaded(60s));
     }
+    const HostEnvironment afterwards;
     EXPECT_FALSE(isIndexed());
 }
 
@@ -91,6 +93,7 @@ TEST_F(HostTest, QuittingDoesNotWaitForAMovieThatIsRead) {
         waitUntil([&] { return std::filesystem::exists(started); });
     }
     asking.join();
+    const HostEnvironment afterwards;
     EXPECT_FALSE(isIndexed());
 }
 

@@ -12,6 +12,7 @@
 #include <thread>
 
 #include "platform/linux/FileDescriptor.h"
+#include "tests/support/HostEnvironment.h"
 #include "tests/support/SampleMovie.h"
 #include "tests/support/TemporaryFolder.h"
 
@@ -98,10 +99,18 @@ class MetadataOfFiles : public testing::Test {
         return store_.propertiesForFile(path)->valueForKey(key);
     }
 
-    TemporaryFolder folder_;
+    const HostEnvironment environment_;
+    const TemporaryFolder& folder_ = environment_.home;
     const std::string index_ = folder_.path("cache/metadata.sqlite");
     const std::shared_ptr<ScriptedReader> reader_ = std::make_shared<ScriptedReader>();
     MetadataStore store_{index_, reader_};
+};
+
+class SupportedMovieFile : public testing::Test {
+  protected:
+    const HostEnvironment environment;
+    const TemporaryFolder& folder = environment.home;
+    const MetadataStore store{std::nullopt, nullptr};
 };
 
 }  // namespace
@@ -365,9 +374,7 @@ TEST_F(MetadataOfFiles, AreThoseOfTheRealMovie) {
     EXPECT_EQ(properties->valueForKey(kMDItemDurationSeconds), Value(2.0));
 }
 
-TEST(SupportedMovieFile, IsAPlainFileOfAMovieType) {
-    const MetadataStore store(std::nullopt, nullptr);
-    const TemporaryFolder folder;
+TEST_F(SupportedMovieFile, IsAPlainFileOfAMovieType) {
     EXPECT_TRUE(store.supportedMovieFile(folder.writeFile("a.mov")));
     EXPECT_TRUE(store.supportedMovieFile(folder.writeFile("A.M4V", "no movie at all")));
     EXPECT_TRUE(store.supportedMovieFile(folder.makeLink("link.mp4", folder.path("a.mov"))));
@@ -380,9 +387,7 @@ TEST(SupportedMovieFile, IsAPlainFileOfAMovieType) {
     EXPECT_FALSE(store.supportedMovieFile(folder.writeFile(".mov")));
 }
 
-TEST(SupportedMovieFile, IsTheSameOfWhatIsKnownToBeAPlainFile) {
-    const MetadataStore store(std::nullopt, nullptr);
-    const TemporaryFolder folder;
+TEST_F(SupportedMovieFile, IsTheSameOfWhatIsKnownToBeAPlainFile) {
     for (const char* name :
          {"a.mov", "A.M4V", "sound.m4a", "picture.jpg", "mov", ".mov", "project.qnproject"}) {
         const std::string file = folder.writeFile(name);
@@ -392,9 +397,7 @@ TEST(SupportedMovieFile, IsTheSameOfWhatIsKnownToBeAPlainFile) {
     EXPECT_FALSE(store.supportedPlainFile(folder.writeFile("sound", soundContent)));
 }
 
-TEST(SupportedMovieFile, IsToldByTheContentWhereTheNameTellsNoType) {
-    const MetadataStore store(std::nullopt, nullptr);
-    const TemporaryFolder folder;
+TEST_F(SupportedMovieFile, IsToldByTheContentWhereTheNameTellsNoType) {
     EXPECT_TRUE(store.supportedMovieFile(folder.writeFile("movie", movieContent)));
     EXPECT_TRUE(store.supportedMovieFile(folder.writeFile("movie.xyz", movieContent)));
     EXPECT_TRUE(store.supportedMovieFile(folder.makeLink("link", folder.path("movie"))));

@@ -15,6 +15,7 @@
 #include "framework/metadata/MetadataStore.h"
 #include "tests/framework/FFprobe.h"
 #include "tests/support/FileContent.h"
+#include "tests/support/HostEnvironment.h"
 #include "tests/support/Program.h"
 #include "tests/support/SampleMovie.h"
 #include "tests/support/TemporaryFolder.h"
@@ -259,7 +260,8 @@ class MovieSamples : public testing::Test {
     // The sample under a name that does not tell its type.
     std::string withoutExtension(const char* name) const { return folder_.makeLink("untold", sample(name)); }
 
-    const TemporaryFolder folder_;
+    const HostEnvironment environment_;
+    const TemporaryFolder& folder_ = environment_.home;
     const MetadataStore& store_ = *sharedStore;
 
   private:

@@ -37,12 +37,21 @@ bool isControl(char byte) {
     return 0 <= byte && byte < 0x20 && byte != '\n';
 }
 
+// What else a terminal obeys or shows in another order: DEL, the C1 controls, and the marks and overrides of
+// direction.
+void expectNothingForATerminal(const std::string& text) {
+    for (const char* const sign :
+         {"\x7F", "\xC2\x80", "\xC2\x9B", "\xE2\x80\x8F", "\xE2\x80\xAA", "\xE2\x80\xAE", "\xE2\x81\xA6"})
+        EXPECT_EQ(text.find(sign), text.npos) << text;
+}
+
 void expectOneRowForEachItem(Host& host) {
     std::ostringstream out;
     ASSERT_TRUE(runTree(host, {}, out).empty());
     const std::string text = out.str();
     EXPECT_TRUE(platform::isValidUTF8(text));
     EXPECT_EQ(std::count_if(text.begin(), text.end(), isControl), 0) << text;
+    expectNothingForATerminal(text);
     const bool hasMessageBelow = rootOf(host)->childGroups().empty();
     if (!hasMessageBelow) {
         EXPECT_EQ(std::size_t(std::count(text.begin(), text.end(), '\n')), rowsOf(rootOf(host))) << text;

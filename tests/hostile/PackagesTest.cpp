@@ -26,6 +26,14 @@ TEST_F(HostileLibraryTest, PackagesWithinPackagesAreNotEntered) {
     EXPECT_THAT(library.movies, ElementsAre("Outer.qnproject/Movies/movie.mov"));
 }
 
+TEST_F(HostileLibraryTest, AFolderNamedLikeAMovieHoldsProjects) {
+    makeProject("Folder.mov/P.qnproject");
+    makeProject("Folder.mov/Deeper.m4v/Q.qnproject");
+    const FoundLibrary library = load();
+    EXPECT_THAT(library.projects, ElementsAre("Folder.mov/Deeper.m4v/Q.qnproject", "Folder.mov/P.qnproject"));
+    EXPECT_THAT(library.warnings, IsEmpty());
+}
+
 // By its name it is a movie of the project; it has no size, so it never stands for the project.
 TEST_F(HostileLibraryTest, AFolderNamedLikeAMovieStandsForNoProject) {
     home_.makeFolder(project("P.qnproject/Movies/folder.mov/deeper.mov"));

@@ -47,7 +47,7 @@ void Soak::run() {
     do {
         runSession();
         printProgress();
-    } while (!isOver());
+    } while (!isOver() || sessions_ < 2);  // the second is compared with the first
 }
 
 void Soak::runSession() {
