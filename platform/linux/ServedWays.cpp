@@ -3,7 +3,6 @@
 #include <unistd.h>
 
 #include <climits>
-#include <deque>
 #include <optional>
 
 #include "platform/Path.h"
@@ -28,25 +27,27 @@ std::optional<std::string> targetOfLink(const std::string& path) {
 std::vector<std::string> ServedWays::mountPointsOnTheWayTo(const std::string& path) {
     if (served_->empty() || !path.starts_with('/') || path.size() >= PATH_MAX)
         return {};
-    return wayTo(path).mountPoints;
+    const bool isRoot = path.find_first_not_of('/') == path.npos;
+    return (isRoot ? begin() : wayTo(path)).mountPoints;
 }
 
 // From the nearest folder that was followed before.
 ServedWays::Way ServedWays::wayTo(const std::string& path) {
     std::vector<std::string> names;
     std::string folder = path;
-    while (folder != "/" && !ways_.contains(folder)) {
+    do {
         names.push_back(path::lastComponent(folder));
         folder = path::withoutLastComponent(folder);
-    }
+    } while (folder != "/" && !ways_.contains(folder));
     Way way = folder == "/" ? begin() : ways_.at(folder);
-    for (; !names.empty(); names.pop_back()) {
-        if (folder != "/")
-            keep(folder, way);
+    for (;;) {
         goOn(way, names.back());
+        if (names.size() == 1)
+            return way;
         folder = path::appending(folder, names.back());
+        keep(folder, way);
+        names.pop_back();
     }
-    return way;
 }
 
 ServedWays::Way ServedWays::begin() const {
@@ -56,11 +57,11 @@ ServedWays::Way ServedWays::begin() const {
 }
 
 // Behind a link that leads in a circle the kernel goes no further either.
-void ServedWays::goOn(Way& way, std::string name) const {
-    std::deque<std::string> names{std::move(name)};
+void ServedWays::goOn(Way& way, const std::string& name) const {
+    std::vector<std::string> names{name};  // the next is the last
     for (int linksFollowed = 0; !names.empty() && linksFollowed <= mostLinks;) {
-        const std::string next = std::move(names.front());
-        names.pop_front();
+        const std::string next = std::move(names.back());
+        names.pop_back();
         if (next == "..")
             way.path = path::withoutLastComponent(way.path);
         if (next == "." || next == "..")
@@ -78,7 +79,7 @@ void ServedWays::goOn(Way& way, std::string name) const {
             way.path = "/";
             inside.erase(inside.begin());
         }
-        names.insert(names.begin(), inside.begin(), inside.end());
+        names.insert(names.end(), inside.rbegin(), inside.rend());
     }
 }
 

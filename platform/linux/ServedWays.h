@@ -25,9 +25,10 @@ class ServedWays {
         std::vector<std::string> mountPoints;
     };
 
+    // Not of the root.
     Way wayTo(const std::string& path);
     Way begin() const;
-    void goOn(Way& way, std::string name) const;
+    void goOn(Way& way, const std::string& name) const;
     void enter(Way& way, std::string child) const;
     void keep(const std::string& folder, const Way& way);
 

@@ -82,6 +82,13 @@ TEST_F(ServedWaysTest, TellEachMountOnTheWay) {
     EXPECT_THAT(mountPointsOnTheWayTo("served/b"), ElementsAre("/", served));
 }
 
+TEST_F(ServedWaysTest, BeginAtTheRoot) {
+    for (const char* const path : {"/", "//", "/a", "//a//b/"}) {
+        EXPECT_THAT(ServedWays(theseAlone({"/"})).mountPointsOnTheWayTo(path), ElementsAre("/")) << path;
+        EXPECT_THAT(ServedWays(served_).mountPointsOnTheWayTo(path), IsEmpty()) << path;
+    }
+}
+
 TEST_F(ServedWaysTest, FollowLinks) {
     folder_.makeLink("absolute", served);
     folder_.makeLink("relative", "served");
