@@ -8,6 +8,7 @@
 #include "platform/Path.h"
 #include "platform/PropertyList.h"
 #include "platform/Services.h"
+#include "platform/linux/Uninterrupted.h"
 
 namespace vexo {
 namespace {
@@ -47,7 +48,8 @@ std::string problemOf(const platform::Dictionary& descriptor) {
 
 bool writableByOthers(const std::string& file) {
     struct stat status;
-    return stat(file.c_str(), &status) == 0 && (status.st_mode & S_IWOTH) != 0;
+    return platform::uninterrupted([&] { return stat(file.c_str(), &status); }) == 0 &&
+           (status.st_mode & S_IWOTH) != 0;
 }
 
 platform::PropertyListResult readDescriptor(const std::string& file) {

@@ -9,6 +9,7 @@
 #include "framework/metadata/FrameMemory.h"
 #include "framework/metadata/ReaderHelper.h"
 #include "framework/metadata/ReaderProcess.h"
+#include "platform/linux/Uninterrupted.h"
 
 namespace vexo {
 
@@ -20,7 +21,7 @@ constexpr std::uint64_t readLimit = 256u << 20;
 // nil for what is no plain file.
 std::optional<ReaderRequest> requestAbout(int descriptor) {
     struct stat status;
-    if (fstat(descriptor, &status) != 0 || !S_ISREG(status.st_mode))
+    if (platform::uninterrupted([&] { return fstat(descriptor, &status); }) != 0 || !S_ISREG(status.st_mode))
         return std::nullopt;
     return ReaderRequest{.fileSize = static_cast<std::uint64_t>(status.st_size), .readLimit = readLimit};
 }

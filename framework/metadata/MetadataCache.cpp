@@ -7,10 +7,13 @@
 #include <system_error>
 
 #include "platform/linux/FileDescriptor.h"
+#include "platform/linux/Uninterrupted.h"
 
 namespace vexo {
 
 namespace {
+
+using platform::uninterrupted;
 
 // The key of a file that can be read, or why it can't be.
 using FileLook = std::variant<FileKey, MediaFailure>;
@@ -45,12 +48,14 @@ FileLook lookOf(const struct stat& status) {
 
 FileLook lookAt(const std::string& path) {
     struct stat status;
-    return stat(path.c_str(), &status) == 0 ? lookOf(status) : systemFailure(errno);
+    const int result = uninterrupted([&] { return stat(path.c_str(), &status); });
+    return result == 0 ? lookOf(status) : systemFailure(errno);
 }
 
 FileLook lookAt(int descriptor) {
     struct stat status;
-    return fstat(descriptor, &status) == 0 ? lookOf(status) : systemFailure(errno);
+    const int result = uninterrupted([&] { return fstat(descriptor, &status); });
+    return result == 0 ? lookOf(status) : systemFailure(errno);
 }
 
 }  // namespace
@@ -72,7 +77,8 @@ MediaReaderAnswer MetadataCache::answerForFile(const std::string& path) {
 
     // What lies at the path now may be another thing than what was just looked at: the flags keep a FIFO or a
     // terminal from doing harm, and what was opened is looked at anew.
-    const platform::FileDescriptor file(open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
+    const platform::FileDescriptor file(
+        uninterrupted([&] { return open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC); }));
     if (!file)
         return systemFailure(errno);
     return read(file.number());

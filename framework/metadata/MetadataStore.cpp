@@ -15,6 +15,7 @@
 #include "platform/FileManager.h"
 #include "platform/Path.h"
 #include "platform/Services.h"
+#include "platform/linux/Uninterrupted.h"
 
 namespace vexo {
 
@@ -50,9 +51,10 @@ std::optional<FoundFile> foundFile(const std::string& path) {
         return std::nullopt;
     }
     FoundFile file{path, std::move(*real), {}};
-    if (statx(AT_FDCWD, file.realPath.c_str(), 0, STATX_BASIC_STATS | STATX_BTIME, &file.status) != 0)
-        return std::nullopt;
-    return file;
+    const int result = platform::uninterrupted([&file] {
+        return statx(AT_FDCWD, file.realPath.c_str(), 0, STATX_BASIC_STATS | STATX_BTIME, &file.status);
+    });
+    return result == 0 ? std::optional(std::move(file)) : std::nullopt;
 }
 
 bool isFolder(const FoundFile& file) {

@@ -6,6 +6,7 @@
 
 #include "framework/queries/ScopeWalk.h"
 #include "platform/Path.h"
+#include "platform/linux/Uninterrupted.h"
 
 namespace vexo {
 namespace {
@@ -140,7 +141,7 @@ void MetadataQuery::lookAt(const std::string& path, const platform::Date& now, R
 // nil for what is gone, and for links that lead nowhere.
 std::optional<MetadataQuery::FileState> MetadataQuery::stateOf(const std::string& path) {
     struct stat status;
-    if (stat(path.c_str(), &status) != 0)
+    if (platform::uninterrupted([&] { return stat(path.c_str(), &status); }) != 0)
         return std::nullopt;
     return FileState{status.st_dev, status.st_ino, status.st_size, status.st_mtim.tv_sec,
                      status.st_mtim.tv_nsec};

@@ -6,6 +6,7 @@
 #include "platform/Services.h"
 #include "platform/URL.h"
 #include "platform/linux/PlainFile.h"
+#include "platform/linux/Uninterrupted.h"
 
 namespace vexo {
 
@@ -19,14 +20,16 @@ ThumbnailSubject subjectOf(const std::string& path, const struct stat& status) {
 // nil for what has no content to show.
 std::optional<ThumbnailSubject> subjectAt(const std::string& path) {
     struct stat status;
-    if (stat(path.c_str(), &status) != 0 || !S_ISREG(status.st_mode) || status.st_size == 0)
+    if (platform::uninterrupted([&] { return stat(path.c_str(), &status); }) != 0 ||
+        !S_ISREG(status.st_mode) || status.st_size == 0)
         return std::nullopt;
     return subjectOf(path, status);
 }
 
 bool isStill(const ThumbnailSubject& subject, const platform::FileDescriptor& file) {
     struct stat status;
-    return fstat(file.number(), &status) == 0 && status.st_mtim.tv_sec == subject.modificationTime &&
+    const int result = platform::uninterrupted([&] { return fstat(file.number(), &status); });
+    return result == 0 && status.st_mtim.tv_sec == subject.modificationTime &&
            static_cast<std::uint64_t>(status.st_size) == subject.size;
 }
 
