@@ -40,14 +40,15 @@ unsigned Soak::nextSeed() {
 }
 
 bool Soak::isOver() const {
-    return loop_.isEnded() || std::chrono::steady_clock::now() - start_ >= options_.time;
+    const bool isCompared = sessions_ >= 2;  // memory with that after the first, often the tree as well
+    return loop_.isEnded() || (isCompared && std::chrono::steady_clock::now() - start_ >= options_.time);
 }
 
 void Soak::run() {
     do {
         runSession();
         printProgress();
-    } while (!isOver() || sessions_ < 2);  // the second is compared with the first
+    } while (!isOver());
 }
 
 void Soak::runSession() {
