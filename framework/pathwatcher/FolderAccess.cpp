@@ -3,13 +3,13 @@
 #include <dirent.h>
 #include <fcntl.h>
 #include <sys/stat.h>
-#include <unistd.h>
 
 #include <cerrno>
-#include <climits>
 #include <cstring>
 #include <memory>
+#include <utility>
 
+#include "platform/linux/FileStatus.h"
 #include "platform/linux/Uninterrupted.h"
 
 namespace vexo {
@@ -49,11 +49,10 @@ PathEntry DiskAccess::look(const std::string& path) const {
     PathEntry entry{kindOf(status.st_mode), "", status.st_dev, status.st_ino};
     if (entry.kind != PathEntry::Kind::link)
         return entry;
-    char target[PATH_MAX];
-    const ssize_t length = uninterrupted([&] { return readlink(path.c_str(), target, sizeof target); });
-    if (length < 0)
+    auto target = platform::targetOfLink(path);
+    if (!target)
         return missingForError(errno);
-    entry.target.assign(target, static_cast<std::size_t>(length));
+    entry.target = std::move(*target);
     return entry;
 }
 

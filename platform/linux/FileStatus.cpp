@@ -1,8 +1,10 @@
 #include "platform/linux/FileStatus.h"
 
 #include <fcntl.h>
+#include <unistd.h>
 
 #include <cerrno>
+#include <climits>
 
 #include "platform/Path.h"
 #include "platform/linux/Uninterrupted.h"
@@ -29,6 +31,14 @@ std::optional<struct statx> statusOfFile(int folder, const char* path, int flags
     if (result != 0)
         return std::nullopt;
     return status;
+}
+
+std::optional<std::string> targetOfLink(const std::string& path) {
+    char target[PATH_MAX];
+    const ssize_t length = uninterrupted([&] { return readlink(path.c_str(), target, sizeof target); });
+    if (length < 0)
+        return std::nullopt;
+    return std::string(target, static_cast<std::size_t>(length));
 }
 
 bool meansMissing(int error) {

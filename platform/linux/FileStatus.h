@@ -17,6 +17,9 @@ namespace platform {
 // kernel answers an error.
 std::optional<struct statx> statusOfFile(int folder, const char* path, int flags);
 
+// What a link holds; nil, and errno set, for what is no link or can't be read.
+std::optional<std::string> targetOfLink(const std::string& path);
+
 // Whether the error says that nothing is there.
 bool meansMissing(int error);
 

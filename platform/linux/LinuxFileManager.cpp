@@ -203,7 +203,9 @@ std::optional<std::string> LinuxFileManager::kernelPath(const std::string& path)
         return std::nullopt;
     while (real->size() > 1 && real->back() == '/')
         real->pop_back();
-    return reach_.isInReach(*real) ? real : std::nullopt;
+    if (!reach_.isInReach(*real))
+        return std::nullopt;
+    return real;
 }
 
 std::optional<std::string> LinuxFileManager::mountPointOfVolume(std::string_view displayName) const {

@@ -1,12 +1,10 @@
 #include "platform/linux/ServedWays.h"
 
-#include <unistd.h>
-
 #include <climits>
 #include <optional>
 
 #include "platform/Path.h"
-#include "platform/linux/Uninterrupted.h"
+#include "platform/linux/FileStatus.h"
 
 namespace platform {
 
@@ -14,12 +12,6 @@ namespace {
 
 constexpr int mostLinks = 40;  // as many as the kernel follows
 constexpr std::size_t mostFoldersKept = 1024;
-
-std::optional<std::string> targetOfLink(const std::string& path) {
-    char target[PATH_MAX];
-    const ssize_t length = uninterrupted([&] { return readlink(path.c_str(), target, sizeof target); });
-    return length < 0 ? std::nullopt : std::optional(std::string(target, static_cast<std::size_t>(length)));
-}
 
 }  // namespace
 

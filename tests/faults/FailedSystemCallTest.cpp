@@ -29,8 +29,6 @@ class FailedSystemCall : public ReadingFaultsTest {
         failed = calls.calls()[index];
         return tree;
     }
-    // Whether a library is in the plain or the localized folder is looked up once for each plug-in.
-    bool decidesWhereTheLibraryIs() const { return GetParam() == Reading::load && failed.path == projects(); }
     bool isOfAHiddenFile() const { return failed.path.ends_with("/.hidden"); }
 
     // What was logged meanwhile, and the warnings there are, each of which is told once.
@@ -60,7 +58,7 @@ TEST_P(FailedSystemCall, HidesNothingElseAndIsToldWithItsPath) {
         if (tree() != wholeText && !isOfAHiddenFile()) {
             EXPECT_THAT(told(), Contains(HasSubstr(failed.path)));
         }
-        if (!decidesWhereTheLibraryIs()) {
+        if (!decidesWhereTheLibraryIs(failed.path)) {
             EXPECT_EQ(nextTree(), whole);
         }
         ASSERT_FALSE(HasFailure());
@@ -77,7 +75,7 @@ TEST_P(FailedSystemCall, HidesNothingElseWhateverTheError) {
         for (; const auto tree = treeWithFailureAt(index, error); index += indexStep(errors.size())) {
             SCOPED_TRACE(description(index, error));
             expectHealthyRest(*tree, whole, failed.path);
-            if (!decidesWhereTheLibraryIs()) {
+            if (!decidesWhereTheLibraryIs(failed.path)) {
                 EXPECT_EQ(nextTree(), whole);
             }
             ASSERT_FALSE(HasFailure());
@@ -97,7 +95,7 @@ TEST_P(FailedSystemCall, ThatWasInterruptedIsMadeAgain) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Readings, FailedSystemCall, testing::Values(Reading::load, Reading::reload),
-                         [](const auto& info) { return info.param == Reading::load ? "Load" : "Reload"; });
+                         nameOfReading);
 
 }  // namespace
 }  // namespace testing_support

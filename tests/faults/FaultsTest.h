@@ -85,6 +85,14 @@ class ReadingFaultsTest : public FaultsTest, public testing::WithParamInterface<
         plugin();
     }
     TreeEntries nextTree() { return GetParam() == Reading::load ? loadTree() : reloadTree(); }
+    // Whether a library is in the plain or the localized folder is looked up once for each plug-in.
+    bool decidesWhereTheLibraryIs(const std::string& path) const {
+        return GetParam() == Reading::load && path == projects();
+    }
 };
+
+inline std::string nameOfReading(const testing::TestParamInfo<Reading>& info) {
+    return info.param == Reading::load ? "Load" : "Reload";
+}
 
 }  // namespace testing_support

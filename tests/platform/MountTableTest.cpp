@@ -160,6 +160,23 @@ TEST(MountRules, TheFirstMountOfADiskStandsForIt) {
     EXPECT_THAT(whole, ElementsAre(true, false, true, false));
 }
 
+TEST(MountRules, NetworkAndFUSEMountsAreServedAndSoIsWhatIsMountedWhenItIsLookedAt) {
+    EXPECT_THAT(servedMountPoints({root,
+                                   {"/mnt/nas", "nas:/export", "nfs4", "/"},
+                                   {"/mnt/ssh", "me@host:/", "fuse.sshfs", "/"},
+                                   {"/net", "systemd-1", "autofs", "/"},
+                                   {"/media/stick", "/dev/sdb1", "fuseblk", "/"},
+                                   disk("/media/card", "/dev/sdc1", "vfat"),
+                                   {"/proc", "proc", "proc", "/"}}),
+                ElementsAre("/mnt/nas", "/mnt/ssh", "/net"));
+}
+
+TEST(MountRules, WhatIsMountedLastAtAPlaceDecidesWhetherItIsServed) {
+    const MountEntry share{"/mnt/a", "nas:/export", "nfs4", "/"};
+    EXPECT_THAT(servedMountPoints({root, share, disk("/mnt/a", "/dev/sdb1")}), IsEmpty());
+    EXPECT_THAT(servedMountPoints({root, disk("/mnt/a", "/dev/sdb1"), share}), ElementsAre("/mnt/a"));
+}
+
 // --- Names
 
 TEST(VolumeProperties, AVolumeWithoutALabelIsNamedAfterItsMountPoint) {
@@ -192,23 +209,6 @@ TEST(VolumeProperties, WhatTheDesktopMountedIsRemovable) {
 }
 
 // --- The kernel's table
-
-TEST(MountRules, NetworkAndFUSEMountsAreServedAndSoIsWhatIsMountedWhenItIsLookedAt) {
-    EXPECT_THAT(servedMountPoints({root,
-                                   {"/mnt/nas", "nas:/export", "nfs4", "/"},
-                                   {"/mnt/ssh", "me@host:/", "fuse.sshfs", "/"},
-                                   {"/net", "systemd-1", "autofs", "/"},
-                                   {"/media/stick", "/dev/sdb1", "fuseblk", "/"},
-                                   disk("/media/card", "/dev/sdc1", "vfat"),
-                                   {"/proc", "proc", "proc", "/"}}),
-                ElementsAre("/mnt/nas", "/mnt/ssh", "/net"));
-}
-
-TEST(MountRules, WhatIsMountedLastAtAPlaceDecidesWhetherItIsServed) {
-    const MountEntry share{"/mnt/a", "nas:/export", "nfs4", "/"};
-    EXPECT_THAT(servedMountPoints({root, share, disk("/mnt/a", "/dev/sdb1")}), IsEmpty());
-    EXPECT_THAT(servedMountPoints({root, disk("/mnt/a", "/dev/sdb1"), share}), ElementsAre("/mnt/a"));
-}
 
 TEST(SystemMountTable, BeginsWithTheRoot) {
     const SystemMountTable table;
