@@ -231,7 +231,6 @@ class VXReelixPlugin : public vexo::VXMediaManager,
   private:
     void writeProjects(const Groups& projects, platform::Pasteboard& toPasteboard);
 
-    struct ScannedClip;
     struct ScannedEvent;
     struct EventYears;
     class EventLibraryScan;
@@ -254,7 +253,7 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     std::shared_ptr<EventLibraryScan> scanOfEventLibrary(const std::string& folder) VX_REQUIRES(_monitor);
     Group eventGroupForFolder(const std::string& folder, const std::string& libraryFolder);
     // Gives the event its clips; false when it has none.
-    bool finishEvent(const ScannedEvent& scanned);
+    bool finishEvent(ScannedEvent scanned);
     void writeEventAttributes(const Group& event, const EventYears& years);
 
     void scheduleProjectsReload();

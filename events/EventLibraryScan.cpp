@@ -1,6 +1,7 @@
 #include "events/EventLibraryScan.h"
 
 #include <algorithm>
+#include <exception>
 
 #include "core/ProcessCaches.h"
 #include "host/VXMediaBrowserUtilities.h"
@@ -81,34 +82,42 @@ bool VXReelixPlugin::EventLibraryScan::hasEntries() const {
     return hasEntries_;
 }
 
-const std::deque<VXReelixPlugin::ScannedEvent>& VXReelixPlugin::EventLibraryScan::events() const {
+std::vector<VXReelixPlugin::ScannedEvent> VXReelixPlugin::EventLibraryScan::takeEvents() {
     Locked lock(mutex_);
-    return events_;
+    std::erase_if(events_, [](const ScannedEvent& scanned) { return !scanned.event; });
+    return std::move(events_);
 }
 
 bool VXReelixPlugin::EventLibraryScan::scanNextClips() {
     const std::optional<Piece> piece = takePiece();
     if (!piece)
         return false;
+    EventYears years;
     for (std::size_t i = piece->begin; i < piece->end; ++i)
-        piece->event->clips[i] = clipForFile(*piece->folder, piece->event->folder, piece->folder->items()[i]);
+        piece->event->clips[i] =
+            clipForFile(*piece->folder, piece->event->folder, piece->folder->items()[i], years);
+    piece->event->years[piece->begin / clipsAPiece] = std::move(years);
     return true;
 }
 
+// Folders are opened without the lock, so that small ones, where that is most of the work, are gone through
+// by each thread on its own. What is open comes before what is not: few folders are open at a time.
 std::optional<VXReelixPlugin::EventLibraryScan::Piece> VXReelixPlugin::EventLibraryScan::takePiece() {
-    Locked lock(mutex_);
-    if (!isOpened_)
-        openLibrary();
-    if (!folder_)
-        openNextFolder();
-    if (!folder_)
-        return std::nullopt;
-    const std::size_t itemCount = folder_->items().size();
-    Piece piece{folder_, &events_.back(), nextItem_, std::min(nextItem_ + clipsAPiece, itemCount)};
-    nextItem_ = piece.end;
-    if (nextItem_ == itemCount)
-        folder_.reset();
-    return piece;
+    for (;;) {
+        ScannedEvent* event = nullptr;
+        {
+            Locked lock(mutex_);
+            if (!isOpened_)
+                openLibrary();
+            waitForWork();
+            if (!openFolders_.empty())
+                return nextPiece();
+            event = nextFolderToOpen();
+        }
+        if (!event)
+            return std::nullopt;
+        openEvent(*event);
+    }
 }
 
 void VXReelixPlugin::EventLibraryScan::openLibrary() {
@@ -117,45 +126,87 @@ void VXReelixPlugin::EventLibraryScan::openLibrary() {
     if (!library)
         return;
     hasEntries_ = !library->items().empty();
-    folders_ = eventFolders(*library, libraryFolder_);
+    for (std::string& folder : eventFolders(*library, libraryFolder_))
+        events_.push_back({std::move(folder), nullptr, {}, {}});
 }
 
-// Leaves no folder open when there is none left. An empty folder is no event. A folder counts as open last:
-// should making its event raise, the other thread must not take it for that of the event before.
-void VXReelixPlugin::EventLibraryScan::openNextFolder() {
-    while (!folder_ && nextFolder_ < folders_.size()) {
-        const std::string& path = folders_[nextFolder_++];
-        auto folder = platform::services().fileManager.openFolderAtPath(path);
-        if (!folder || folder->items().empty())
-            continue;
-        events_.push_back({path, plugin_.eventGroupForFolder(path, libraryFolder_),
-                           std::vector<std::optional<ScannedClip>>(folder->items().size())});
-        nextItem_ = 0;
-        folder_ = std::move(folder);
+void VXReelixPlugin::EventLibraryScan::waitForWork() {
+    while (openFolders_.empty() && nextEvent_ == events_.size() && foldersBeingOpened_ > 0)
+        folderOpened_.wait(mutex_);
+}
+
+VXReelixPlugin::EventLibraryScan::Piece VXReelixPlugin::EventLibraryScan::nextPiece() {
+    OpenFolder& open = openFolders_.front();
+    const std::size_t itemCount = open.folder->items().size();
+    Piece piece{open.folder, open.event, open.nextItem, std::min(open.nextItem + clipsAPiece, itemCount)};
+    open.nextItem = piece.end;
+    if (piece.end == itemCount)
+        openFolders_.pop_front();
+    return piece;
+}
+
+VXReelixPlugin::ScannedEvent* VXReelixPlugin::EventLibraryScan::nextFolderToOpen() {
+    if (nextEvent_ == events_.size())
+        return nullptr;
+    ++foldersBeingOpened_;
+    return &events_[nextEvent_++];
+}
+
+// Who waits for the folder hears that it's done, also when opening it raises.
+void VXReelixPlugin::EventLibraryScan::openEvent(ScannedEvent& event) {
+    FolderRef folder;
+    std::exception_ptr failure;
+    try {
+        folder = folderOfEvent(event);
+    } catch (...) {
+        failure = std::current_exception();
     }
+    Locked lock(mutex_);
+    --foldersBeingOpened_;
+    folderOpened_.notify_all();
+    if (failure)
+        std::rethrow_exception(failure);
+    if (folder)
+        openFolders_.push_back({std::move(folder), &event});
+}
+
+// An empty folder is no event.
+VXReelixPlugin::EventLibraryScan::FolderRef VXReelixPlugin::EventLibraryScan::folderOfEvent(
+    ScannedEvent& event) const {
+    const std::string& path = *event.folder.string();
+    FolderRef folder = platform::services().fileManager.openFolderAtPath(path);
+    if (!folder || folder->items().empty())
+        return nullptr;
+    event.clips.resize(folder->items().size());
+    event.years.resize((event.clips.size() - 1) / clipsAPiece + 1);
+    event.event = plugin_.eventGroupForFolder(path, libraryFolder_);
+    return folder;
 }
 
 // A file that is a movie only by its metadata gets its item before its date is known, and keeps its whole
 // name for that reason. That is deliberate.
-std::optional<VXReelixPlugin::ScannedClip> VXReelixPlugin::EventLibraryScan::clipForFile(
-    const platform::Folder& folder, const platform::Value& eventFolder,
-    const platform::FolderItem& item) const {
+VXReelixPlugin::Object VXReelixPlugin::EventLibraryScan::clipForFile(const platform::Folder& folder,
+                                                                     const platform::Value& eventFolder,
+                                                                     const platform::FolderItem& item,
+                                                                     EventYears& years) const {
     if (isHiddenName(item.name) || !hasFlags(folder.flagsOf(item), 0))
-        return std::nullopt;
+        return nullptr;
     const std::string clip = path::appending(*eventFolder.string(), item.name);
     Object mediaObject;
     if (!isSupportedMovie(clip, folder.isPlainFile(item))) {
         if (!isMovieByMetadata(*vexo::VXMediaObject::spotlightProperties(clip)))
-            return std::nullopt;
+            return nullptr;
         mediaObject = newClip(item.name, clip);
     }
     const auto dates = datesOfClip(folder, item);
     if (!dates)
-        return std::nullopt;
+        return nullptr;
     if (!mediaObject)
         mediaObject = newClip(clipName(dates->own, item.name), clip);
     mediaObject->setAttribute(eventFolder, vexo::VXReelixProjectPathKey);
-    return ScannedClip{mediaObject, dates->year, dates->own ? dates->own : dates->creation};
+    const platform::DateRef date = dates->own ? dates->own : dates->creation;
+    years.add({dates->year, date, dates->year, date});
+    return mediaObject;
 }
 
 // The attributes of a file are read only where they are needed: for the year when the clip's own date has

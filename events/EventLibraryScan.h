@@ -2,6 +2,7 @@
 // are those in listing order, and so are their clips.
 #pragma once
 
+#include <condition_variable>
 #include <cstddef>
 #include <deque>
 #include <memory>
@@ -18,19 +19,26 @@
 
 namespace reelix {
 
-// A clip's item, with what its event needs to know of it.
-struct VXReelixPlugin::ScannedClip {
-    Object mediaObject;
-    int year;
-    platform::DateRef date;  // may be nil
+// The earliest and the latest year among clips, and the dates of the clips that set them, which may be nil.
+// Only years are compared: among clips of one year the first in listing order stays.
+struct VXReelixPlugin::EventYears {
+    static constexpr int noLowest = 9999;
+
+    int lowest = noLowest;
+    platform::DateRef lowestDate;
+    int highest = 0;
+    platform::DateRef highestDate;
+
+    // `following` are those of clips that are listed after these.
+    void add(const EventYears& following);
 };
 
-// An event folder and what was found in it.
+// A folder that may be an event, and what was found in it.
 struct VXReelixPlugin::ScannedEvent {
-    platform::Value folder;  // its path, one text for all its clips
-    Group event;
-    std::vector<std::optional<ScannedClip>>
-        clips;  // one for each item of the folder, nil for what is no clip
+    platform::Value folder;         // its path, one text for all its clips
+    Group event;                    // nil for a folder that is none
+    Objects clips;                  // one for each item of the folder, nil for what is no clip
+    std::vector<EventYears> years;  // of each piece of the clips
 };
 
 class VXReelixPlugin::EventLibraryScan {
@@ -46,14 +54,23 @@ class VXReelixPlugin::EventLibraryScan {
 
     // Whether the library's folder can be listed and holds anything.
     bool hasEntries() const VX_EXCLUDES(mutex_);
-    const std::deque<ScannedEvent>& events() const VX_EXCLUDES(mutex_);
+    // For the caller to keep.
+    std::vector<ScannedEvent> takeEvents() VX_EXCLUDES(mutex_);
 
   private:
     static constexpr std::size_t clipsAPiece = 64;
 
+    using FolderRef = std::shared_ptr<const platform::Folder>;
+
+    struct OpenFolder {
+        FolderRef folder;
+        ScannedEvent* event;
+        std::size_t nextItem = 0;  // that nobody has taken
+    };
+
     // Items of one event folder, which stays open as long as some of them are being looked at.
     struct Piece {
-        std::shared_ptr<const platform::Folder> folder;
+        FolderRef folder;
         ScannedEvent* event;
         std::size_t begin;
         std::size_t end;
@@ -69,9 +86,17 @@ class VXReelixPlugin::EventLibraryScan {
     bool scanNextClips() VX_EXCLUDES(mutex_);
     std::optional<Piece> takePiece() VX_EXCLUDES(mutex_);
     void openLibrary() VX_REQUIRES(mutex_);
-    void openNextFolder() VX_REQUIRES(mutex_);
-    std::optional<ScannedClip> clipForFile(const platform::Folder& folder, const platform::Value& eventFolder,
-                                           const platform::FolderItem& item) const;
+    // Waits where only what other threads are opening can bring more.
+    void waitForWork() VX_REQUIRES(mutex_);
+    Piece nextPiece() VX_REQUIRES(mutex_);
+    // nil when every folder has been.
+    ScannedEvent* nextFolderToOpen() VX_REQUIRES(mutex_);
+    void openEvent(ScannedEvent& event) VX_EXCLUDES(mutex_);
+    // nil for a folder that is no event.
+    FolderRef folderOfEvent(ScannedEvent& event) const;
+    // nil for what is no clip.
+    Object clipForFile(const platform::Folder& folder, const platform::Value& eventFolder,
+                       const platform::FolderItem& item, EventYears& years) const;
     // nil for a file that is not there.
     std::optional<ClipDates> datesOfClip(const platform::Folder& folder,
                                          const platform::FolderItem& item) const;
@@ -86,11 +111,11 @@ class VXReelixPlugin::EventLibraryScan {
     mutable platform::Mutex mutex_;
     bool isOpened_ VX_GUARDED_BY(mutex_) = false;
     bool hasEntries_ VX_GUARDED_BY(mutex_) = false;
-    std::vector<std::string> folders_ VX_GUARDED_BY(mutex_);  // the paths of those that may be events
-    std::size_t nextFolder_ VX_GUARDED_BY(mutex_) = 0;
-    std::shared_ptr<const platform::Folder> folder_ VX_GUARDED_BY(mutex_);  // the last of the events is its
-    std::size_t nextItem_ VX_GUARDED_BY(mutex_) = 0;
-    std::deque<ScannedEvent> events_ VX_GUARDED_BY(mutex_);  // an event stays where it is
+    std::vector<ScannedEvent> events_ VX_GUARDED_BY(mutex_);  // each stays where it is
+    std::size_t nextEvent_ VX_GUARDED_BY(mutex_) = 0;         // whose folder nobody has opened
+    int foldersBeingOpened_ VX_GUARDED_BY(mutex_) = 0;
+    std::deque<OpenFolder> openFolders_ VX_GUARDED_BY(mutex_);  // that have items left
+    std::condition_variable_any folderOpened_;
 
     SharedWork work_;
 };

@@ -12,27 +12,16 @@ namespace reelix {
 
 namespace path = platform::path;
 
-// The earliest and the latest year among an event's clips, and the dates of the clips that set them. Only
-// years are compared: among clips of one year the first in listing order stays.
-struct VXReelixPlugin::EventYears {
-    static constexpr int noLowest = 9999;
-
-    int lowest = noLowest;
-    platform::DateRef lowestDate;
-    int highest = 0;
-    platform::DateRef highestDate;
-
-    void add(const ScannedClip& clip) {
-        if (clip.year < lowest) {
-            lowest = clip.year;
-            lowestDate = clip.date;
-        }
-        if (clip.year > highest) {
-            highest = clip.year;
-            highestDate = clip.date;
-        }
+void VXReelixPlugin::EventYears::add(const EventYears& following) {
+    if (following.lowest < lowest) {
+        lowest = following.lowest;
+        lowestDate = following.lowestDate;
     }
-};
+    if (following.highest > highest) {
+        highest = following.highest;
+        highestDate = following.highestDate;
+    }
+}
 
 VXReelixPlugin::Group VXReelixPlugin::_createReelixEventsFolderForPath(
     const std::optional<std::string>& path) {
@@ -50,10 +39,11 @@ VXReelixPlugin::Group VXReelixPlugin::_createReelixEventsFolderForPath(
     library->setModificationDate(vexo::VXMediaGroup::modDateForFile(*path));
     library->setIcon(iconCache().calendarIcon.get());
     library->setPath(*path);
-    for (const ScannedEvent& scanned : scan->events()) {
-        _flatEventGroupsList->push_back(scanned.event);  // also when it turns out to hold no clip
-        if (finishEvent(scanned))
-            library->addChildGroup(scanned.event);
+    for (ScannedEvent& scanned : scan->takeEvents()) {
+        const Group event = scanned.event;
+        _flatEventGroupsList->push_back(event);  // also when it turns out to hold no clip
+        if (finishEvent(std::move(scanned)))
+            library->addChildGroup(event);
     }
     return library;
 }
@@ -75,20 +65,17 @@ VXReelixPlugin::Group VXReelixPlugin::eventGroupForFolder(const std::string& fol
     return event;
 }
 
-bool VXReelixPlugin::finishEvent(const ScannedEvent& scanned) {
-    EventYears years;
-    Objects clips;
-    for (const std::optional<ScannedClip>& clip : scanned.clips) {
-        if (!clip)
-            continue;
-        years.add(*clip);
-        clips.push_back(clip->mediaObject);
-    }
-    if (clips.empty())
+bool VXReelixPlugin::finishEvent(ScannedEvent scanned) {
+    std::erase(scanned.clips, nullptr);
+    if (scanned.clips.empty())
         return false;
+    scanned.clips.shrink_to_fit();
+    scanned.event->setMediaObjects(vexo::VXMediaObjectList(std::move(scanned.clips)));
+    EventYears years;
+    for (const EventYears& ofPiece : scanned.years)
+        years.add(ofPiece);
     if (!years.lowestDate)
         years.lowestDate = years.highestDate;
-    scanned.event->setMediaObjects(vexo::VXMediaObjectList(std::move(clips)));
     writeEventAttributes(scanned.event, years);
     return true;
 }

@@ -1,5 +1,9 @@
 // Events that a second thread scans while a load reads the projects are those that the load would have found.
+#include <chrono>
+#include <functional>
+#include <semaphore>
 #include <stdexcept>
+#include <thread>
 
 #include "tests/events/EventsTest.h"
 
@@ -73,6 +77,52 @@ TEST_F(EventScansAheadTest, AThreadThatComesAfterALoadThatFailedFindsNothingToDo
     EXPECT_THROW(plugin().performLoadData(), std::runtime_error);
     environment.dispatcher.runDueBlocks();
     EXPECT_THAT(listed_, testing::IsEmpty());
+}
+
+// The second thread of a load is a real one here, and busy with opening the first event, "Party", from when
+// the projects are listed until the load has come to the second, "Trip".
+class SlowFolderTest : public EventScansAheadTest {
+  protected:
+    SlowFolderTest() {
+        files.beforeListing = [this](const std::string& path) {
+            if (path == home().path("Movies/Reelix Projects")) {
+                secondThread_ = std::thread([this] { environment.dispatcher.runDueBlocks(); });
+                waitFor(firstEventBegun_);
+            } else if (path == home().path(inLibrary("Party"))) {
+                firstEventBegun_.release();
+                waitFor(secondEventBegun_);
+                openFirstEvent();
+            } else if (path == home().path(inLibrary("Trip"))) {
+                secondEventBegun_.release();
+            }
+        };
+    }
+    ~SlowFolderTest() override {
+        if (secondThread_.joinable())
+            secondThread_.join();
+    }
+
+    std::function<void()> openFirstEvent = [] {};
+
+  private:
+    static void waitFor(std::binary_semaphore& semaphore) {
+        EXPECT_TRUE(semaphore.try_acquire_for(std::chrono::seconds(30)));
+    }
+
+    std::binary_semaphore firstEventBegun_{0};
+    std::binary_semaphore secondEventBegun_{0};
+    std::thread secondThread_;
+};
+
+TEST_F(SlowFolderTest, TheLoadGoesOnWithTheOthersAndThenWaits) {
+    load();
+    EXPECT_THAT(clipNames(plugin().rootMediaGroup()),
+                ElementsAre("Jan 1, 2010, 00:00:10", "Jul 1, 2009, 08:30:00", "Jul 2, 2009, 08:30:00"));
+}
+
+TEST_F(SlowFolderTest, TheLoadFailsWhenOpeningItRaises) {
+    openFirstEvent = [] { throw std::runtime_error("the event can't be opened"); };
+    EXPECT_THROW(plugin().performLoadData(), std::runtime_error);
 }
 
 // The same folder twice among the search paths is two libraries, each with items of its own.
