@@ -15,34 +15,31 @@ ComparisonResult compareNumbers(const T& a, const T& b) {
     return b < a ? ComparisonResult::descending : ComparisonResult::same;
 }
 
+std::optional<double> secondsOfDate(const platform::Dictionary& attributes, std::string_view key) {
+    const platform::Value* value = platform::find(attributes, key);
+    const platform::DateRef date = value ? value->date() : nullptr;
+    return date ? std::optional(date->secondsSinceReferenceDate()) : std::nullopt;
+}
+
 // What the comparisons by year look at.
 struct EventKeys {
-    explicit EventKeys(VXMediaGroupRef group)
-        : event(std::move(group)),
-          attributes(event->attributes()),
-          oldest(date(VXReelixEventOldestClipDate)),
-          newest(date(VXReelixEventNewestClipDate)) {
+    explicit EventKeys(VXMediaGroupRef group) : event(std::move(group)) {
+        const auto attributes = event->attributes();
         if (const platform::Value* value = platform::find(*attributes, VXReelixEventCreationYear))
             year = value->doubleValue();
-    }
-
-    platform::DateRef date(std::string_view key) const {
-        const platform::Value* value = platform::find(*attributes, key);
-        return value ? value->date() : nullptr;
+        oldest = secondsOfDate(*attributes, VXReelixEventOldestClipDate);
+        newest = secondsOfDate(*attributes, VXReelixEventNewestClipDate);
     }
 
     VXMediaGroupRef event;
-    std::shared_ptr<const platform::Dictionary> attributes;
     std::optional<double> year;
-    platform::DateRef oldest;
-    platform::DateRef newest;
+    std::optional<double> oldest;
+    std::optional<double> newest;
 };
 
 // A missing date compares as same.
-ComparisonResult compareDates(const platform::DateRef& a, const platform::DateRef& b) {
-    if (!a || !b)
-        return ComparisonResult::same;
-    return compareNumbers(a->secondsSinceReferenceDate(), b->secondsSinceReferenceDate());
+ComparisonResult compareDates(const std::optional<double>& a, const std::optional<double>& b) {
+    return a && b ? compareNumbers(*a, *b) : ComparisonResult::same;
 }
 
 ComparisonResult compareNames(const vexo::VXMediaGroup& a, const vexo::VXMediaGroup& b) {
