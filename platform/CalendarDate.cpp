@@ -31,13 +31,11 @@ bool isGMT(std::string_view zoneAbbreviation) {
 std::optional<ZonedTime> zonedTime(std::int64_t civilSeconds, const ParsedFields& fields) {
     if (fields.secondsFromGMT)
         return ZonedTime{civilSeconds - *fields.secondsFromGMT, *fields.secondsFromGMT, {}};
-    const std::vector<ZonedTime> times = timesOfLocalClock(civilSeconds);
-    if (!fields.zoneAbbreviation)
-        return times.front();
-    for (const ZonedTime& time : times) {
-        if (time.abbreviation == fields.zoneAbbreviation)
-            return time;
-    }
+    LocalTimes times = timesOfLocalClock(civilSeconds);
+    if (!fields.zoneAbbreviation || times.first.abbreviation == fields.zoneAbbreviation)
+        return std::move(times.first);
+    if (times.second && times.second->abbreviation == fields.zoneAbbreviation)
+        return std::move(times.second);
     return isGMT(*fields.zoneAbbreviation) ? std::optional(ZonedTime{civilSeconds, 0, {}}) : std::nullopt;
 }
 

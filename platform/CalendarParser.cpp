@@ -48,19 +48,19 @@ std::optional<CivilTime> ParsedFields::civilTime() const {
 std::optional<ParsedFields> CalendarParser::parse(std::string_view format) {
     FormatReader reader(format);
     while (const auto piece = reader.next()) {
-        const bool matches = piece->isConversion() ? readConversion(piece->conversion, reader.peek())
-                                                   : readLiteral(piece->literal);
+        const bool matches =
+            piece->isConversion() ? readConversion(piece->conversion, reader) : readLiteral(piece->literal);
         if (!matches)
             return std::nullopt;
     }
     return rest_.empty() ? std::optional(fields_) : std::nullopt;
 }
 
-bool CalendarParser::readConversion(char letter, const std::optional<FormatPiece>& following) {
+bool CalendarParser::readConversion(char letter, const FormatReader& following) {
     std::optional<int> ignored;
     switch (letter) {
         case 'Y':
-            return readYear(/*hasFourDigits=*/runsOn(following));
+            return readYear(/*hasFourDigits=*/runsOn(following.peek()));
         case 'y':
             return readYearOfCentury();
         case 'm':

@@ -47,7 +47,7 @@ class CalendarParser {
     };
 
     // Each moves past what it reads and answers false when that is not there.
-    bool readConversion(char letter, const std::optional<FormatPiece>& following);
+    bool readConversion(char letter, const FormatReader& following);
     bool readInLocale(char letter);
     bool readLiteral(std::string_view literal);
     bool readYear(bool hasFourDigits);

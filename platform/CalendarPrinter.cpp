@@ -3,6 +3,7 @@
 #include <fmt/compile.h>
 
 #include <cstdlib>
+#include <iterator>
 
 #include "platform/CalendarFormat.h"
 #include "platform/CalendarNames.h"
@@ -13,8 +14,14 @@ namespace platform {
 namespace {
 
 // At least four digits after the sign.
-std::string yearText(int year) {
-    return fmt::format(FMT_COMPILE("{}{:04}"), year < 0 ? "-" : "", std::abs(year));
+void appendYear(std::string& text, int year) {
+    if (year < 0)
+        text += '-';
+    fmt::format_to(std::back_inserter(text), FMT_COMPILE("{:04}"), std::abs(year));
+}
+
+void appendTwoDigits(std::string& text, int number) {
+    fmt::format_to(std::back_inserter(text), FMT_COMPILE("{:02}"), number);
 }
 
 int yearOfCentury(int year) {
@@ -36,45 +43,52 @@ std::string CalendarPrinter::print(std::string_view format) const {
     FormatReader reader(format);
     while (const auto piece = reader.next()) {
         if (piece->isConversion())
-            text += conversion(piece->conversion);
+            appendConversion(text, piece->conversion);
         else
             text += piece->literal;
     }
     return text;
 }
 
-std::string CalendarPrinter::conversion(char letter) const {
+void CalendarPrinter::appendConversion(std::string& text, char letter) const {
+    const auto end = std::back_inserter(text);
     switch (letter) {
         case 'Y':
-            return yearText(time_.year);
+            return appendYear(text, time_.year);
         case 'y':
-            return fmt::format(FMT_COMPILE("{:02}"), yearOfCentury(time_.year));
+            return appendTwoDigits(text, yearOfCentury(time_.year));
         case 'm':
-            return fmt::format(FMT_COMPILE("{:02}"), time_.month);
+            return appendTwoDigits(text, time_.month);
         case 'd':
-            return fmt::format(FMT_COMPILE("{:02}"), time_.day);
+            return appendTwoDigits(text, time_.day);
         case 'e':
-            return fmt::format(FMT_COMPILE("{}"), time_.day);
+            fmt::format_to(end, FMT_COMPILE("{}"), time_.day);
+            return;
         case 'j':
-            return fmt::format(FMT_COMPILE("{:03}"), dayOfYear(time_));
+            fmt::format_to(end, FMT_COMPILE("{:03}"), dayOfYear(time_));
+            return;
         case 'w':
-            return fmt::format(FMT_COMPILE("{}"), dayOfWeek(time_));
+            fmt::format_to(end, FMT_COMPILE("{}"), dayOfWeek(time_));
+            return;
         case 'H':
-            return fmt::format(FMT_COMPILE("{:02}"), time_.hour);
+            return appendTwoDigits(text, time_.hour);
         case 'I':
-            return fmt::format(FMT_COMPILE("{:02}"), (time_.hour + 11) % 12 + 1);
+            return appendTwoDigits(text, (time_.hour + 11) % 12 + 1);
         case 'M':
-            return fmt::format(FMT_COMPILE("{:02}"), time_.minute);
+            return appendTwoDigits(text, time_.minute);
         case 'S':
-            return fmt::format(FMT_COMPILE("{:02}"), time_.second);
+            return appendTwoDigits(text, time_.second);
         case 'F':
-            return fmt::format(FMT_COMPILE("{:03}"), milliseconds_);
+            fmt::format_to(end, FMT_COMPILE("{:03}"), milliseconds_);
+            return;
         case 'z':
-            return zoneOffset();
+            text += zoneOffset();
+            return;
         case 'Z':
-            return zoneName();
+            text += zoneName();
+            return;
         default:
-            return inLocale(letter);
+            text += inLocale(letter);
     }
 }
 

@@ -18,7 +18,7 @@ class CalendarPrinter {
     std::string print(std::string_view format) const;
 
   private:
-    std::string conversion(char letter) const;
+    void appendConversion(std::string& text, char letter) const;
     std::string inLocale(char letter) const;
     std::string zoneOffset() const;
     std::string zoneName() const;

@@ -3,6 +3,7 @@
 #include <atomic>
 #include <cstdlib>
 #include <ctime>
+#include <utility>
 
 #include "platform/Date.h"
 
@@ -36,6 +37,10 @@ void lookUpZone() {
     lastLookWithoutTZ = now.tv_sec;
 }
 
+bool isSameZone(const ZonedTime& time, const ZonedTime& other) {
+    return time.secondsFromGMT == other.secondsFromGMT && time.abbreviation == other.abbreviation;
+}
+
 bool clockShows(const ZonedTime& time, std::int64_t civilSeconds) {
     return time.seconds + time.secondsFromGMT == civilSeconds;
 }
@@ -47,23 +52,22 @@ ZonedTime localZoneAt(std::int64_t seconds) {
     return zoneAt(seconds);
 }
 
-std::vector<ZonedTime> timesOfLocalClock(std::int64_t civilSeconds) {
+// What holds before and after holds in between, too.
+LocalTimes timesOfLocalClock(std::int64_t civilSeconds) {
     lookUpZone();
-    const int offsetBefore = zoneAt(civilSeconds - beyondAnyOffset).secondsFromGMT;
-    const int offsetAfter = zoneAt(civilSeconds + beyondAnyOffset).secondsFromGMT;
-    const ZonedTime byOffsetBefore = zoneAt(civilSeconds - offsetBefore);
-
-    std::vector<ZonedTime> times;
-    if (clockShows(byOffsetBefore, civilSeconds))
-        times.push_back(byOffsetBefore);
-    if (offsetAfter != offsetBefore) {
-        const ZonedTime byOffsetAfter = zoneAt(civilSeconds - offsetAfter);
-        if (clockShows(byOffsetAfter, civilSeconds))
-            times.push_back(byOffsetAfter);
+    ZonedTime before = zoneAt(civilSeconds - beyondAnyOffset);
+    const ZonedTime after = zoneAt(civilSeconds + beyondAnyOffset);
+    if (isSameZone(before, after)) {
+        before.seconds = civilSeconds - before.secondsFromGMT;
+        return {std::move(before), std::nullopt};
     }
-    if (times.empty())
-        times.push_back(byOffsetBefore);
-    return times;
+    const ZonedTime byOffsetBefore = zoneAt(civilSeconds - before.secondsFromGMT);
+    const ZonedTime byOffsetAfter = zoneAt(civilSeconds - after.secondsFromGMT);
+    const bool isShownAfter = clockShows(byOffsetAfter, civilSeconds);
+    if (!clockShows(byOffsetBefore, civilSeconds))
+        return {isShownAfter ? byOffsetAfter : byOffsetBefore, std::nullopt};
+    const bool isShownTwice = isShownAfter && byOffsetAfter.seconds != byOffsetBefore.seconds;
+    return {byOffsetBefore, isShownTwice ? std::optional(byOffsetAfter) : std::nullopt};
 }
 
 }  // namespace platform

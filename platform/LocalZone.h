@@ -5,8 +5,8 @@
 #pragma once
 
 #include <cstdint>
+#include <optional>
 #include <string>
-#include <vector>
 
 namespace platform {
 
@@ -20,9 +20,15 @@ struct ZonedTime {
 // The zone's offset and abbreviation at a point in time, in seconds from 2001-01-01 00:00:00 UTC.
 ZonedTime localZoneAt(std::int64_t seconds);
 
-// The points in time, earliest first, at which the clock shows `civilSeconds` (from 2001-01-01 00:00:00 on
-// that clock): one, or two where the clock is put back. Where the clock is put forward past them, it is the
-// one at which a clock that had not been put forward would show them.
-std::vector<ZonedTime> timesOfLocalClock(std::int64_t civilSeconds);
+// The points in time at which a clock shows the same.
+struct LocalTimes {
+    ZonedTime first;
+    std::optional<ZonedTime> second;  // nil but where the clock is put back
+};
+
+// The points in time at which the clock shows `civilSeconds` (from 2001-01-01 00:00:00 on that clock). Where
+// the clock is put forward past them, it is the one at which a clock that had not been put forward would show
+// them.
+LocalTimes timesOfLocalClock(std::int64_t civilSeconds);
 
 }  // namespace platform

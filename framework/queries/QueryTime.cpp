@@ -64,7 +64,7 @@ double QueryTime::secondsSince1970(const platform::Date& now) const {
     if (unit == QueryTimeUnit::now)
         return now.secondsSince1970() + amount;
     const CivilTime time = beginning(unit, static_cast<int>(amount), midnightOf(now));
-    const auto seconds = platform::timesOfLocalClock(platform::secondsOf(time)).front().seconds;
+    const auto seconds = platform::timesOfLocalClock(platform::secondsOf(time)).first.seconds;
     return static_cast<double>(seconds) + platform::Date::secondsFrom1970ToReferenceDate;
 }
 

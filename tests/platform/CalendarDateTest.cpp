@@ -322,6 +322,15 @@ TEST_F(CalendarDateTest, ATimeThatOccursTwiceIsTheEarlier) {
     EXPECT_EQ(read("2009-04-05 01;45;00"), "2009-04-04T14:45:00Z");
 }
 
+TEST_F(CalendarDateTest, AZoneMayChangeItsNameAlone) {
+    constexpr std::string_view format = "%Y-%m-%d %H:%M %Z";
+    useZone("AAA-1BBB-1,M3.5.0,M10.5.0/3");
+    EXPECT_EQ(read("2009-03-29 01:30 AAA", format), "2009-03-29T00:30:00Z");
+    EXPECT_EQ(read("2009-03-29 02:30 BBB", format), "2009-03-29T01:30:00Z");
+    EXPECT_EQ(read("2009-03-29 02:30 AAA", format), "nil");
+    EXPECT_EQ(read("2009-07-01 12:00 BBB", format), "2009-07-01T11:00:00Z");
+}
+
 TEST_F(CalendarDateTest, ZonesOfTheZoneFilesWork) {
     if (!std::ifstream("/usr/share/zoneinfo/Pacific/Apia"))
         GTEST_SKIP() << "this machine has no zone files";
