@@ -3,6 +3,7 @@
 #include <atomic>
 #include <condition_variable>
 #include <exception>
+#include <utility>
 
 #include "framework/Diagnostics.h"
 #include "framework/DurationBadge.h"
@@ -198,8 +199,10 @@ void VXMediaManager::setRootMediaGroup(VXMediaGroupRef group) {
         Locked lock(state_->mutex);
         state_->root.swap(previous);
     }
+    const bool isFirst = !previous;
     previous = nullptr;
-    state_->registry.forgetVanished();
+    if (!isFirst)
+        state_->registry.forgetVanished();
     state_->observers.notify(group);
 }
 

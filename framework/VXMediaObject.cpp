@@ -1,5 +1,6 @@
 #include "host/VXMediaObject.h"
 
+#include <functional>
 #include <set>
 #include <utility>
 
@@ -52,7 +53,11 @@ std::optional<platform::Size> resolutionOf(const VXMetadataProperties& propertie
 }  // namespace
 
 VXMediaObject::VXMediaObject(int mediaType, std::string name, std::string objectID)
-    : ID_(std::move(objectID)), mediaType_(mediaType), name_(std::move(name)) {}
+    : ID_(std::move(objectID)), IDHash_(hashOfID(ID_)), mediaType_(mediaType), name_(std::move(name)) {}
+
+std::size_t VXMediaObject::hashOfID(const std::string& ID) {
+    return std::hash<std::string>{}(ID);
+}
 
 std::string VXMediaObject::name() const {
     Locked lock(mutex_);

@@ -8,6 +8,7 @@
 #pragma once
 
 #include <atomic>
+#include <cstddef>
 #include <memory>
 #include <optional>
 #include <string>
@@ -89,7 +90,10 @@ class VXMediaObject final {
 
     friend class MediaObjectRegistry;
 
+    static std::size_t hashOfID(const std::string& ID);
+
     const std::string ID_;
+    const std::size_t IDHash_;  // worked out where the item is made, which several threads do at once
     const int mediaType_;
     // The registry that answers this item for its ID, from then on and for as long as the item lives.
     mutable std::atomic<const MediaObjectRegistry*> registry_ = nullptr;

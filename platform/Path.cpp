@@ -55,11 +55,12 @@ std::string withoutLastComponent(std::string_view path) {
 std::string appending(std::string_view path, std::string_view component) {
     if (path.empty())
         return std::string(withoutTrailingSlashes(component));
-    std::string longer(withoutTrailingSlashes(path));
+    const std::string_view head = withoutTrailingSlashes(path);
     const std::string_view tail = withoutLeadingSlashes(withoutTrailingSlashes(component));
-    if (tail.empty())
-        return longer;
-    if (longer != "/")
+    std::string longer;
+    longer.reserve(head.size() + 1 + tail.size());
+    longer = head;
+    if (!tail.empty() && head != "/")
         longer += '/';
     return longer.append(tail);
 }

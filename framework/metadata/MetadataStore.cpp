@@ -299,9 +299,8 @@ bool MetadataStore::supportedMovieFile(const std::string& path) const {
 }
 
 bool MetadataStore::supportedPlainFile(const std::string& path) const {
-    const std::string name = platform::path::lastComponent(path);
-    return typeForExtension(platform::path::extension(name)) ? typeOfFile(name).isMovie
-                                                             : supportedMovieFile(path);
+    const FileType* type = typeForExtension(platform::path::extension(path));
+    return type ? type->isMovie && !type->isPackage : supportedMovieFile(path);
 }
 
 std::optional<std::string> MetadataStore::problemWithFile(const std::string& path) const {
