@@ -1,9 +1,13 @@
 #include "framework/metadata/ReaderHelper.h"
 
+#include <fmt/format.h>
+
+#include <cerrno>
 #include <utility>
 
 #include "framework/metadata/ReaderMessage.h"
 #include "framework/metadata/ReaderProcess.h"
+#include "platform/linux/LogText.h"
 
 namespace vexo {
 
@@ -29,12 +33,23 @@ std::shared_ptr<ReaderProcess> ReaderHelper::start() {
     if (!mayStart())
         return nullptr;
     std::shared_ptr<ReaderProcess> process = ReaderProcess::start(settings_.program);
+    const int error = process ? 0 : errno;
     if (process && adopt(process) && isGreetedBy(*process))
         return process;
     discard();
+    warnOfFailedStart(error);
     platform::Locked lock(mutex_);
     earliestStart_ = Clock::now() + settings_.pauseAfterFailedStart;
     return nullptr;
+}
+
+// `error` is 0 for a process that was there and did not speak.
+void ReaderHelper::warnOfFailedStart(int error) const {
+    if (!settings_.warn || isClosed())
+        return;
+    settings_.warn(error != 0 ? platform::failureLine("start", settings_.program, error)
+                              : fmt::format("cannot start {}: it is no media reader that works here",
+                                            platform::printable(settings_.program)));
 }
 
 bool ReaderHelper::mayStart() const {

@@ -44,6 +44,7 @@ class ReaderHelper : public std::enable_shared_from_this<ReaderHelper> {
 
     std::shared_ptr<ReaderProcess> takeKept() VX_EXCLUDES(mutex_);
     std::shared_ptr<ReaderProcess> start() VX_EXCLUDES(mutex_);
+    void warnOfFailedStart(int error) const VX_EXCLUDES(mutex_);
     bool mayStart() const VX_EXCLUDES(mutex_);
     // False, and nothing is kept, once this is closed.
     bool adopt(const std::shared_ptr<ReaderProcess>& process) VX_EXCLUDES(mutex_);

@@ -55,10 +55,12 @@ class SpawnSettings {
     SpawnSettings(const SpawnSettings&) = delete;
     SpawnSettings& operator=(const SpawnSettings&) = delete;
 
+    // False, and errno set, for a program that can't be started.
     bool spawn(pid_t& process, const std::string& program) const {
         std::string name = program;
         char* const arguments[] = {name.data(), nullptr};
-        return posix_spawn(&process, program.c_str(), &actions_, &attributes_, arguments, environ) == 0;
+        errno = posix_spawn(&process, program.c_str(), &actions_, &attributes_, arguments, environ);
+        return errno == 0;
     }
 
   private:

@@ -20,7 +20,7 @@ class ReaderProcess {
     using Descriptors = std::span<const int>;
     static constexpr std::size_t mostDescriptors = 2;
 
-    // nil when the program cannot be started.
+    // nil, and errno set, when the program cannot be started.
     static std::unique_ptr<ReaderProcess> start(const std::string& program);
     // Ends the process, whatever it is doing.
     ~ReaderProcess();

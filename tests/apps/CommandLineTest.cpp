@@ -135,6 +135,15 @@ TEST_F(CommandLineTest, TheWidestMovieStandsForAProject) {
     EXPECT_EQ(representative["metadata"]["kMDItemPixelHeight"], 360);
 }
 
+TEST_F(CommandLineTest, AMediaReaderThatIsNotThereIsWarnedOf) {
+    home.writeFile("Movies/Reelix Events/Trip/a.mov", "no real movie");
+    home.writeFile("Movies/Reelix Events/Trip/b.mov", "no real movie");
+    const testing_support::ScopedEnvironment reader("VEXO_MEDIA_READER", "/nowhere/reader");
+    const Outcome outcome = runVexo({"--home", home.path(), "tree", "--metadata"});
+    EXPECT_EQ(outcome.status, 0);
+    EXPECT_EQ(outcome.errors, "vexo: warning: cannot start /nowhere/reader: No such file or directory\n");
+}
+
 TEST_F(CommandLineTest, OneMovieThatIsNoneMakesTheLargestFileStandForAProject) {
     const std::string movies = home.makeFolder("Movies/Reelix Projects/Film.qnproject/Movies");
     testing_support::makeSampleMovie(movies + "/real.mov", {.size = "320x240", .seconds = 1});

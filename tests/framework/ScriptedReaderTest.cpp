@@ -105,6 +105,10 @@ class ScriptedReaderTest : public testing::Test {
 
     TemporaryFolder folder_;
     const std::string program_ = folder_.writeFile("reader", script);
+    std::vector<std::string> warnings_;
+    const std::function<void(const std::string&)> warn_ = [this](const std::string& problem) {
+        warnings_.push_back(problem);
+    };
     ProcessMediaReader reader_{
         {.program = program_, .deadline = 500ms, .startDeadline = 30s, .pauseAfterFailedStart = 0ms}};
 };
@@ -193,11 +197,19 @@ TEST_P(MisbehavingMediaReader, IsNoFaultOfTheFileWhenItIsNoReader) {
 }
 
 TEST_P(MisbehavingMediaReader, IsNotStartedForSomeTimeAfterThatFailed) {
-    ProcessMediaReader reader({.program = folder_.path("late"), .pauseAfterFailedStart = 1h});
+    ProcessMediaReader reader({.program = folder_.path("late"), .pauseAfterFailedStart = 1h, .warn = warn_});
     EXPECT_EQ(failureFor(reader, "well").cause, FailureCause::elsewhere);
     folder_.makeLink("late", program_);
     EXPECT_EQ(failureFor(reader, "well").cause, FailureCause::elsewhere);
     EXPECT_EQ(starts(), 0u);
+    EXPECT_THAT(warnings_,
+                ElementsAre("cannot start " + folder_.path("late") + ": No such file or directory"));
+}
+
+TEST_P(MisbehavingMediaReader, IsWarnedOfWhenItIsNoReader) {
+    ProcessMediaReader reader({.program = "/bin/true", .warn = warn_});
+    failureFor(reader, "well");
+    EXPECT_THAT(warnings_, ElementsAre("cannot start /bin/true: it is no media reader that works here"));
 }
 
 // --- Closed
