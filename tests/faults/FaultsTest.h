@@ -3,6 +3,8 @@
 #pragma once
 
 #include <chrono>
+#include <filesystem>
+#include <iterator>
 #include <string>
 
 #include "framework/GuardedWork.h"
@@ -71,13 +73,17 @@ class FaultsTest : public PluginTest {
 // What is read while something goes wrong.
 enum class Reading { load, reload };
 
-// Of either reading, of a library with no fault of its own.
+// Of either reading, of a library with no fault of its own. Whatever goes wrong, no descriptor stays open.
 class ReadingFaultsTest : public FaultsTest, public testing::WithParamInterface<Reading> {
   protected:
     ReadingFaultsTest() : FaultsTest(Documents::allWell) {}
 
+    void TearDown() override { EXPECT_EQ(openDescriptors(), openBefore_); }
+
     // A load begins from nothing.
     void begin() {
+        if (openBefore_ == 0)
+            openBefore_ = openDescriptors();
         if (GetParam() == Reading::load) {
             dropPlugin();
             clearProcessCaches();
@@ -89,6 +95,13 @@ class ReadingFaultsTest : public FaultsTest, public testing::WithParamInterface<
     bool decidesWhereTheLibraryIs(const std::string& path) const {
         return GetParam() == Reading::load && path == projects();
     }
+
+  private:
+    static std::ptrdiff_t openDescriptors() {
+        return std::distance(std::filesystem::directory_iterator("/proc/self/fd"), {});
+    }
+
+    std::ptrdiff_t openBefore_ = 0;
 };
 
 inline std::string nameOfReading(const testing::TestParamInfo<Reading>& info) {
