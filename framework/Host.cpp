@@ -42,12 +42,12 @@ std::string preferencesFolder(const std::optional<std::string>& home) {
     return platform::path::withoutLastComponent(home.value_or("") + file);
 }
 
-std::shared_ptr<ProcessMediaReader> newMediaReader(platform::SystemLog& warnings) {
+std::shared_ptr<ProcessMediaReader> newMediaReader(Diagnostics& diagnostics) {
     ProcessMediaReader::Settings settings{mediaReaderProgram()};
     settings.afterIdleTime = [](std::function<void()> block) {
         platform::services().dispatcher.afterInBackground(idleReaderTime, std::move(block));
     };
-    settings.warn = [&warnings](const std::string& problem) { warnings.log(problem); };
+    settings.warn = [&diagnostics](const std::string& problem) { diagnostics.warn(problem); };
     return std::make_shared<ProcessMediaReader>(std::move(settings));
 }
 
@@ -74,8 +74,8 @@ struct Host::State {
           files(home, mounts, fileWarnings, isPackageExtension),
           workspace(mounts, log),
           userDefaults(preferencesFolder(home), processDefaultsDomain, &fileWarnings),
-          reader(newMediaReader(fileWarnings)),
-          backgroundReader(newMediaReader(fileWarnings)),
+          reader(newMediaReader(diagnostics)),
+          backgroundReader(newMediaReader(diagnostics)),
           metadata(MetadataIndex::defaultPath(), reader),
           prefetcher(options.prefetchesMetadata ? newPrefetcher(backgroundReader) : nullptr),
           thumbnails(ThumbnailMaker(ThumbnailCache(ThumbnailCache::defaultFolder()), backgroundReader)),

@@ -53,7 +53,8 @@ class ProcessMediaReader final : public MediaReader {
         // The block may outlive the reader. Called by the threads that read and by such blocks, with at most
         // one block waiting at a time; not for a reader that is closed.
         std::function<void(std::function<void()>)> afterIdleTime = {};
-        // Hears each time why no helper could be started, on the thread that reads; nil for nobody.
+        // Hears each time why no helper could be started, on the thread that reads, and nothing once the
+        // reader is closed; nil for nobody.
         std::function<void(const std::string& problem)> warn = {};
     };
 

@@ -45,10 +45,11 @@ std::shared_ptr<ReaderProcess> ReaderHelper::start() {
 
 // `error` is 0 for a process that was there and did not speak.
 void ReaderHelper::warnOfFailedStart(int error) const {
+    platform::Locked lock(warning_);
     if (!settings_.warn || isClosed())
         return;
     settings_.warn(error != 0 ? platform::failureLine("start", settings_.program, error)
-                              : fmt::format("cannot start {}: it is no media reader that works here",
+                              : fmt::format("cannot start {}: it does not speak as a media reader does",
                                             platform::printable(settings_.program)));
 }
 
@@ -96,12 +97,15 @@ void ReaderHelper::discard() {
 }
 
 void ReaderHelper::close() {
-    std::shared_ptr<ReaderProcess> closed;  // as above
-    platform::Locked lock(mutex_);
-    isClosed_ = true;
-    closed = std::move(process_);
-    if (closed)
-        closed->end();
+    {
+        std::shared_ptr<ReaderProcess> closed;  // as above
+        platform::Locked lock(mutex_);
+        isClosed_ = true;
+        closed = std::move(process_);
+        if (closed)
+            closed->end();
+    }
+    platform::Locked lastWarning(warning_);
 }
 
 bool ReaderHelper::isClosed() const {

@@ -31,8 +31,8 @@ class ReaderHelper : public std::enable_shared_from_this<ReaderHelper> {
     // Ends what was taken, as soon as the taker lets go of it.
     void discard() VX_EXCLUDES(mutex_);
 
-    // Ends the process at once; no other is started.
-    void close() VX_EXCLUDES(mutex_);
+    // Ends the process at once; no other is started, and nobody is warned any more.
+    void close() VX_EXCLUDES(mutex_, warning_);
     bool isClosed() const VX_EXCLUDES(mutex_);
 
     // What the process that was started last says that it has given up.
@@ -44,7 +44,7 @@ class ReaderHelper : public std::enable_shared_from_this<ReaderHelper> {
 
     std::shared_ptr<ReaderProcess> takeKept() VX_EXCLUDES(mutex_);
     std::shared_ptr<ReaderProcess> start() VX_EXCLUDES(mutex_);
-    void warnOfFailedStart(int error) const VX_EXCLUDES(mutex_);
+    void warnOfFailedStart(int error) const VX_EXCLUDES(mutex_, warning_);
     bool mayStart() const VX_EXCLUDES(mutex_);
     // False, and nothing is kept, once this is closed.
     bool adopt(const std::shared_ptr<ReaderProcess>& process) VX_EXCLUDES(mutex_);
@@ -57,7 +57,8 @@ class ReaderHelper : public std::enable_shared_from_this<ReaderHelper> {
 
     const ProcessMediaReader::Settings settings_;
 
-    mutable platform::Mutex mutex_;  // never held while waiting for the process
+    mutable platform::Mutex warning_;  // held while somebody is warned
+    mutable platform::Mutex mutex_;    // never held while waiting for the process
     std::shared_ptr<ReaderProcess> process_ VX_GUARDED_BY(mutex_);
     std::vector<std::string> confinement_ VX_GUARDED_BY(mutex_);
     Clock::time_point earliestStart_ VX_GUARDED_BY(mutex_);

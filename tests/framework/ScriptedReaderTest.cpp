@@ -209,7 +209,7 @@ TEST_P(MisbehavingMediaReader, IsNotStartedForSomeTimeAfterThatFailed) {
 TEST_P(MisbehavingMediaReader, IsWarnedOfWhenItIsNoReader) {
     ProcessMediaReader reader({.program = "/bin/true", .warn = warn_});
     failureFor(reader, "well");
-    EXPECT_THAT(warnings_, ElementsAre("cannot start /bin/true: it is no media reader that works here"));
+    EXPECT_THAT(warnings_, ElementsAre("cannot start /bin/true: it does not speak as a media reader does"));
 }
 
 // --- Closed
