@@ -70,6 +70,17 @@ std::vector<std::string> eventFolders(const platform::Folder& library, const std
 
 }  // namespace
 
+void VXReelixPlugin::EventYears::add(const EventYears& following) {
+    if (following.lowest < lowest) {
+        lowest = following.lowest;
+        lowestDate = following.lowestDate;
+    }
+    if (following.highest > highest) {
+        highest = following.highest;
+        highestDate = following.highestDate;
+    }
+}
+
 VXReelixPlugin::EventLibraryScan::EventLibraryScan(VXReelixPlugin& plugin, std::string libraryFolder)
     : plugin_(plugin),
       texts_(plugin),

@@ -89,7 +89,7 @@ class VXReelixPlugin::EventLibraryScan {
     // Waits where only what other threads are opening can bring more.
     void waitForWork() VX_REQUIRES(mutex_);
     Piece nextPiece() VX_REQUIRES(mutex_);
-    // nil when every folder has been.
+    // nil when there is none left.
     ScannedEvent* nextFolderToOpen() VX_REQUIRES(mutex_);
     void openEvent(ScannedEvent& event) VX_EXCLUDES(mutex_);
     // nil for a folder that is no event.
@@ -112,7 +112,7 @@ class VXReelixPlugin::EventLibraryScan {
     bool isOpened_ VX_GUARDED_BY(mutex_) = false;
     bool hasEntries_ VX_GUARDED_BY(mutex_) = false;
     std::vector<ScannedEvent> events_ VX_GUARDED_BY(mutex_);  // each stays where it is
-    std::size_t nextEvent_ VX_GUARDED_BY(mutex_) = 0;         // whose folder nobody has opened
+    std::size_t nextEvent_ VX_GUARDED_BY(mutex_) = 0;         // whose folder nobody has begun to open
     int foldersBeingOpened_ VX_GUARDED_BY(mutex_) = 0;
     std::deque<OpenFolder> openFolders_ VX_GUARDED_BY(mutex_);  // that have items left
     std::condition_variable_any folderOpened_;

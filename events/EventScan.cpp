@@ -12,17 +12,6 @@ namespace reelix {
 
 namespace path = platform::path;
 
-void VXReelixPlugin::EventYears::add(const EventYears& following) {
-    if (following.lowest < lowest) {
-        lowest = following.lowest;
-        lowestDate = following.lowestDate;
-    }
-    if (following.highest > highest) {
-        highest = following.highest;
-        highestDate = following.highestDate;
-    }
-}
-
 VXReelixPlugin::Group VXReelixPlugin::_createReelixEventsFolderForPath(
     const std::optional<std::string>& path) {
     if (!path)

@@ -199,9 +199,9 @@ void VXMediaManager::setRootMediaGroup(VXMediaGroupRef group) {
         Locked lock(state_->mutex);
         state_->root.swap(previous);
     }
-    const bool isFirst = !previous;
+    const bool wasOneBefore = previous != nullptr;
     previous = nullptr;
-    if (!isFirst)
+    if (wasOneBefore)
         state_->registry.forgetVanished();
     state_->observers.notify(group);
 }

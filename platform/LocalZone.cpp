@@ -13,7 +13,7 @@ namespace {
 
 constexpr auto secondsTo1970 = static_cast<std::int64_t>(Date::secondsFrom1970ToReferenceDate);
 
-// Farther than any zone is from GMT, and nearer than any two changes of a zone are to each other.
+// Farther than any zone is from GMT; in twice that time no zone changes more than once.
 constexpr std::int64_t beyondAnyOffset = 26 * 3600;
 
 // By the zone that was last looked up.

@@ -20,7 +20,7 @@ struct ZonedTime {
 // The zone's offset and abbreviation at a point in time, in seconds from 2001-01-01 00:00:00 UTC.
 ZonedTime localZoneAt(std::int64_t seconds);
 
-// The points in time at which a clock shows the same.
+// The points in time at which a clock shows the same, the earlier first.
 struct LocalTimes {
     ZonedTime first;
     std::optional<ZonedTime> second;  // nil but where the clock is put back

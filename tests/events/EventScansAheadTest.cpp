@@ -114,7 +114,7 @@ class SlowFolderTest : public EventScansAheadTest {
     std::thread secondThread_;
 };
 
-TEST_F(SlowFolderTest, TheLoadGoesOnWithTheOthersAndThenWaits) {
+TEST_F(SlowFolderTest, TheLoadGoesOnWithTheOthers) {
     load();
     EXPECT_THAT(clipNames(plugin().rootMediaGroup()),
                 ElementsAre("Jan 1, 2010, 00:00:10", "Jul 1, 2009, 08:30:00", "Jul 2, 2009, 08:30:00"));

@@ -11,6 +11,7 @@
 
 #include "platform/FileManager.h"
 #include "platform/Services.h"
+#include "platform/ThreadSafety.h"
 #include "tests/support/HostEnvironment.h"
 #include "tests/support/PathFolder.h"
 
@@ -69,7 +70,10 @@ class ForwardingFiles final : public platform::FileManager {
     }
     std::ptrdiff_t extendedAttribute(const std::string& path, std::string_view name,
                                      std::span<char> buffer) const override {
-        attributeReads.push_back(buffer.size());
+        {
+            platform::Locked lock(attributeReadsMutex_);
+            attributeReads.push_back(buffer.size());
+        }
         return real().extendedAttribute(path, name, buffer);
     }
     std::optional<std::string> fileSystemTypeNameAtPath(const std::string& path) const override {
@@ -87,6 +91,7 @@ class ForwardingFiles final : public platform::FileManager {
     const platform::FileManager& real() const { return environment_.files(); }
 
     HostEnvironment& environment_;
+    mutable platform::Mutex attributeReadsMutex_;
 };
 
 // The environment's services with other files.

@@ -1,8 +1,8 @@
 // A dispatcher whose clock stands still until a test moves it. Blocks run on the thread that advances the
 // clock, one after another, so what a test sees never depends on luck.
 //
-// Blocks may be handed over from any thread; everything else belongs to the thread that made the dispatcher,
-// which counts as the main thread except while a background block or a thread's block runs.
+// Blocks may be handed over, and run, on any thread; everything else belongs to the thread that made the
+// dispatcher, which counts as the main thread except while it runs a background block or a thread's block.
 #pragma once
 
 #include <cstddef>
@@ -67,8 +67,9 @@ class VirtualDispatcher final : public platform::Dispatcher {
     std::multimap<Delay, Pending> pending_ VX_GUARDED_BY(mutex_);  // by the time they are due
     std::vector<Request> requests_ VX_GUARDED_BY(mutex_);
 
+    static inline thread_local bool isOffMainThread_ = false;  // runs a block that is not the main thread's
+
     // The main thread's own.
-    bool isOffMainThread_ = false;
     FailureHandler failureHandler_;
     std::size_t unhandledFailures_ = 0;
 };
