@@ -169,45 +169,6 @@ double microsecondsOfAnEvent(const Drained& drained) {
     return seconds(drained.time) * 1e6 / static_cast<double>(drained.events);
 }
 
-// Processor time of an operation's events, in the watcher and in the bare loop. Of inotify-tools the time of
-// an event counts, because it may lose some. No storm's files are removed before the last has ended: for
-// minutes afterwards ext4 makes new ones at a fraction of the speed, so that few come at a time.
-void DrainAMillionOperations(benchmark::State& state) {
-    constexpr long operations = 999'999;
-    for (auto _ : state) {
-        const bench::Folder bareFolder, toolsFolder, folder;
-        const Drained floor = drainStorm<BareLoop>(bareFolder, operations);
-        const Drained tools = drainStorm<ToolsLoop>(toolsFolder, operations);
-        if (floor.overflows > 0)
-            state.SkipWithError("the bare loop lost events");
-        if (tools.events == 0)
-            state.SkipWithError("inotify-tools saw nothing");
-        const auto folders = folder.makeFolders(100);
-        vexo::PathWatcher watcher;
-        const bench::Services services;
-        std::atomic<int> warnings = 0;
-        watcher.setWarningHandler([&](const std::string&) { ++warnings; });
-        watcher.start();
-        const auto observer = std::make_shared<CountingObserver>();
-        watcher.watchPath(folder.path(), observer);
-        const auto before = bench::processorTime();
-        bench::runInChild([&] { storm(folders, operations); });
-        waitUntilQuiet(*observer);
-        const auto time = bench::processorTime() - before;
-        watcher.close();
-        if (warnings > 0 || observer->reports == 0)
-            state.SkipWithError("the watcher lost events");
-        state.SetIterationTime(seconds(time));
-        const double perEvent = seconds(time) * 1e6 / static_cast<double>(floor.events);
-        state.counters["floor_s"] = seconds(floor.time);
-        state.counters["to_floor"] = seconds(time) / seconds(floor.time);
-        state.counters["to_inotifytools"] = perEvent / microsecondsOfAnEvent(tools);
-        state.counters["us_per_event"] = perEvent;
-        state.counters["reports"] = static_cast<double>(observer->reports);
-    }
-}
-BENCHMARK(DrainAMillionOperations)->Iterations(1)->UseManualTime()->Unit(benchmark::kSecond);
-
 // From the call to the last watch, and memory; the floor lists each folder and adds its watch.
 void ArmFolders(benchmark::State& state) {
     const auto count = static_cast<int>(state.range(0));
@@ -319,5 +280,44 @@ void PublishABurst(benchmark::State& state) {
     }
 }
 BENCHMARK(PublishABurst)->Iterations(1)->UseManualTime()->Unit(benchmark::kSecond);
+
+// Processor time of an operation's events, in the watcher and in the bare loop. Of inotify-tools the time of
+// an event counts, because it may lose some. No storm's files are removed before the last has ended, and
+// nothing is measured after that: for minutes ext4 then makes new ones at a fraction of the speed.
+void DrainAMillionOperations(benchmark::State& state) {
+    constexpr long operations = 999'999;
+    for (auto _ : state) {
+        const bench::Folder bareFolder, toolsFolder, folder;
+        const Drained floor = drainStorm<BareLoop>(bareFolder, operations);
+        const Drained tools = drainStorm<ToolsLoop>(toolsFolder, operations);
+        if (floor.overflows > 0)
+            state.SkipWithError("the bare loop lost events");
+        if (tools.events == 0)
+            state.SkipWithError("inotify-tools saw nothing");
+        const auto folders = folder.makeFolders(100);
+        vexo::PathWatcher watcher;
+        const bench::Services services;
+        std::atomic<int> warnings = 0;
+        watcher.setWarningHandler([&](const std::string&) { ++warnings; });
+        watcher.start();
+        const auto observer = std::make_shared<CountingObserver>();
+        watcher.watchPath(folder.path(), observer);
+        const auto before = bench::processorTime();
+        bench::runInChild([&] { storm(folders, operations); });
+        waitUntilQuiet(*observer);
+        const auto time = bench::processorTime() - before;
+        watcher.close();
+        if (warnings > 0 || observer->reports == 0)
+            state.SkipWithError("the watcher lost events");
+        state.SetIterationTime(seconds(time));
+        const double perEvent = seconds(time) * 1e6 / static_cast<double>(floor.events);
+        state.counters["floor_s"] = seconds(floor.time);
+        state.counters["to_floor"] = seconds(time) / seconds(floor.time);
+        state.counters["to_inotifytools"] = perEvent / microsecondsOfAnEvent(tools);
+        state.counters["us_per_event"] = perEvent;
+        state.counters["reports"] = static_cast<double>(observer->reports);
+    }
+}
+BENCHMARK(DrainAMillionOperations)->Iterations(1)->UseManualTime()->Unit(benchmark::kSecond);
 
 }  // namespace

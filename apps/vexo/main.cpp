@@ -19,7 +19,7 @@ void requireRoomForDescriptors() {
     for (platform::FileDescriptor& descriptor : descriptors) {
         descriptor = platform::FileDescriptor(eventfd(0, EFD_CLOEXEC));
         if (!descriptor)
-            throw std::system_error(errno, std::generic_category(), "cannot wait for anything");
+            throw std::system_error(errno, std::generic_category(), "too few files may be open at once");
     }
 }
 

@@ -4,6 +4,7 @@
 #include <nlohmann/json.hpp>
 
 #include "tests/support/Program.h"
+#include "tests/support/SampleMovie.h"
 #include "tests/support/TemporaryFolder.h"
 
 namespace testing_support {
@@ -62,6 +63,15 @@ TEST_F(DescriptorLimitTest, WhatIsMissingFromATreeIsWarnedOf) {
         EXPECT_TRUE(tree["plugins"] == whole["plugins"] || !tree["warnings"].empty());
     }
     EXPECT_GT(trees, 0);
+}
+
+// The index and the media reader take descriptors of their own.
+TEST_F(DescriptorLimitTest, ReadingMoviesEndsRegularly) {
+    makeSampleMovie(home.path("Movies/Reelix Events/Trip 1/clip.mov"), {.size = "320x240", .seconds = 1});
+    for (int limit = lowestLimit; limit <= highestLimit; limit += step) {
+        SCOPED_TRACE(limit);
+        expectRegularEnd(runLimited(limit, {"tree", "--metadata"}));
+    }
 }
 
 TEST_F(DescriptorLimitTest, FollowingChangesEndsRegularly) {
