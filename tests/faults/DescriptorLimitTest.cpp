@@ -15,14 +15,14 @@ using testing::HasSubstr;
 using testing::Not;
 using Json = nlohmann::json;
 
-// A sanitizer needs some for itself, and ends a program that can't have them; and it takes its time.
-constexpr int lowestLimit = VEXO_SANITIZED ? 16 : 1;
 constexpr int highestLimit = 24;
-constexpr int step = VEXO_SANITIZED ? 4 : 1;
 
 class DescriptorLimitTest : public testing::Test {
   protected:
-    DescriptorLimitTest() {
+    // UBSan looks through a pipe whether an object is in memory, and reports the object where it gets none.
+    void SetUp() override {
+        if (VEXO_SANITIZED)
+            GTEST_SKIP() << "a sanitizer needs descriptors of its own";
         for (const std::string number : {"1", "2", "3", "4", "5"}) {
             home.makeFolder("Movies/Reelix Projects/Film " + number + ".qnproject/Movies");
             home.writeFile("Movies/Reelix Events/Trip " + number + "/clip.mov");
@@ -52,7 +52,7 @@ TEST_F(DescriptorLimitTest, WhatIsMissingFromATreeIsWarnedOf) {
     const Json whole = Json::parse(unlimited.output);
     EXPECT_EQ(whole["warnings"], Json::array());
     int trees = 0;
-    for (int limit = lowestLimit; limit <= highestLimit; limit += step) {
+    for (int limit = 1; limit <= highestLimit; ++limit) {
         SCOPED_TRACE(limit);
         const Outcome outcome = runLimited(limit, {"tree", "--json"});
         expectRegularEnd(outcome);
@@ -68,14 +68,14 @@ TEST_F(DescriptorLimitTest, WhatIsMissingFromATreeIsWarnedOf) {
 // The index and the media reader take descriptors of their own.
 TEST_F(DescriptorLimitTest, ReadingMoviesEndsRegularly) {
     makeSampleMovie(home.path("Movies/Reelix Events/Trip 1/clip.mov"), {.size = "320x240", .seconds = 1});
-    for (int limit = lowestLimit; limit <= highestLimit; limit += step) {
+    for (int limit = 1; limit <= highestLimit; ++limit) {
         SCOPED_TRACE(limit);
         expectRegularEnd(runLimited(limit, {"tree", "--metadata"}));
     }
 }
 
 TEST_F(DescriptorLimitTest, FollowingChangesEndsRegularly) {
-    for (int limit = lowestLimit; limit <= highestLimit; limit += step) {
+    for (int limit = 1; limit <= highestLimit; ++limit) {
         SCOPED_TRACE(limit);
         expectRegularEnd(runLimited(limit, {"watch", "--for", "0.01"}));
     }
