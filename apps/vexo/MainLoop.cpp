@@ -3,6 +3,8 @@
 #include <glib-unix.h>
 #include <signal.h>
 
+#include "platform/linux/DescriptorRoom.h"
+
 namespace vexo {
 
 struct MainLoop::State {
@@ -24,6 +26,7 @@ constexpr double longestTimeout = 4e6;
 }  // namespace
 
 MainLoop::MainLoop() : state_(std::make_unique<State>()) {
+    platform::requireRoomForDescriptors();
     state_->interruption = g_unix_signal_add(SIGINT, setFlag, &state_->ended);
     state_->termination = g_unix_signal_add(SIGTERM, setFlag, &state_->ended);
 }

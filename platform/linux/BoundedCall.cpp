@@ -1,7 +1,14 @@
 #include "platform/linux/BoundedCall.h"
 
+#include "platform/linux/DescriptorRoom.h"
+
 namespace platform {
 namespace {
+
+GMainContext* newContext() {
+    requireRoomForDescriptors();
+    return g_main_context_new();
+}
 
 gboolean cancel(gpointer cancellable) {
     g_cancellable_cancel(static_cast<GCancellable*>(cancellable));
@@ -11,7 +18,7 @@ gboolean cancel(gpointer cancellable) {
 }  // namespace
 
 BoundedCall::BoundedCall()
-    : context_(g_main_context_new(), &g_main_context_unref),
+    : context_(newContext(), &g_main_context_unref),
       cancellable_(g_cancellable_new(), &g_object_unref),
       result_(nullptr, &g_object_unref) {
     g_main_context_push_thread_default(context_.get());

@@ -17,6 +17,7 @@ namespace platform {
 
 class BoundedCall {
   public:
+    // Raises std::system_error when too few files may be open.
     BoundedCall();
     ~BoundedCall();
     BoundedCall(const BoundedCall&) = delete;

@@ -74,6 +74,15 @@ TEST_F(DescriptorLimitTest, ReadingMoviesEndsRegularly) {
     }
 }
 
+TEST_F(DescriptorLimitTest, ActingEndsRegularly) {
+    const std::string clip = home.path("Movies/Reelix Events/Trip 1/clip.mov");
+    makeSampleMovie(clip, {.size = "320x240", .seconds = 1});
+    for (int limit = 1; limit <= highestLimit; ++limit) {
+        SCOPED_TRACE(limit);
+        expectRegularEnd(runLimited(limit, {"menu", "--object", clip, "--choose", "1"}));
+    }
+}
+
 TEST_F(DescriptorLimitTest, FollowingChangesEndsRegularly) {
     for (int limit = 1; limit <= highestLimit; ++limit) {
         SCOPED_TRACE(limit);
