@@ -43,6 +43,13 @@ class DescriptorLimitTest : public testing::Test {
         }
     }
 
+    void expectRegularEndAtEachLimit(const std::vector<std::string>& command) const {
+        for (int limit = 1; limit <= highestLimit; ++limit) {
+            SCOPED_TRACE(limit);
+            expectRegularEnd(runLimited(limit, command));
+        }
+    }
+
     const TemporaryFolder home;
 };
 
@@ -68,26 +75,17 @@ TEST_F(DescriptorLimitTest, WhatIsMissingFromATreeIsWarnedOf) {
 // The index and the media reader take descriptors of their own.
 TEST_F(DescriptorLimitTest, ReadingMoviesEndsRegularly) {
     makeSampleMovie(home.path("Movies/Reelix Events/Trip 1/clip.mov"), {.size = "320x240", .seconds = 1});
-    for (int limit = 1; limit <= highestLimit; ++limit) {
-        SCOPED_TRACE(limit);
-        expectRegularEnd(runLimited(limit, {"tree", "--metadata"}));
-    }
+    expectRegularEndAtEachLimit({"tree", "--metadata"});
 }
 
 TEST_F(DescriptorLimitTest, ActingEndsRegularly) {
     const std::string clip = home.path("Movies/Reelix Events/Trip 1/clip.mov");
     makeSampleMovie(clip, {.size = "320x240", .seconds = 1});
-    for (int limit = 1; limit <= highestLimit; ++limit) {
-        SCOPED_TRACE(limit);
-        expectRegularEnd(runLimited(limit, {"menu", "--object", clip, "--choose", "1"}));
-    }
+    expectRegularEndAtEachLimit({"menu", "--object", clip, "--choose", "1"});
 }
 
 TEST_F(DescriptorLimitTest, FollowingChangesEndsRegularly) {
-    for (int limit = 1; limit <= highestLimit; ++limit) {
-        SCOPED_TRACE(limit);
-        expectRegularEnd(runLimited(limit, {"watch", "--for", "0.01"}));
-    }
+    expectRegularEndAtEachLimit({"watch", "--for", "0.01"});
 }
 
 }  // namespace

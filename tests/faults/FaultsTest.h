@@ -3,12 +3,11 @@
 #pragma once
 
 #include <chrono>
-#include <filesystem>
-#include <iterator>
 #include <string>
 
 #include "framework/GuardedWork.h"
 #include "tests/faults/SmallLibrary.h"
+#include "tests/support/OpenDescriptors.h"
 #include "tests/support/PluginTest.h"
 
 namespace testing_support {
@@ -97,10 +96,6 @@ class ReadingFaultsTest : public FaultsTest, public testing::WithParamInterface<
     }
 
   private:
-    static std::ptrdiff_t openDescriptors() {
-        return std::distance(std::filesystem::directory_iterator("/proc/self/fd"), {});
-    }
-
     std::ptrdiff_t openBefore_ = 0;
 };
 

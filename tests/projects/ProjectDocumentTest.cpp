@@ -11,6 +11,7 @@
 #include "platform/KeyedUnarchiver.h"
 #include "projects/QNPlaceholder.h"
 #include "tests/projects/ProjectsTest.h"
+#include "tests/support/OpenDescriptors.h"
 
 using namespace testing_support;
 using platform::ArchiveError;
@@ -25,11 +26,6 @@ std::string sample(const std::string& name) {
     std::string bytes{std::istreambuf_iterator<char>(file), {}};
     EXPECT_FALSE(bytes.empty()) << name;
     return bytes;
-}
-
-std::size_t openDescriptors() {
-    const std::filesystem::directory_iterator descriptors("/proc/self/fd");
-    return static_cast<std::size_t>(std::distance(begin(descriptors), end(descriptors)));
 }
 
 class ProjectDocument : public ProjectsTest {
@@ -190,7 +186,7 @@ TEST_F(ProjectDocument, EveryClassNameIsAnsweredWithThePlaceholder) {
 
 TEST_F(ProjectDocument, FilesAreClosedAgainWhateverTheyHold) {
     plugin();
-    const std::size_t before = openDescriptors();
+    const std::ptrdiff_t before = openDescriptors();
     isTrailer(trailerDocument());
     errorOf(sample("truncated"));
     errorOf(sample("root-is-text"));
