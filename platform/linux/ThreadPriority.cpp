@@ -1,6 +1,5 @@
 #include "platform/linux/ThreadPriority.h"
 
-#include <linux/ioprio.h>
 #include <pthread.h>
 #include <sched.h>
 #include <sys/resource.h>
@@ -16,6 +15,11 @@ namespace {
 
 constexpr int lowestNice = 19;
 constexpr int highestNice = -20;
+
+// As in ioprio_set(2). Some versions of <linux/ioprio.h> name a parameter "class", which C++ does not read.
+constexpr int ioprioWhoProcess = 1;
+constexpr int ioprioClassIdle = 3;
+constexpr int ioprioClassShift = 13;
 
 // On Linux these act on one thread, by its number.
 void setNice(int nice) {
@@ -33,7 +37,7 @@ void lowerThisThreadToBackground() {
     const sched_param parameter{};
     sched_setscheduler(0, SCHED_BATCH, &parameter);
     setNice(lowestNice);
-    syscall(SYS_ioprio_set, IOPRIO_WHO_PROCESS, gettid(), IOPRIO_PRIO_VALUE(IOPRIO_CLASS_IDLE, 0));
+    syscall(SYS_ioprio_set, ioprioWhoProcess, gettid(), ioprioClassIdle << ioprioClassShift);
 }
 
 void setPriorityOfThisThread(double priority) {
