@@ -68,9 +68,9 @@ std::int64_t dayOf(const CivilTime& time) {
 
 void setDate(CivilTime& time, DayOfYear date) {
     time.year = static_cast<int>(date.year);
-    time.month = 12;
-    while (daysBeforeMonth(date.year, time.month) > date.day)
-        --time.month;
+    time.month = date.day / 32 + 1;  // or the one after it
+    while (time.month < 12 && daysBeforeMonth(date.year, time.month + 1) <= date.day)
+        ++time.month;
     time.day = date.day - daysBeforeMonth(date.year, time.month) + 1;
 }
 

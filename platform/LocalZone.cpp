@@ -13,8 +13,12 @@ namespace {
 
 constexpr auto secondsTo1970 = static_cast<std::int64_t>(Date::secondsFrom1970ToReferenceDate);
 
-// Farther than any zone is from GMT; in twice that time no zone changes more than once.
-constexpr std::int64_t beyondAnyOffset = 26 * 3600;
+constexpr std::int64_t hour = 3600;
+constexpr std::int64_t beyondAnyOffset = 26 * hour;  // farther than any zone is from GMT
+constexpr std::int64_t nearby = 10 * hour;
+// In twice that time no zone changes more than once: in the tz database no two changes are less than 95 hours
+// apart (Freetown in 1939).
+constexpr std::int64_t aroundAnyChange = beyondAnyOffset + nearby;
 
 // By the zone that was last looked up.
 ZonedTime zoneAt(std::int64_t seconds) {
@@ -25,17 +29,59 @@ ZonedTime zoneAt(std::int64_t seconds) {
     return {seconds, static_cast<int>(fields.tm_gmtoff), fields.tm_zone ? fields.tm_zone : ""};
 }
 
-// localtime_r need not notice that the zone has changed. Without TZ each look is a call to the system, so
-// many dates in one second look once.
-void lookUpZone() {
+// What says the zone: TZ; without it the machine's own setting, as it was in one second, because a look at it
+// is a call to the system.
+struct ZoneSetting {
+    const char* TZ;
+    std::time_t second;
+
+    static ZoneSetting current() {
+        timespec now{-1, 0};
+        const char* const TZ = std::getenv("TZ");
+        if (!TZ)
+            clock_gettime(CLOCK_MONOTONIC_COARSE, &now);
+        return {TZ, now.tv_sec};
+    }
+};
+
+// localtime_r need not notice that the zone has changed. What threads share here is not written where nothing
+// has.
+void lookUp(const ZoneSetting& setting) {
     static std::atomic<std::time_t> lastLookWithoutTZ = -1;
-    timespec now{-1, 0};
-    if (!std::getenv("TZ"))
-        clock_gettime(CLOCK_MONOTONIC_COARSE, &now);
-    if (now.tv_sec < 0 || lastLookWithoutTZ != now.tv_sec)
+    const bool hasLooked = lastLookWithoutTZ == setting.second;
+    if (setting.TZ || !hasLooked)
         tzset();
-    lastLookWithoutTZ = now.tv_sec;
+    if (!hasLooked)
+        lastLookWithoutTZ = setting.second;
 }
+
+// A time without changes of the zone around the last date that a thread asked for. Most dates are near the
+// one before them: the clips of an event are of one day.
+class QuietTime {
+  public:
+    // nil where the clock may change.
+    std::optional<ZonedTime> timeOfClock(std::int64_t civilSeconds, const ZoneSetting& setting) const {
+        const bool isNear = firstCivil_ <= civilSeconds && civilSeconds <= lastCivil_;
+        if (!isNear || second_ != setting.second || (setting.TZ && TZ_ != setting.TZ))
+            return std::nullopt;
+        return ZonedTime{civilSeconds - zone_.secondsFromGMT, zone_.secondsFromGMT, zone_.abbreviation};
+    }
+
+    void set(std::int64_t civilSeconds, const ZoneSetting& setting, ZonedTime zone) {
+        firstCivil_ = civilSeconds - nearby;
+        lastCivil_ = civilSeconds + nearby;
+        TZ_ = setting.TZ ? setting.TZ : "";
+        second_ = setting.second;
+        zone_ = std::move(zone);
+    }
+
+  private:
+    std::int64_t firstCivil_ = 0;
+    std::int64_t lastCivil_ = -1;
+    std::string TZ_;
+    std::time_t second_ = -1;  // what ZoneSetting has with TZ
+    ZonedTime zone_{};
+};
 
 bool isSameZone(const ZonedTime& time, const ZonedTime& other) {
     return time.secondsFromGMT == other.secondsFromGMT && time.abbreviation == other.abbreviation;
@@ -48,17 +94,22 @@ bool clockShows(const ZonedTime& time, std::int64_t civilSeconds) {
 }  // namespace
 
 ZonedTime localZoneAt(std::int64_t seconds) {
-    lookUpZone();
+    lookUp(ZoneSetting::current());
     return zoneAt(seconds);
 }
 
 // What holds before and after holds in between, too.
 LocalTimes timesOfLocalClock(std::int64_t civilSeconds) {
-    lookUpZone();
-    ZonedTime before = zoneAt(civilSeconds - beyondAnyOffset);
-    const ZonedTime after = zoneAt(civilSeconds + beyondAnyOffset);
+    thread_local QuietTime quiet;
+    const ZoneSetting setting = ZoneSetting::current();
+    if (auto time = quiet.timeOfClock(civilSeconds, setting))
+        return {*std::move(time), std::nullopt};
+    lookUp(setting);
+    ZonedTime before = zoneAt(civilSeconds - aroundAnyChange);
+    const ZonedTime after = zoneAt(civilSeconds + aroundAnyChange);
     if (isSameZone(before, after)) {
         before.seconds = civilSeconds - before.secondsFromGMT;
+        quiet.set(civilSeconds, setting, before);
         return {std::move(before), std::nullopt};
     }
     const ZonedTime byOffsetBefore = zoneAt(civilSeconds - before.secondsFromGMT);

@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <array>
 #include <cmath>
 #include <ctime>
 #include <fstream>
@@ -369,6 +370,34 @@ TEST_F(CalendarDateTest, TheEarlierTimeAgreesWithTheCLibraryWhereThereIsOnlyOne)
             ASSERT_TRUE(late == 0 || late == 3600 || late == 1800) << zone << " " << text;
             ASSERT_EQ(date->descriptionWithCalendarFormat(clipDateFormat, english), text) << zone;
         }
+    }
+}
+
+// As the clips of an event are read, from before a change of the clock to after it and back.
+TEST_F(CalendarDateTest, TimesNearOneAnotherAreEachInTheirOwnZone) {
+    constexpr std::time_t day = 86400, step = 1200;
+    struct Change {
+        const char* zone;
+        std::time_t time;
+    };
+    for (const auto& [zone, change] :
+         {Change{berlin, 1238288400}, Change{berlin, 1256432400}, Change{"Europe/Berlin", 1256432400},
+          Change{"Pacific/Apia", 1325239200}, Change{lordHowe, 1238857200}}) {
+        useZone(zone);
+        tzset();
+        const auto expectSame = [](std::time_t time) {
+            std::tm fields{};
+            localtime_r(&time, &fields);
+            std::array<char, 64> text{};
+            std::strftime(text.data(), text.size(), "%Y-%m-%d %H;%M;%S %Z", &fields);
+            const CalendarDateRef date = CalendarDate::dateWithString(text.data(), "%Y-%m-%d %H;%M;%S %Z");
+            ASSERT_TRUE(date) << text.data();
+            ASSERT_EQ(date->secondsSince1970(), static_cast<double>(time)) << text.data();
+        };
+        for (std::time_t time = change - 4 * day; time < change + 4 * day; time += step)
+            ASSERT_NO_FATAL_FAILURE(expectSame(time)) << zone;
+        for (std::time_t time = change + 4 * day; time > change - 4 * day; time -= step)
+            ASSERT_NO_FATAL_FAILURE(expectSame(time)) << zone;
     }
 }
 
