@@ -24,11 +24,10 @@ platform::CalendarDateRef PathDate::_vxMBCalendarDateFromFileName(const std::str
 
 platform::CalendarDateRef PathDate::dateFromFileName(const std::string& fileName,
                                                      const ClipNameTexts& texts) {
-    const std::string stem = path::withoutExtension(fileName);
+    const std::string_view stem = path::withoutExtensionView(fileName);
     if (!stem.starts_with(texts.prefix))
         return nullptr;
-    const auto date = platform::CalendarDate::dateWithString(
-        std::string_view(stem).substr(texts.prefix.size()), texts.format);
+    const auto date = platform::CalendarDate::dateWithString(stem.substr(texts.prefix.size()), texts.format);
     const int year = date ? date->yearOfCommonEra() : 0;
     return 1900 <= year && year <= 2100 ? date : nullptr;
 }
@@ -37,7 +36,8 @@ platform::CalendarDateRef ClipDateValue::date() const {
     const std::string_view text(bytes_.data(), std::strlen(bytes_.data()));
     if (!platform::isValidUTF8(text))
         return nullptr;
-    return platform::CalendarDate::dateWithString(text, "%Y-%m-%d %H;%M;%S");
+    static const platform::CalendarFormat format("%Y-%m-%d %H;%M;%S");
+    return platform::CalendarDate::dateWithString(text, format);
 }
 
 platform::CalendarDateRef VXReelixPlugin::_dateFromExtendedFileAttributeAtPath(const std::string& path) {

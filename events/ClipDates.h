@@ -18,8 +18,8 @@ struct ClipNameTexts {
     explicit ClipNameTexts(const VXReelixPlugin& plugin);
 
     const std::string prefix;  // with the "-" behind it
-    const std::string format;
-    const std::string displayFormat;
+    const platform::CalendarFormat format;
+    const platform::CalendarFormat displayFormat;
 };
 
 namespace PathDate {

@@ -58,7 +58,7 @@ Locale Locale::current() {
 CalendarDate::CalendarDate(double secondsSinceReferenceDate, int secondsFromGMT)
     : Date(secondsSinceReferenceDate), secondsFromGMT_(secondsFromGMT) {}
 
-CalendarDateRef CalendarDate::dateWithString(std::string_view string, std::string_view calendarFormat) {
+CalendarDateRef CalendarDate::dateWithString(std::string_view string, const CalendarFormat& calendarFormat) {
     const auto fields = CalendarParser(string).parse(calendarFormat);
     const auto civilTime = fields ? fields->civilTime() : std::nullopt;
     const auto zoned = civilTime ? zonedTime(secondsOf(*civilTime), *fields) : std::nullopt;
@@ -69,7 +69,8 @@ CalendarDateRef CalendarDate::dateWithString(std::string_view string, std::strin
                                           zoned->secondsFromGMT);
 }
 
-std::string CalendarDate::descriptionWithCalendarFormat(std::string_view format, const Locale& locale) const {
+std::string CalendarDate::descriptionWithCalendarFormat(const CalendarFormat& format,
+                                                        const Locale& locale) const {
     const auto seconds = wholeSeconds(secondsSinceReferenceDate());
     if (!seconds)
         return {};

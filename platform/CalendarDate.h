@@ -22,6 +22,7 @@
 #include <string>
 #include <string_view>
 
+#include "platform/CalendarFormat.h"
 #include "platform/Date.h"
 
 namespace platform {
@@ -58,12 +59,12 @@ class CalendarDate final : public Date {
     // A local time that a daylight-saving change skips is moved forward by the length of the gap; one that
     // occurs twice is the earlier, unless %Z says which. %z, and "GMT" or "UTC" for %Z, mean that zone
     // instead of the local one; other abbreviations must be the local zone's at that time.
-    static CalendarDateRef dateWithString(std::string_view string, std::string_view calendarFormat);
+    static CalendarDateRef dateWithString(std::string_view string, const CalendarFormat& calendarFormat);
 
     // descriptionWithCalendarFormat:locale:
     // In the date's own zone. %Z is printed like %z when the local zone has another offset at that time.
     // Empty for a date that is not a number.
-    std::string descriptionWithCalendarFormat(std::string_view format, const Locale& locale) const;
+    std::string descriptionWithCalendarFormat(const CalendarFormat& format, const Locale& locale) const;
 
     // In the date's own zone; 0 for a date that is not a number.
     int yearOfCommonEra() const;

@@ -15,26 +15,29 @@ constexpr LetterSet conversions = [] {
     return letters;
 }();
 
-std::size_t sizeInFormat(std::string_view format) {
-    return format[0] == '%' && format.size() > 1 ? 2 : 1;
+bool isConversion(std::string_view piece) {
+    return piece.size() == 2 && conversions[static_cast<unsigned char>(piece[1])];
+}
+
+void addLiteral(std::vector<CalendarFormat::Piece>& pieces, std::string_view text) {
+    if (pieces.empty() || pieces.back().isConversion())
+        pieces.push_back({});
+    pieces.back().literal += text;
 }
 
 }  // namespace
 
-std::optional<FormatPiece> FormatReader::peek() const {
-    if (rest_.empty())
-        return std::nullopt;
-    const std::string_view piece = rest_.substr(0, sizeInFormat(rest_));
-    if (piece.size() == 2 && conversions[static_cast<unsigned char>(piece[1])])
-        return FormatPiece{piece[1], {}};
-    return FormatPiece{0, piece == "%%" ? piece.substr(1) : piece};
-}
-
-std::optional<FormatPiece> FormatReader::next() {
-    const std::optional<FormatPiece> piece = peek();
-    if (piece)
-        rest_.remove_prefix(sizeInFormat(rest_));
-    return piece;
+std::vector<CalendarFormat::Piece> CalendarFormat::piecesOf(std::string_view format) {
+    std::vector<Piece> pieces;
+    while (!format.empty()) {
+        const std::string_view piece = format.substr(0, format.front() == '%' ? 2 : 1);
+        format.remove_prefix(piece.size());
+        if (isConversion(piece))
+            pieces.push_back({piece[1], {}});
+        else
+            addLiteral(pieces, piece == "%%" ? piece.substr(1) : piece);
+    }
+    return pieces;
 }
 
 }  // namespace platform

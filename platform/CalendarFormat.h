@@ -1,32 +1,37 @@
-// Takes a calendar format apart.
+// A calendar format, taken apart once for any number of dates.
 //
 // The conversions are those that platform/CalendarDate.h lists. A "%" that begins none of them stands for
-// itself, together with the byte that follows it.
+// itself, together with the byte that follows it. Immutable and thread-safe.
 #pragma once
 
-#include <optional>
+#include <concepts>
+#include <string>
 #include <string_view>
+#include <vector>
 
 namespace platform {
 
-// Either a conversion or text that stands for itself.
-struct FormatPiece {
-    char conversion = 0;       // the letter after "%"; 0 for text
-    std::string_view literal;  // one byte or two; lives as long as the format
-
-    bool isConversion() const { return conversion != 0; }
-};
-
-class FormatReader {
+class CalendarFormat {
   public:
-    explicit FormatReader(std::string_view format) : rest_(format) {}
+    // Either a conversion or text that stands for itself.
+    struct Piece {
+        char conversion = 0;  // the letter after "%"; 0 for text
+        std::string literal;  // never empty for text
 
-    // The next piece, which `next` moves past; nil at the end.
-    std::optional<FormatPiece> peek() const;
-    std::optional<FormatPiece> next();
+        bool isConversion() const { return conversion != 0; }
+    };
+
+    template <std::convertible_to<std::string_view> Text>
+    CalendarFormat(const Text& format)  // NOLINT: a text is what says which format is meant
+        : pieces_(piecesOf(format)) {}
+
+    // No text follows another.
+    const std::vector<Piece>& pieces() const { return pieces_; }
 
   private:
-    std::string_view rest_;
+    static std::vector<Piece> piecesOf(std::string_view format);
+
+    const std::vector<Piece> pieces_;
 };
 
 }  // namespace platform

@@ -1,7 +1,7 @@
 #include "platform/CalendarParser.h"
 
 #include <algorithm>
-#include <charconv>
+#include <utility>
 
 namespace platform {
 
@@ -23,9 +23,9 @@ std::size_t countLeading(std::string_view text, Predicate&& predicate) {
     return static_cast<std::size_t>(std::find_if_not(text.begin(), text.end(), predicate) - text.begin());
 }
 
-// Whether what follows a year in the format could be taken for more digits of it.
-bool runsOn(const std::optional<FormatPiece>& following) {
-    return following && (following->isConversion() || isDigit(following->literal[0]));
+// Whether what the piece reads could be taken for more digits of a number before it.
+bool couldBeOfNumber(const CalendarFormat::Piece& piece) {
+    return piece.isConversion() || isDigit(piece.literal[0]);
 }
 
 }  // namespace
@@ -45,22 +45,22 @@ std::optional<CivilTime> ParsedFields::civilTime() const {
     return isValid(time) ? std::optional(time) : std::nullopt;
 }
 
-std::optional<ParsedFields> CalendarParser::parse(std::string_view format) {
-    FormatReader reader(format);
-    while (const auto piece = reader.next()) {
-        const bool matches =
-            piece->isConversion() ? readConversion(piece->conversion, reader) : readLiteral(piece->literal);
-        if (!matches)
+std::optional<ParsedFields> CalendarParser::parse(const CalendarFormat& format) {
+    const auto& pieces = format.pieces();
+    for (std::size_t i = 0; i < pieces.size(); ++i) {
+        const auto& piece = pieces[i];
+        const bool runsOn = i + 1 < pieces.size() && couldBeOfNumber(pieces[i + 1]);
+        if (!(piece.isConversion() ? readConversion(piece.conversion, runsOn) : readLiteral(piece.literal)))
             return std::nullopt;
     }
-    return rest_.empty() ? std::optional(fields_) : std::nullopt;
+    return rest_.empty() ? std::optional(std::move(fields_)) : std::nullopt;
 }
 
-bool CalendarParser::readConversion(char letter, const FormatReader& following) {
+bool CalendarParser::readConversion(char letter, bool runsOn) {
     std::optional<int> ignored;
     switch (letter) {
         case 'Y':
-            return readYear(/*hasFourDigits=*/runsOn(following.peek()));
+            return readYear(/*hasFourDigits=*/runsOn);
         case 'y':
             return readYearOfCentury();
         case 'm':
@@ -223,12 +223,14 @@ bool CalendarParser::readNumber(Field& field, NumberRange range) {
 }
 
 std::optional<int> CalendarParser::number(NumberRange range) {
-    const std::size_t digits = countLeading(rest_.substr(0, static_cast<std::size_t>(range.digits)), isDigit);
+    const std::size_t room = std::min(rest_.size(), static_cast<std::size_t>(range.digits));
+    std::size_t digits = 0;
     int value = 0;
-    const auto [end, error] = std::from_chars(rest_.data(), rest_.data() + digits, value);
-    if (error != std::errc() || value < range.lowest || value > range.highest)
+    for (; digits < room && isDigit(rest_[digits]); ++digits)
+        value = 10 * value + (rest_[digits] - '0');
+    if (digits == 0 || value < range.lowest || value > range.highest)
         return std::nullopt;
-    rest_.remove_prefix(static_cast<std::size_t>(end - rest_.data()));
+    rest_.remove_prefix(digits);
     return value;
 }
 

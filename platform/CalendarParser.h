@@ -37,7 +37,7 @@ class CalendarParser {
     explicit CalendarParser(std::string_view text) : rest_(text) {}
 
     // nil when the text does not match the format from its first byte to its last.
-    std::optional<ParsedFields> parse(std::string_view format);
+    std::optional<ParsedFields> parse(const CalendarFormat& format);
 
   private:
     struct NumberRange {
@@ -46,8 +46,9 @@ class CalendarParser {
         int highest;
     };
 
-    // Each moves past what it reads and answers false when that is not there.
-    bool readConversion(char letter, const FormatReader& following);
+    // Each moves past what it reads and answers false when that is not there. What `runsOn` is followed by
+    // what could be taken for more of it.
+    bool readConversion(char letter, bool runsOn);
     bool readInLocale(char letter);
     bool readLiteral(std::string_view literal);
     bool readYear(bool hasFourDigits);

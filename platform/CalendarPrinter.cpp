@@ -5,7 +5,6 @@
 #include <cstdlib>
 #include <iterator>
 
-#include "platform/CalendarFormat.h"
 #include "platform/CalendarNames.h"
 #include "platform/LocalZone.h"
 
@@ -20,8 +19,10 @@ void appendYear(std::string& text, int year) {
     fmt::format_to(std::back_inserter(text), FMT_COMPILE("{:04}"), std::abs(year));
 }
 
+// Of a number below 100.
 void appendTwoDigits(std::string& text, int number) {
-    fmt::format_to(std::back_inserter(text), FMT_COMPILE("{:02}"), number);
+    text += static_cast<char>('0' + number / 10);
+    text += static_cast<char>('0' + number % 10);
 }
 
 int yearOfCentury(int year) {
@@ -38,14 +39,13 @@ CalendarPrinter::CalendarPrinter(std::int64_t seconds, int milliseconds, int sec
       locale_(locale),
       time_(civilTimeOf(seconds + secondsFromGMT)) {}
 
-std::string CalendarPrinter::print(std::string_view format) const {
+std::string CalendarPrinter::print(const CalendarFormat& format) const {
     std::string text;
-    FormatReader reader(format);
-    while (const auto piece = reader.next()) {
-        if (piece->isConversion())
-            appendConversion(text, piece->conversion);
+    for (const CalendarFormat::Piece& piece : format.pieces()) {
+        if (piece.isConversion())
+            appendConversion(text, piece.conversion);
         else
-            text += piece->literal;
+            text += piece.literal;
     }
     return text;
 }

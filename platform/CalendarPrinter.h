@@ -3,7 +3,6 @@
 
 #include <cstdint>
 #include <string>
-#include <string_view>
 
 #include "platform/CalendarDate.h"
 #include "platform/CivilTime.h"
@@ -15,7 +14,7 @@ class CalendarPrinter {
     // `seconds` is counted from the reference date, as the whole seconds of a date.
     CalendarPrinter(std::int64_t seconds, int milliseconds, int secondsFromGMT, const Locale& locale);
 
-    std::string print(std::string_view format) const;
+    std::string print(const CalendarFormat& format) const;
 
   private:
     void appendConversion(std::string& text, char letter) const;

@@ -71,9 +71,13 @@ std::string extension(std::string_view path) {
 }
 
 std::string withoutExtension(std::string_view path) {
+    return std::string(withoutExtensionView(path));
+}
+
+std::string_view withoutExtensionView(std::string_view path) {
     std::string_view trimmed = withoutTrailingSlashes(path);
     trimmed.remove_suffix(dottedExtension(trimmed).size());
-    return std::string(trimmed);
+    return trimmed;
 }
 
 std::string appendingExtension(std::string_view path, std::string_view extension) {

@@ -20,6 +20,7 @@ std::string appending(std::string_view path, std::string_view component);
 
 std::string extension(std::string_view path);         // "x.tar.mov" -> "mov", "a." -> "", ".mov" -> ""
 std::string withoutExtension(std::string_view path);  // "/a/x.tar.mov" -> "/a/x.tar", ".mov" -> ".mov"
+std::string_view withoutExtensionView(std::string_view path);  // the same, a part of `path`
 // "/a/b/", "localized" -> "/a/b.localized"; an empty extension adds nothing, nor is anything added to a path
 // without a name ("", "/").
 std::string appendingExtension(std::string_view path, std::string_view extension);
