@@ -81,6 +81,11 @@ void VXReelixPlugin::EventYears::add(const EventYears& following) {
     }
 }
 
+void VXReelixPlugin::EventYears::add(int year, const platform::DateRef& date) {
+    if (year < lowest || year > highest)
+        add({year, date, year, date});
+}
+
 VXReelixPlugin::EventLibraryScan::EventLibraryScan(VXReelixPlugin& plugin, std::string libraryFolder)
     : plugin_(plugin),
       texts_(plugin),
@@ -105,8 +110,7 @@ bool VXReelixPlugin::EventLibraryScan::scanNextClips() {
         return false;
     EventYears years;
     for (std::size_t i = piece->begin; i < piece->end; ++i)
-        piece->event->clips[i] =
-            clipForFile(*piece->folder, piece->event->folder, piece->folder->items()[i], years);
+        piece->event->clips[i] = clipForFile(*piece->folder, *piece->event, piece->folder->items()[i], years);
     piece->event->years[piece->begin / clipsAPiece] = std::move(years);
     return true;
 }
@@ -138,7 +142,7 @@ void VXReelixPlugin::EventLibraryScan::openLibrary() {
         return;
     hasEntries_ = !library->items().empty();
     for (std::string& folder : eventFolders(*library, libraryFolder_))
-        events_.push_back({std::move(folder), nullptr, {}, {}});
+        events_.push_back({std::move(folder), nullptr, nullptr, {}, {}});
 }
 
 void VXReelixPlugin::EventLibraryScan::waitForWork() {
@@ -190,6 +194,7 @@ VXReelixPlugin::EventLibraryScan::FolderRef VXReelixPlugin::EventLibraryScan::fo
         return nullptr;
     event.clips.resize(folder->items().size());
     event.years.resize((event.clips.size() - 1) / clipsAPiece + 1);
+    event.clipIcon = iconCache().smallApplicationIcon.get();
     event.event = plugin_.eventGroupForFolder(path, libraryFolder_);
     return folder;
 }
@@ -197,26 +202,24 @@ VXReelixPlugin::EventLibraryScan::FolderRef VXReelixPlugin::EventLibraryScan::fo
 // A file that is a movie only by its metadata gets its item before its date is known, and keeps its whole
 // name for that reason. That is deliberate.
 VXReelixPlugin::Object VXReelixPlugin::EventLibraryScan::clipForFile(const platform::Folder& folder,
-                                                                     const platform::Value& eventFolder,
+                                                                     const ScannedEvent& event,
                                                                      const platform::FolderItem& item,
                                                                      EventYears& years) const {
     if (isHiddenName(item.name) || !hasFlags(folder.flagsOf(item), 0))
         return nullptr;
-    const std::string clip = path::appending(*eventFolder.string(), item.name);
+    std::string clip = path::appending(*event.folder.string(), item.name);
     Object mediaObject;
     if (!isSupportedMovie(clip, folder.isPlainFile(item))) {
         if (!isMovieByMetadata(*vexo::VXMediaObject::spotlightProperties(clip)))
             return nullptr;
-        mediaObject = newClip(item.name, clip);
+        mediaObject = newClip(item.name, std::move(clip), event);
     }
     const auto dates = datesOfClip(folder, item);
     if (!dates)
         return nullptr;
     if (!mediaObject)
-        mediaObject = newClip(clipName(dates->own, item.name), clip);
-    mediaObject->setAttribute(eventFolder, vexo::VXReelixProjectPathKey);
-    const platform::DateRef date = dates->own ? dates->own : dates->creation;
-    years.add({dates->year, date, dates->year, date});
+        mediaObject = newClip(clipName(dates->own, item.name), std::move(clip), event);
+    years.add(dates->year, dates->own ? dates->own : dates->creation);
     return mediaObject;
 }
 
@@ -239,13 +242,15 @@ std::optional<VXReelixPlugin::EventLibraryScan::ClipDates> VXReelixPlugin::Event
     return ClipDates{own, creation, year ? *year : creationYear(creation)};
 }
 
-VXReelixPlugin::Object VXReelixPlugin::EventLibraryScan::newClip(const std::string& name,
-                                                                 const std::string& clip) const {
-    const Object mediaObject = plugin_.newMediaObjectWithType(vexo::VXMediaTypeMovie, name, clip);
+VXReelixPlugin::Object VXReelixPlugin::EventLibraryScan::newClip(std::string name, std::string clip,
+                                                                 const ScannedEvent& event) const {
+    const Object mediaObject =
+        plugin_.newMediaObjectWithType(vexo::VXMediaTypeMovie, std::move(name), std::move(clip));
     mediaObject->setMediaSourceType(vexo::VXMediaSourceTypeFile);
-    mediaObject->setPath(clip);
-    mediaObject->setSpotlightProperties(vexo::VXMediaObject::spotlightProperties(clip));
-    mediaObject->setIcon(iconCache().smallApplicationIcon.get());
+    mediaObject->setPath(mediaObject->ID());
+    mediaObject->setSpotlightPropertiesOfFile(mediaObject->ID());
+    mediaObject->setAttribute(event.folder, vexo::VXReelixProjectPathKey);
+    mediaObject->setIcon(event.clipIcon);
     return mediaObject;
 }
 

@@ -31,12 +31,14 @@ struct VXReelixPlugin::EventYears {
 
     // `following` are those of clips that are listed after these.
     void add(const EventYears& following);
+    void add(int year, const platform::DateRef& date);
 };
 
 // A folder that may be an event, and what was found in it.
 struct VXReelixPlugin::ScannedEvent {
     platform::Value folder;         // its path, one text for all its clips
     Group event;                    // nil for a folder that is none
+    platform::ImageRef clipIcon;    // asked for once for all its clips
     Objects clips;                  // one for each item of the folder, nil for what is no clip
     std::vector<EventYears> years;  // of each piece of the clips
 };
@@ -95,12 +97,12 @@ class VXReelixPlugin::EventLibraryScan {
     // nil for a folder that is no event.
     FolderRef folderOfEvent(ScannedEvent& event) const;
     // nil for what is no clip.
-    Object clipForFile(const platform::Folder& folder, const platform::Value& eventFolder,
+    Object clipForFile(const platform::Folder& folder, const ScannedEvent& event,
                        const platform::FolderItem& item, EventYears& years) const;
     // nil for a file that is not there.
     std::optional<ClipDates> datesOfClip(const platform::Folder& folder,
                                          const platform::FolderItem& item) const;
-    Object newClip(const std::string& name, const std::string& clip) const;
+    Object newClip(std::string name, std::string clip, const ScannedEvent& event) const;
     std::string clipName(const platform::CalendarDateRef& date, const std::string& fileName) const;
 
     VXReelixPlugin& plugin_;

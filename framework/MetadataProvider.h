@@ -14,12 +14,6 @@ class MetadataProvider {
 
     // Never nil; nothing is read before a property is asked for.
     virtual VXMetadataPropertiesRef propertiesForFile(const std::string& path) const = 0;
-    // Whether the properties are what `propertiesForFile(path)` answers, with nothing read yet: new ones
-    // would do as well as them. Where that is not known they are not.
-    virtual bool areUnreadPropertiesOfFile(const VXMetadataProperties& /*properties*/,
-                                           std::string_view /*path*/) const {
-        return false;
-    }
     // Whether the file is a movie by its type. Reads no more than the beginning, where the name tells no
     // type.
     virtual bool supportedMovieFile(const std::string& path) const = 0;

@@ -1,8 +1,10 @@
 #include "host/VXMediaObject.h"
 
+#include <algorithm>
 #include <functional>
 #include <set>
 #include <utility>
+#include <vector>
 
 #include "framework/HostServices.h"
 #include "framework/MetadataProvider.h"
@@ -30,9 +32,12 @@ class KeyTexts {
     std::set<std::string, std::less<>> texts_ VX_GUARDED_BY(mutex_);
 };
 
+// Each thread remembers the texts that it has used, so that threads which make items wait for none.
 std::string_view lastingText(std::string_view key) {
     static auto& texts = *new KeyTexts;  // never freed: items may outlive everything else
-    return texts.lasting(key);
+    thread_local std::vector<std::string_view> used;
+    const auto known = std::find(used.begin(), used.end(), key);
+    return known != used.end() ? *known : used.emplace_back(texts.lasting(key));
 }
 
 // Of a file that nobody reads any more, because the item's host has ended.
@@ -76,9 +81,9 @@ std::optional<std::string> VXMediaObject::path() const {
     return pathIsID_ ? std::optional(ID_) : std::nullopt;
 }
 
-void VXMediaObject::setPath(std::string path) {
+void VXMediaObject::setPath(std::string_view path) {
     const bool isID = path == ID_;
-    auto other = isID ? nullptr : std::make_unique<const std::string>(std::move(path));
+    auto other = isID ? nullptr : std::make_unique<const std::string>(path);
     Locked lock(mutex_);
     pathIsID_ = isID;
     otherPath_.swap(other);
@@ -194,12 +199,17 @@ platform::Dictionary VXMediaObject::attributes() const {
 }
 
 void VXMediaObject::setSpotlightProperties(VXMetadataPropertiesRef properties) {
-    const HostServices* const host = hostServicesIfAny();
-    const bool areOfID = properties && host && host->metadata.areUnreadPropertiesOfFile(*properties, ID_);
-    VXMetadataPropertiesRef kept = areOfID ? nullptr : properties;
+    Locked lock(mutex_);
+    propertiesAreOfID_ = false;
+    spotlightProperties_.swap(properties);
+}
+
+void VXMediaObject::setSpotlightPropertiesOfFile(const std::string& path) {
+    const bool areOfID = path == ID_;
+    VXMetadataPropertiesRef properties = areOfID ? nullptr : spotlightProperties(path);
     Locked lock(mutex_);
     propertiesAreOfID_ = areOfID;
-    spotlightProperties_.swap(kept);
+    spotlightProperties_.swap(properties);
 }
 
 VXMetadataPropertiesRef VXMediaObject::spotlightProperties() const {

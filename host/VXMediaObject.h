@@ -39,7 +39,7 @@ class VXMediaObject final {
     std::string name() const VX_EXCLUDES(mutex_);
     void setName(std::string name) VX_EXCLUDES(mutex_);
     std::optional<std::string> path() const VX_EXCLUDES(mutex_);
-    void setPath(std::string path) VX_EXCLUDES(mutex_);
+    void setPath(std::string_view path) VX_EXCLUDES(mutex_);
     std::optional<platform::URL> URL() const;  // of the path; nil without one
     int mediaSourceType() const VX_EXCLUDES(mutex_);
     void setMediaSourceType(int mediaSourceType) VX_EXCLUDES(mutex_);
@@ -64,9 +64,11 @@ class VXMediaObject final {
     // What was set, without the fallback.
     platform::Dictionary attributes() const VX_EXCLUDES(mutex_);
 
-    // setSpotlightProperties:; properties of the file that the ID names are made anew when they are asked
-    // for, if nothing of them was read yet.
+    // setSpotlightProperties:
     void setSpotlightProperties(VXMetadataPropertiesRef properties) VX_EXCLUDES(mutex_);
+    // The same with the properties of the file at `path`, which are made only when they are asked for where
+    // the ID names that file.
+    void setSpotlightPropertiesOfFile(const std::string& path) VX_EXCLUDES(mutex_);
     // nil when none were set; else the same object each time.
     VXMetadataPropertiesRef spotlightProperties() const VX_EXCLUDES(mutex_);
     // spotlightProperties:; the properties of the file at `path`, never nil.

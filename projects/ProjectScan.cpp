@@ -126,7 +126,7 @@ VXReelixPlugin::Object VXReelixPlugin::renderedMovieObject(const std::string& mo
                                                  path::withoutExtension(path::lastComponent(movie)), movie);
     object->setMediaSourceType(vexo::VXMediaSourceTypeFile);
     object->setPath(movie);
-    object->setSpotlightProperties(vexo::VXMediaObject::spotlightProperties(movie));
+    object->setSpotlightPropertiesOfFile(movie);
     object->setAttribute(package, vexo::VXReelixProjectPathKey);
     object->setAttribute(ReelixProjectFormatVersion, vexo::VXReelixProjectFormatVersion);
     object->setIcon(iconCache().smallApplicationIcon.get());

@@ -23,7 +23,7 @@ VXReelixPlugin::Object VXReelixPlugin::newRepresentative(const Group& projectGro
         newMediaObjectWithType(vexo::VXMediaTypeMovie, projectGroup->name().value_or(""), moviePath);
     representative->setMediaSourceType(vexo::VXMediaSourceTypeFile);
     representative->setPath(moviePath);
-    representative->setSpotlightProperties(vexo::VXMediaObject::spotlightProperties(moviePath));
+    representative->setSpotlightPropertiesOfFile(moviePath);
     if (const auto url = projectGroup->URL())
         representative->setAttribute(url->path(), vexo::VXReelixProjectPathKey);
     const auto resolution = movie->attributeForKey(vexo::VXMediaObjectResolutionKey);

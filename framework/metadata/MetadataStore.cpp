@@ -200,10 +200,6 @@ class FileMetadata final : public VXMetadataProperties {
     FileMetadata(const FileMetadata&) = delete;
     FileMetadata& operator=(const FileMetadata&) = delete;
 
-    bool isUnread(const std::shared_ptr<MetadataCache>& cache, std::string_view path) const {
-        return !media_ && path_ == path && cache_.lock() == cache;
-    }
-
     std::optional<Value> valueForKey(std::string_view key) const override {
         if (const MediaKey* found = mediaKey(key))
             return found->valueIn(media());
@@ -285,12 +281,6 @@ MetadataStore::~MetadataStore() = default;
 
 VXMetadataPropertiesRef MetadataStore::propertiesForFile(const std::string& path) const {
     return std::make_shared<FileMetadata>(cache_, path);
-}
-
-bool MetadataStore::areUnreadPropertiesOfFile(const VXMetadataProperties& properties,
-                                              std::string_view path) const {
-    const auto* own = dynamic_cast<const FileMetadata*>(&properties);
-    return own && own->isUnread(cache_, path);
 }
 
 bool MetadataStore::supportedMovieFile(const std::string& path) const {

@@ -31,8 +31,6 @@ class MetadataStore final : public MetadataProvider {
 
     // Never nil. Paths under /Volumes are understood, wherever the platform's services are in place.
     VXMetadataPropertiesRef propertiesForFile(const std::string& path) const override;
-    bool areUnreadPropertiesOfFile(const VXMetadataProperties& properties,
-                                   std::string_view path) const override;
 
     // Whether the file is a plain file of a movie type; links are followed. The extension decides, and where
     // it tells no type the beginning of the content: whether the rest can be read is not asked.

@@ -18,7 +18,7 @@ class MediaObjectTest : public testing::Test {
     VXMediaObjectRef movieAt(const std::string& path) {
         auto movie = std::make_shared<VXMediaObject>(VXMediaTypeMovie, "name", path);
         movie->setPath(path);
-        movie->setSpotlightProperties(VXMediaObject::spotlightProperties(path));
+        movie->setSpotlightPropertiesOfFile(path);
         return movie;
     }
 
@@ -138,6 +138,16 @@ TEST_F(StoredMetadataTest, PropertiesOfAFileThatTheIDDoesNotNameAreKept) {
     EXPECT_EQ(movie->spotlightProperties(), nullptr);
 }
 
+TEST_F(StoredMetadataTest, PropertiesOfAFileThatTheIDDoesNotNameCanBeAskedForByItsPath) {
+    const auto movie = movieAt(environment.home.writeFile("a.mov"));
+    movie->setSpotlightPropertiesOfFile(environment.home.writeFile("b.mov"));
+    const auto properties = movie->spotlightProperties();
+    EXPECT_EQ(fileName(*movie), platform::Value("b.mov"));
+    EXPECT_EQ(movie->spotlightProperties(), properties);
+    movie->setSpotlightPropertiesOfFile(environment.home.path("a.mov"));
+    EXPECT_EQ(fileName(*movie), platform::Value("a.mov"));
+}
+
 TEST_F(StoredMetadataTest, ThreadsThatAskForPropertiesAtOnceGetTheSameObject) {
     for (int round = 0; round < 100; ++round) {
         const auto movie = movieAt("/a.mov");
@@ -209,7 +219,7 @@ TEST(ItemOfAnEndedHost, KnowsItsNameAndNothingOfItsFile) {
         const HostServicesScope scope(
             {fake.pathWatcher, fake.imageManager, store, fake.thumbnails, fake.diagnostics});
         movie.setPath("/a.mov");
-        movie.setSpotlightProperties(VXMediaObject::spotlightProperties("/a.mov"));
+        movie.setSpotlightPropertiesOfFile("/a.mov");
     }
     EXPECT_EQ(movie.name(), "name");
     EXPECT_DOUBLE_EQ(movie.duration(), 0);
@@ -231,7 +241,7 @@ TEST(ItemOfAnEndedHost, OnAVolumeRaisesNothing) {
         const HostServicesScope scope(
             {fake.pathWatcher, fake.imageManager, store, fake.thumbnails, fake.diagnostics});
         movie.setPath(file);
-        movie.setSpotlightProperties(VXMediaObject::spotlightProperties(file));
+        movie.setSpotlightPropertiesOfFile(file);
         EXPECT_EQ(movie.spotlightProperties()->valueForKey(kMDItemFSName), std::nullopt);
     }
     EXPECT_EQ(movie.spotlightProperties()->valueForKey(kMDItemFSName), std::nullopt);
