@@ -1,8 +1,26 @@
 #include "framework/MediaObjectRegistry.h"
 
+#include <utility>
+
 #include "framework/TreeWalk.h"
 
 namespace vexo {
+
+namespace {
+
+std::vector<VXMediaObjectList> listsOfTree(const VXMediaGroupRef& root) {
+    std::vector<VXMediaObjectList> lists;
+    if (!root)
+        return lists;
+    visitGroups(root, [&lists](const VXMediaGroupRef& group) {
+        if (auto own = group->ownMediaObjects(); own && !own->empty())
+            lists.push_back(std::move(*own));
+        return true;
+    });
+    return lists;
+}
+
+}  // namespace
 
 // Items may live on, and another registry may come to lie where this one was.
 MediaObjectRegistry::~MediaObjectRegistry() {
@@ -14,34 +32,39 @@ MediaObjectRegistry::~MediaObjectRegistry() {
 }
 
 void MediaObjectRegistry::registerTree(const VXMediaGroupRef& root) {
-    visitGroups(root, [this](const VXMediaGroupRef& group) {
-        const VXMediaObjectList mediaObjects = group->ownMediaObjects().value_or(VXMediaObjectList());
+    std::vector<VXMediaObjectList> lists = listsOfTree(root);
+    platform::Locked lock(mutex_);
+    registerLatestTree();
+    latestTree_.swap(lists);
+}
+
+VXMediaObjectRef MediaObjectRegistry::objectForID(const std::string& ID) {
+    const std::size_t hash = VXMediaObject::hashOfID(ID);
+    platform::Locked lock(mutex_);
+    registerLatestTree();
+    return find(ID, hash);
+}
+
+void MediaObjectRegistry::registerLatestTree() {
+    for (const VXMediaObjectList& mediaObjects : latestTree_) {
         makeFirstRoom(mediaObjects.size());
         for (const VXMediaObjectRef& mediaObject : mediaObjects)
             registerObject(mediaObject);
-        return true;
-    });
+    }
+    latestTree_.clear();
 }
 
 // A root lists nearly all items of its tree, so the table of the first one need not grow by and by. It gets
 // room for twice as many: an item that isn't in it is then mostly told by an empty place.
 void MediaObjectRegistry::makeFirstRoom(std::size_t count) {
-    platform::Locked lock(mutex_);
     if (objects_.empty())
         objects_.reserve(2 * count);
-}
-
-VXMediaObjectRef MediaObjectRegistry::objectForID(const std::string& ID) const {
-    const std::size_t hash = VXMediaObject::hashOfID(ID);
-    platform::Locked lock(mutex_);
-    return find(ID, hash);
 }
 
 // Most items are in several lists, and most trees are those of before with a change.
 void MediaObjectRegistry::registerObject(const VXMediaObjectRef& mediaObject) {
     if (mediaObject->registry_.load(std::memory_order_relaxed) == this)
         return;
-    platform::Locked lock(mutex_);
     if (find(mediaObject->ID(), mediaObject->IDHash_))
         return;
     objects_.emplace(mediaObject->IDHash_, mediaObject);

@@ -192,8 +192,7 @@ VXMediaGroupRef VXMediaManager::rootMediaGroup() const {
 }
 
 void VXMediaManager::setRootMediaGroup(VXMediaGroupRef group) {
-    if (group)
-        state_->registry.registerTree(group);
+    state_->registry.registerTree(group);
     VXMediaGroupRef previous = group;  // freed outside the lock: a tree may be large
     {
         Locked lock(state_->mutex);

@@ -153,6 +153,41 @@ TEST_F(MediaManagerTest, ItemsAreFoundByTheirIDOnceTheirTreeIsInstalled) {
     EXPECT_EQ(manager->mediaObjectForID("/b.mov"), nullptr);
 }
 
+TEST_F(MediaManagerTest, AnItemOfATreeThatHasGoneIsFoundWhileItLives) {
+    auto item = newItem("/a.mov");
+    auto root = newRoot();
+    root->setMediaObjects({item});
+    manager->setRootMediaGroup(root);
+    root = nullptr;
+    manager->setRootMediaGroup(nullptr);
+    EXPECT_EQ(manager->mediaObjectForID("/a.mov"), item);
+    item = nullptr;
+    EXPECT_EQ(manager->mediaObjectForID("/a.mov"), nullptr);
+}
+
+TEST_F(MediaManagerTest, AnItemThatATreeChangedInPlaceNoLongerHoldsIsFoundWhileItLives) {
+    auto before = newItem("/a.mov");
+    const auto root = newRoot();
+    root->setMediaObjects({before});
+    manager->setRootMediaGroup(root);
+    root->setMediaObjects({newItem("/a.mov")});
+    manager->setRootMediaGroup(root);
+    EXPECT_EQ(manager->mediaObjectForID("/a.mov"), before);
+}
+
+TEST_F(MediaManagerTest, ItemsThatNobodyAskedForGoWithTheirTree) {
+    const auto root = newRoot();
+    const std::weak_ptr<VXMediaObject> item = [&] {
+        const auto made = newItem("/a.mov");
+        root->setMediaObjects({made});
+        return made;
+    }();
+    manager->setRootMediaGroup(root);
+    root->setMediaObjects({});
+    manager->setRootMediaGroup(root);
+    EXPECT_TRUE(item.expired());
+}
+
 TEST_F(MediaManagerTest, AGroupsOwnItemsAreRegisteredBeforeThoseOfItsChildren) {
     const auto root = newRoot();
     const auto child = newRoot();
