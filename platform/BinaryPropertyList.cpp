@@ -17,12 +17,12 @@ constexpr std::size_t trailerSize = 32;
 // The low half of a marker byte that says the count follows as a number of its own.
 constexpr unsigned countFollows = 0xF;
 
-unsigned highHalf(std::byte marker) {
-    return std::to_integer<unsigned>(marker) >> 4;
+unsigned highHalf(std::uint64_t marker) {
+    return static_cast<unsigned>(marker) >> 4;
 }
 
-unsigned lowHalf(std::byte marker) {
-    return std::to_integer<unsigned>(marker) & 0xF;
+unsigned lowHalf(std::uint64_t marker) {
+    return static_cast<unsigned>(marker) & 0xF;
 }
 
 std::string_view characters(std::span<const std::byte> bytes) {
@@ -72,8 +72,7 @@ BinaryPropertyList::Object BinaryPropertyList::objectAt(std::uint64_t offset) {
     if (offset < signature.size())
         throw PropertyListError("an object is outside the file");
     requireRoom(offset, 1, 1);
-    std::byte marker;
-    read(offset, {&marker, 1});
+    const std::uint64_t marker = number(offset, 1);
     const unsigned detail = lowHalf(marker);
     const std::uint64_t content = offset + 1;
     switch (highHalf(marker)) {
@@ -143,8 +142,7 @@ BinaryPropertyList::Object BinaryPropertyList::countedObject(Kind kind, std::siz
 // Reads the integer that begins at `offset` and moves `offset` behind it.
 std::uint64_t BinaryPropertyList::longCount(std::uint64_t& offset) {
     requireRoom(offset, 1, 1);
-    std::byte marker;
-    read(offset, {&marker, 1});
+    const std::uint64_t marker = number(offset, 1);
     const std::size_t width = std::size_t{1} << lowHalf(marker);
     if (highHalf(marker) != 0x1 || width > 8)
         throw PropertyListError("a count is no number");
@@ -155,7 +153,8 @@ std::uint64_t BinaryPropertyList::longCount(std::uint64_t& offset) {
 }
 
 void BinaryPropertyList::requireRoom(std::uint64_t offset, std::uint64_t count, std::size_t width) const {
-    if (offset > offsetTable_ || count > (offsetTable_ - offset) / width)
+    std::uint64_t size = 0;
+    if (offset > offsetTable_ || __builtin_mul_overflow(count, width, &size) || size > offsetTable_ - offset)
         throw PropertyListError("an object is outside the file");
 }
 
@@ -254,7 +253,14 @@ std::optional<BinaryPropertyList::Object> BinaryPropertyList::find(const Object&
     return std::nullopt;
 }
 
+// ASCII is the same in UTF-8, so it's compared where it lies.
 bool BinaryPropertyList::isText(const Object& object, std::string_view expected) {
+    if (object.kind == Kind::text && object.width == 1 && isASCII(expected)) {
+        if (object.count != expected.size())
+            return false;
+        if (const std::byte* found = bytes_.inLatestPage(object.offset, expected.size()))
+            return characters({found, expected.size()}) == expected;
+    }
     // No unit, of one byte or two, becomes more than three bytes of UTF-8.
     constexpr std::uint64_t mostBytesPerUnit = 3;
     return object.kind == Kind::text && object.count <= expected.size() &&
@@ -268,10 +274,13 @@ void BinaryPropertyList::read(std::uint64_t offset, std::span<std::byte> buffer)
 
 std::uint64_t BinaryPropertyList::number(std::uint64_t offset, std::size_t width) {
     std::array<std::byte, 8> buffer;
-    const std::span digits = std::span(buffer).first(width);
-    read(offset, digits);
+    const std::byte* digits = bytes_.inLatestPage(offset, width);
+    if (!digits) {
+        read(offset, std::span(buffer).first(width));
+        digits = buffer.data();
+    }
     std::uint64_t number = 0;
-    for (const std::byte digit : digits)
+    for (const std::byte digit : std::span(digits, width))
         number = number << 8 | std::to_integer<std::uint64_t>(digit);
     return number;
 }

@@ -10,6 +10,7 @@
 
 #include "platform/BinaryPropertyList.h"
 #include "platform/PropertyListWriters.h"
+#include "platform/Text.h"
 
 namespace platform {
 
@@ -34,10 +35,6 @@ std::size_t widthOf(std::uint64_t number) {
     if (number <= std::numeric_limits<std::uint16_t>::max())
         return 2;
     return number <= std::numeric_limits<std::uint32_t>::max() ? 4 : 8;
-}
-
-bool isASCII(std::string_view text) {
-    return std::ranges::all_of(text, [](char c) { return static_cast<unsigned char>(c) < 0x80; });
 }
 
 // The bytes of one file, growing.

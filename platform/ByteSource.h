@@ -68,6 +68,14 @@ class PageCache {
     std::uint64_t size() const { return size_; }
     // As ByteSource::read.
     [[nodiscard]] bool read(std::uint64_t offset, std::span<std::byte> buffer);
+    // The bytes themselves, where the page that was used last holds them all: most reads are of a few bytes
+    // near the last. nil elsewhere. Valid until the next read.
+    const std::byte* inLatestPage(std::uint64_t offset, std::size_t count) const {
+        const std::size_t start = offset % pageSize;
+        const bool isThere = latest_ && latest_->number == offset / pageSize && count <= pageSize - start &&
+                             offset < size_ && count <= size_ - offset;
+        return isThere ? latest_->bytes.data() + start : nullptr;
+    }
 
   private:
     struct Page {

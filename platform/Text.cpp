@@ -20,11 +20,6 @@ ComparisonResult resultOf(int order) {
     return order < 0 ? ComparisonResult::ascending : ComparisonResult::descending;
 }
 
-bool isASCII(std::string_view text) {
-    return std::all_of(text.begin(), text.end(),
-                       [](char byte) { return static_cast<signed char>(byte) >= 0; });
-}
-
 char foldedASCII(char letter) {
     return letter >= 'A' && letter <= 'Z' ? static_cast<char>(letter + ('a' - 'A')) : letter;
 }
@@ -53,6 +48,11 @@ bool isUTF8At(std::string_view text, std::size_t& index) {
 }
 
 }  // namespace
+
+bool isASCII(std::string_view text) {
+    return std::all_of(text.begin(), text.end(),
+                       [](char byte) { return static_cast<signed char>(byte) >= 0; });
+}
 
 ComparisonResult caseInsensitiveCompare(std::string_view a, std::string_view b) {
     if (isASCII(a) && isASCII(b))

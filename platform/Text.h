@@ -17,6 +17,7 @@ constexpr ComparisonResult opposite(ComparisonResult result) {
 // Compares by Unicode case folding and canonical equivalence, not by bytes and not by locale.
 ComparisonResult caseInsensitiveCompare(std::string_view a, std::string_view b);
 
+bool isASCII(std::string_view text);
 // The text with every byte sequence that is not UTF-8 replaced by U+FFFD.
 std::string validUTF8(std::string_view text);
 // Whether the text is well-formed UTF-8.
