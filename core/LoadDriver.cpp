@@ -75,20 +75,19 @@ VXReelixPlugin::Group VXReelixPlugin::performLoadData() {
 void VXReelixPlugin::_setMediaObjectsForRootMediaGroup(const Group& rootMediaGroup) {
     if (!rootMediaGroup)
         return;
-    Objects mediaObjects;
+    std::vector<vexo::VXMediaObjectList> lists;
     for (const Group& child : rootMediaGroup->childGroups()) {
         const auto& type = child->typeIdentifier();
         if (type == vexo::VXReelixProjectLibraryGroupTypeIdentifier)
             continue;
         if (type == vexo::VXReelixProjectGroupTypeIdentifier) {
             if (const Object representative = _representingMediaObjectForProject(child))
-                mediaObjects.push_back(representative);
+                lists.push_back({representative});
             continue;
         }
-        const vexo::VXMediaObjectList ofChild = child->mediaObjects();
-        mediaObjects.insert(mediaObjects.end(), ofChild.begin(), ofChild.end());
+        lists.push_back(child->mediaObjects());
     }
-    rootMediaGroup->setMediaObjects(vexo::VXMediaObjectList(std::move(mediaObjects)));
+    rootMediaGroup->setMediaObjects(vexo::VXMediaObjectList::joining(lists));
 }
 
 bool VXReelixPlugin::canLoadData() {

@@ -81,14 +81,7 @@ VXMediaObjectList VXMediaGroup::mediaObjects() const {
         return *own;
     std::vector<VXMediaObjectList> lists;
     addListsOfChildren(lists);
-    std::size_t count = 0;
-    for (const VXMediaObjectList& list : lists)
-        count += list.size();
-    std::vector<VXMediaObjectRef> gathered;
-    gathered.reserve(count);
-    for (const VXMediaObjectList& list : lists)
-        gathered.insert(gathered.end(), list.begin(), list.end());
-    return VXMediaObjectList(std::move(gathered));
+    return VXMediaObjectList::joining(lists);
 }
 
 void VXMediaGroup::addListsOfChildren(std::vector<VXMediaObjectList>& lists) const {

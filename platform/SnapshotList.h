@@ -36,6 +36,21 @@ class SnapshotList {
     template <typename Iterator>
     SnapshotList(Iterator first, Iterator last) : SnapshotList(std::vector<T>(first, last)) {}
 
+    // The elements of all lists, one list after another. Where one alone has any it is answered itself.
+    static SnapshotList joining(const std::vector<SnapshotList>& lists) {
+        std::size_t count = 0;
+        for (const SnapshotList& list : lists)
+            count += list.size();
+        const auto largest = std::ranges::max_element(lists, {}, &SnapshotList::size);
+        if (largest != lists.end() && largest->size() == count)
+            return *largest;
+        std::vector<T> elements;
+        elements.reserve(count);
+        for (const SnapshotList& list : lists)
+            elements.insert(elements.end(), list.begin(), list.end());
+        return SnapshotList(std::move(elements));
+    }
+
     std::size_t size() const { return count_; }
     bool empty() const { return count_ == 0; }
     const T& operator[](std::size_t index) const { return buffer_->slots[index]; }

@@ -131,6 +131,21 @@ TEST(SnapshotListTest, ThreadsMayAppendToCopiesOfOneList) {
     }
 }
 
+TEST(SnapshotListTest, ListsAreJoinedInTheirOrder) {
+    EXPECT_THAT(Numbers::joining({{1, 2}, {}, {3}, {4, 5}}), ElementsAre(1, 2, 3, 4, 5));
+    EXPECT_TRUE(Numbers::joining({}).empty());
+    EXPECT_TRUE(Numbers::joining({{}, {}}).empty());
+}
+
+TEST(SnapshotListTest, AListJoinedWithEmptyOnesIsThatList) {
+    const Numbers list{1, 2, 3};
+    const Numbers joined = Numbers::joining({{}, list, {}});
+    EXPECT_EQ(joined.begin(), list.begin());
+    EXPECT_EQ(joined.size(), 3u);
+    EXPECT_THAT(joined.appending(4), ElementsAre(1, 2, 3, 4));
+    EXPECT_EQ(list.size(), 3u);
+}
+
 TEST(SnapshotListTest, AReaderSeesAWholeListWhileItGrows) {
     constexpr int count = 5000;
     std::mutex guard;
