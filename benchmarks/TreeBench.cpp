@@ -184,28 +184,38 @@ void MemoryOfAClip(benchmark::State& state) {
 }
 BENCHMARK(MemoryOfAClip)->Args({100'000, 300'000})->Iterations(1)->Unit(benchmark::kSecond);
 
+// The processor time from a new clip's file to the tree that has it.
+std::chrono::nanoseconds reloadWithOneMore(LoadedHost& host, ClipLibrary& library) {
+    const int before = host.trees();
+    const auto start = bench::processorTime();
+    library.addClip(static_cast<int>(library.paths().size()));
+    if (!host.waitForTreeAfter(before) || host.root()->mediaObjects().size() != library.paths().size())
+        throw std::runtime_error("no tree with the new clip was published");
+    return bench::processorTime() - start;
+}
+
 // One clip more in a large library, from the file to the published tree, beyond the delay before it. The
-// floor is the processor time of the first load, without watching; the children of other branches must stay.
+// floor is the processor time of the first load, without watching. The first reload is not counted: the
+// metadata queries are still finding out what there is.
 void ReloadAfterOneChange(benchmark::State& state) {
     ClipLibrary& library = sharedLibrary();
-    const auto firstLoad = LoadedHost(library, Changes::ignored).loadTime();
     LoadedHost host(library, Changes::followed);
+    reloadWithOneMore(host, library);
+    std::chrono::nanoseconds floor{}, time{};
     for (auto _ : state) {
-        const int before = host.trees();
-        const auto start = bench::processorTime();
-        library.addClip(static_cast<int>(library.paths().size()));
-        if (!host.waitForTreeAfter(before))
-            return state.SkipWithError("no tree was published");
-        const auto time = bench::processorTime() - start;
-        if (host.root()->mediaObjects().size() != library.paths().size())
-            state.SkipWithError("the new clip is missing");
-        state.SetIterationTime(seconds(time));
-        state.counters["first_load_s"] = seconds(firstLoad);
-        state.counters["to_floor"] = seconds(time) / seconds(firstLoad);
-        state.counters["us_per_clip"] = seconds(time) * 1e6 / static_cast<double>(library.paths().size());
+        const auto firstLoad = LoadedHost(library, Changes::ignored).loadTime();
+        const auto reload = reloadWithOneMore(host, library);
+        state.SetIterationTime(seconds(reload));
+        floor += firstLoad;
+        time += reload;
     }
+    const auto iterations = static_cast<double>(state.iterations());
+    state.counters["first_load_s"] = seconds(floor) / iterations;
+    state.counters["to_floor"] = seconds(time) / seconds(floor);
+    state.counters["us_per_clip"] =
+        seconds(time) * 1e6 / iterations / static_cast<double>(library.paths().size());
 }
-BENCHMARK(ReloadAfterOneChange)->Iterations(3)->UseManualTime()->Unit(benchmark::kMillisecond);
+BENCHMARK(ReloadAfterOneChange)->Iterations(5)->UseManualTime()->Unit(benchmark::kMillisecond);
 
 // Publishing a tree again. The floor puts each ID into a table.
 void PublishATree(benchmark::State& state) {
