@@ -1,13 +1,13 @@
-// The items of a plug-in's trees by ID. The first item registered under an ID wins while it lives: items are
-// held weakly. Thread-safe.
+// The items of the tree that a plug-in has installed, by ID; the first in the tree's order with an ID counts.
+// Thread-safe.
 //
-// The table of a tree is made when somebody first asks for an item, or when the next tree comes: a load is
-// not kept waiting for one that nobody may need. Until then the tree's lists are kept.
+// The table is made when somebody first asks for an item of the tree: a load is not kept waiting for one that
+// nobody may need. The registry keeps the items that the tree had when it was installed until the next one
+// is.
 #pragma once
 
-#include <cstddef>
-#include <memory>
 #include <string>
+#include <string_view>
 #include <unordered_map>
 #include <vector>
 
@@ -18,28 +18,21 @@ namespace vexo {
 
 class MediaObjectRegistry {
   public:
-    MediaObjectRegistry() = default;
-    ~MediaObjectRegistry();
-    MediaObjectRegistry(const MediaObjectRegistry&) = delete;
-    MediaObjectRegistry& operator=(const MediaObjectRegistry&) = delete;
-
-    // Registers every item of a tree, a group's own items before those of its children; nil has none.
-    void registerTree(const VXMediaGroupRef& root) VX_EXCLUDES(mutex_);
-    // Gives up the memory of items that have gone: a weak reference keeps it.
-    void forgetVanished() VX_EXCLUDES(mutex_);
-    // nil when there is none, or when it has gone.
+    // Takes the place of the tree before, whose items are found no more. A group's own items come before
+    // those of its children; nil has none.
+    void setTree(const VXMediaGroupRef& root) VX_EXCLUDES(mutex_);
+    // nil when the tree has none.
     VXMediaObjectRef objectForID(const std::string& ID) VX_EXCLUDES(mutex_);
 
   private:
-    void registerLatestTree() VX_REQUIRES(mutex_);
-    void makeFirstRoom(std::size_t count) VX_REQUIRES(mutex_);
-    void registerObject(const VXMediaObjectRef& mediaObject) VX_REQUIRES(mutex_);
-    VXMediaObjectRef find(const std::string& ID, std::size_t hash) const VX_REQUIRES(mutex_);
+    using Table =
+        std::unordered_map<std::string_view, VXMediaObjectRef>;  // the keys are the items' own texts
+
+    void makeTable() VX_REQUIRES(mutex_);
 
     platform::Mutex mutex_;
-    std::vector<VXMediaObjectList> latestTree_ VX_GUARDED_BY(mutex_);  // until its items are in the table
-    // By the hash of the ID, so that no ID is stored twice.
-    std::unordered_multimap<std::size_t, std::weak_ptr<VXMediaObject>> objects_ VX_GUARDED_BY(mutex_);
+    std::vector<VXMediaObjectList> lists_ VX_GUARDED_BY(mutex_);  // that are not in the table yet
+    Table table_ VX_GUARDED_BY(mutex_);
 };
 
 }  // namespace vexo

@@ -192,16 +192,13 @@ VXMediaGroupRef VXMediaManager::rootMediaGroup() const {
 }
 
 void VXMediaManager::setRootMediaGroup(VXMediaGroupRef group) {
-    state_->registry.registerTree(group);
+    state_->registry.setTree(group);
     VXMediaGroupRef previous = group;  // freed outside the lock: a tree may be large
     {
         Locked lock(state_->mutex);
         state_->root.swap(previous);
     }
-    const bool wasOneBefore = previous != nullptr;
     previous = nullptr;
-    if (wasOneBefore)
-        state_->registry.forgetVanished();
     state_->observers.notify(group);
 }
 

@@ -1,7 +1,6 @@
 #include "host/VXMediaObject.h"
 
 #include <algorithm>
-#include <functional>
 #include <set>
 #include <utility>
 #include <vector>
@@ -58,11 +57,7 @@ std::optional<platform::Size> resolutionOf(const VXMetadataProperties& propertie
 }  // namespace
 
 VXMediaObject::VXMediaObject(int mediaType, std::string name, std::string objectID)
-    : ID_(std::move(objectID)), IDHash_(hashOfID(ID_)), mediaType_(mediaType), name_(std::move(name)) {}
-
-std::size_t VXMediaObject::hashOfID(const std::string& ID) {
-    return std::hash<std::string>{}(ID);
-}
+    : ID_(std::move(objectID)), mediaType_(mediaType), name_(std::move(name)) {}
 
 std::string VXMediaObject::name() const {
     Locked lock(mutex_);

@@ -126,8 +126,8 @@ class VXMediaManager : public VXPathObserver, public std::enable_shared_from_thi
     // newMediaObjectWithType:name:objectID:; the item is found by its ID once a tree that holds it is
     // installed.
     VXMediaObjectRef newMediaObjectWithType(int mediaType, std::string name, std::string objectID);
-    // mediaObjectForID:; the item registered under `ID`, nil when there is none or it has gone. The first
-    // item with an ID wins while it lives.
+    // mediaObjectForID:; the item of the installed tree with that ID, the first of several; nil when there is
+    // none. The first question after a tree was installed goes through all of it.
     VXMediaObjectRef mediaObjectForID(const std::string& ID) const;
 
     // localizedString:; nil for a key that the bundle lacks.

@@ -7,8 +7,6 @@
 // a second time.
 #pragma once
 
-#include <atomic>
-#include <cstddef>
 #include <memory>
 #include <optional>
 #include <string>
@@ -24,7 +22,6 @@
 
 namespace vexo {
 
-class MediaObjectRegistry;
 class VXMediaObject;
 using VXMediaObjectRef = std::shared_ptr<VXMediaObject>;
 
@@ -90,16 +87,8 @@ class VXMediaObject final {
     std::optional<platform::Value> metadataAttributeForKey(std::string_view key) const;
     const Attribute* findAttribute(std::string_view key) const VX_REQUIRES(mutex_);
 
-    friend class MediaObjectRegistry;
-
-    static std::size_t hashOfID(const std::string& ID);
-
     const std::string ID_;
-    const std::size_t IDHash_;  // worked out where the item is made, which several threads do at once
     const int mediaType_;
-    // The registry that answers this item for its ID, from then on and for as long as the item lives.
-    mutable std::atomic<const MediaObjectRegistry*> registry_ = nullptr;
-
     mutable platform::SmallMutex mutex_;
     int mediaSourceType_ VX_GUARDED_BY(mutex_) = 0;
     bool pathIsID_ VX_GUARDED_BY(mutex_) = false;
