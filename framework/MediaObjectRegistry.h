@@ -25,8 +25,8 @@ class MediaObjectRegistry {
     VXMediaObjectRef objectForID(const std::string& ID) VX_EXCLUDES(mutex_);
 
   private:
-    using Table =
-        std::unordered_map<std::string_view, VXMediaObjectRef>;  // the keys are the items' own texts
+    // The keys are the items' own texts.
+    using Table = std::unordered_map<std::string_view, VXMediaObjectRef>;
 
     void makeTable() VX_REQUIRES(mutex_);
 

@@ -152,6 +152,7 @@ std::uint64_t BinaryPropertyList::longCount(std::uint64_t& offset) {
     return number(digits, width);
 }
 
+// A product and no quotient: this is asked for each object, and dividing would be most of it.
 void BinaryPropertyList::requireRoom(std::uint64_t offset, std::uint64_t count, std::size_t width) const {
     std::uint64_t size = 0;
     if (offset > offsetTable_ || __builtin_mul_overflow(count, width, &size) || size > offsetTable_ - offset)

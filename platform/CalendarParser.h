@@ -46,8 +46,8 @@ class CalendarParser {
         int highest;
     };
 
-    // Each moves past what it reads and answers false when that is not there. What `runsOn` is followed by
-    // what could be taken for more of it.
+    // Each moves past what it reads and answers false when that is not there. With `runsOn`, what the format
+    // has next could be taken for more digits.
     bool readConversion(char letter, bool runsOn);
     bool readInLocale(char letter);
     bool readLiteral(std::string_view literal);
