@@ -35,7 +35,7 @@ class Texts final : public vexo::VXBundle {
 reelix::ClipNameTexts textsInZoneWithSummerTime() {
     require(setenv("TZ", "CET-1CEST,M3.5.0,M10.5.0/3", /*overwrite=*/1) == 0);
     const reelix::ClipNameTexts texts(reelix::VXReelixPlugin(std::make_shared<Texts>()));
-    require(!texts.format.empty() && !texts.displayFormat.empty());
+    require(!texts.format.pieces().empty() && !texts.displayFormat.pieces().empty());
     return texts;
 }
 
