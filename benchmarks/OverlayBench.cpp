@@ -1,5 +1,5 @@
-// What an overlay costs, made and drawn, beside what its shapes cost with Cairo alone, and beside a peer that
-// draws the same and has Pango lay out each text anew.
+// What an overlay costs, made and drawn over a thumbnail, beside what its shapes cost with Cairo alone, and
+// beside a peer that draws the same and has Pango lay out each text anew.
 //
 // The list imitated is one of a project library while it scrolls: thumbnails of 160 x 120 points, whose
 // movies last from one to some minutes.
@@ -7,6 +7,7 @@
 #include <fmt/format.h>
 #include <pango/pangocairo.h>
 
+#include <algorithm>
 #include <functional>
 #include <memory>
 #include <stdexcept>
@@ -20,6 +21,10 @@ namespace {
 constexpr int width = 160, height = 120;
 constexpr int bandHeight = 12, iconSide = 20;
 constexpr int durations = 100;  // the overlays in sight
+
+platform::Bitmap greyThumbnail() {
+    return {width, height, std::vector<std::uint32_t>(std::size_t(width) * height, 0xff404040)};
+}
 
 double microseconds(std::chrono::nanoseconds time) {
     return std::chrono::duration<double, std::micro>(time).count();
@@ -44,21 +49,18 @@ class BareShapes {
                                                   CAIRO_FORMAT_ARGB32, iconSide, iconSide, iconSide * 4)) {}
 
     template <typename DrawText>
-    std::vector<std::uint32_t> draw(const DrawText& drawText) const {
-        std::vector<std::uint32_t> pixels(std::size_t(width) * height);
-        const Owned<cairo_surface_t> surface(cairo_image_surface_create_for_data(
-            reinterpret_cast<unsigned char*>(pixels.data()), CAIRO_FORMAT_ARGB32, width, height, width * 4));
+    void draw(platform::Bitmap& thumbnail, const DrawText& drawText) const {
+        const Owned<cairo_surface_t> surface(
+            cairo_image_surface_create_for_data(reinterpret_cast<unsigned char*>(thumbnail.pixels.data()),
+                                                CAIRO_FORMAT_ARGB32, width, height, width * 4));
         const Owned<cairo_t> context(cairo_create(surface.get()));
         cairo_set_source_rgba(context.get(), 0, 0, 0, 0.5);
-        cairo_set_operator(context.get(), CAIRO_OPERATOR_SOURCE);  // the quicker one
         cairo_rectangle(context.get(), 0, height - bandHeight, width, bandHeight);
         cairo_fill(context.get());
-        cairo_set_operator(context.get(), CAIRO_OPERATOR_OVER);
         cairo_set_source_surface(context.get(), icon_.get(), 2, height - iconSide + 1);
         cairo_paint(context.get());
         cairo_set_source_rgb(context.get(), 1, 1, 1);
         drawText(context.get());
-        return pixels;
     }
 
   private:
@@ -117,22 +119,23 @@ class ReadyGlyphs {
     std::vector<cairo_glyph_t> glyphs_;
 };
 
-int whitePixelsOnTheRight(const std::vector<std::uint32_t>& pixels) {
+int whitePixelsOnTheRight(const platform::Bitmap& bitmap) {
     int count = 0;
     for (int y = height - bandHeight; y < height; ++y) {
         for (int x = width / 2; x < width; ++x)
-            count += (pixels[std::size_t(y * width + x)] & 255) > 200;
+            count += (bitmap.pixels[std::size_t(y * width + x)] & 255) > 200;
     }
     return count;
 }
 
 // Whether both drew a band, the icon, and about as much text.
-bool areAlike(const std::vector<std::uint32_t>& one, const std::vector<std::uint32_t>& other) {
+bool areAlike(const platform::Bitmap& one, const platform::Bitmap& other) {
     const int text = whitePixelsOnTheRight(one), otherText = whitePixelsOnTheRight(other);
-    if (one.size() != other.size() || text < 10 || otherText < text / 2 || otherText > text * 2)
+    if (text < 10 || otherText < text / 2 || otherText > text * 2)
         return false;
     for (std::size_t y = 0; y < height; ++y) {
-        if (!std::equal(&one[y * width], &one[y * width + width / 2], &other[y * width]))
+        const auto row = one.pixels.begin() + std::ptrdiff_t(y * width);
+        if (!std::equal(row, row + width / 2, other.pixels.begin() + std::ptrdiff_t(y * width)))
             return false;
     }
     return true;
@@ -156,9 +159,10 @@ class LoadedPlugin {
         return item;
     }
 
-    std::vector<std::uint32_t> overlay(const vexo::VXMediaObjectRef& item) const {
+    void drawOverlay(platform::Bitmap& thumbnail, const vexo::VXMediaObjectRef& item) const {
         const auto image = manager().thumbnailOverlayForMediaObject(item, {}, {width, height});
-        return image->picture()->draw(width, height).value().pixels;
+        if (!image->picture()->drawOver(thumbnail))
+            throw std::runtime_error("an overlay cannot be drawn");
     }
 
   private:
@@ -179,44 +183,50 @@ std::chrono::nanoseconds timeOf(const std::function<void()>& work) {
     return bench::processorTimeOfThread() - start;
 }
 
-// Makes and draws the overlays of a list again and again, as scrolling does. Processor time, which is less
-// disturbed by what else runs.
+// Makes and draws the overlays of a list again and again, as scrolling does. Processor time, and the quickest
+// list of each kind: what else the machine does can only add to so short a work.
 void MakeAndDrawOverlays(benchmark::State& state) {
     const LoadedPlugin plugin;
     const BareShapes shapes(*plugin.manager().iconNamed("MBReelixAppIconSmall")->picture());
     const Owned<PangoContext> context(pango_font_map_create_context(pango_cairo_font_map_get_default()));
     const ReadyGlyphs glyphs(context.get(), "2:05");
-    const auto drawBarely = [&] { return shapes.draw([&](cairo_t* cairo) { glyphs.draw(cairo); }); };
-    const auto drawWithPango = [&](const std::string& text) {
-        return shapes.draw([&](cairo_t* cairo) { PangoText(context.get(), text).draw(cairo); });
+    const auto drawBarely = [&](platform::Bitmap& thumbnail) {
+        shapes.draw(thumbnail, [&](cairo_t* cairo) { glyphs.draw(cairo); });
     };
-    const auto expected = plugin.overlay(plugin.movie(125));
-    if (!areAlike(drawBarely(), expected) || !areAlike(drawWithPango("2:05"), expected))
+    const auto drawWithPango = [&](platform::Bitmap& thumbnail, const std::string& text) {
+        shapes.draw(thumbnail, [&](cairo_t* cairo) { PangoText(context.get(), text).draw(cairo); });
+    };
+    platform::Bitmap thumbnail = greyThumbnail(), barely = thumbnail, withPango = thumbnail;
+    drawBarely(barely);
+    drawWithPango(withPango, "2:05");
+    plugin.drawOverlay(thumbnail, plugin.movie(125));
+    if (!areAlike(barely, thumbnail) || !areAlike(withPango, thumbnail))
         return state.SkipWithError("the overlay is not what the others draw");
     std::vector<vexo::VXMediaObjectRef> movies;
     for (int i = 0; i < durations; ++i)
         movies.push_back(plugin.movie(60 + 3 * i));
 
-    std::chrono::nanoseconds time{}, floor{}, pango{};
+    auto time = std::chrono::nanoseconds::max(), floor = time, pango = time;
     for (auto _ : state) {
-        floor += timeOf([&] {
+        const auto floorOfList = timeOf([&] {
             for (int i = 0; i < durations; ++i)
-                benchmark::DoNotOptimize(drawBarely());
+                drawBarely(thumbnail);
         });
-        pango += timeOf([&] {
+        const auto pangoOfList = timeOf([&] {
             for (int i = 0; i < durations; ++i)
-                benchmark::DoNotOptimize(drawWithPango(fmt::format("{}:{:02}", 1 + i / 20, i * 3 % 60)));
+                drawWithPango(thumbnail, fmt::format("{}:{:02}", 1 + i / 20, i * 3 % 60));
         });
         const auto ours = timeOf([&] {
             for (const auto& movie : movies)
-                benchmark::DoNotOptimize(plugin.overlay(movie));
+                plugin.drawOverlay(thumbnail, movie);
         });
         state.SetIterationTime(std::chrono::duration<double>(ours).count());
-        time += ours;
+        time = std::min(time, ours);
+        floor = std::min(floor, floorOfList);
+        pango = std::min(pango, pangoOfList);
     }
-    const double count = durations * double(state.iterations());
-    state.counters["us_per_overlay"] = microseconds(time) / count;
-    state.counters["floor_us"] = microseconds(floor) / count;
+    state.counters["us_per_overlay"] = microseconds(time) / durations;
+    state.counters["floor_us"] = microseconds(floor) / durations;
     state.counters["to_floor"] = microseconds(time) / microseconds(floor);
     state.counters["to_pango"] = microseconds(time) / microseconds(pango);
 }

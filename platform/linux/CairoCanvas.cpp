@@ -9,6 +9,11 @@ bool isDrawableSize(double width, double height) {
            width * height <= largestArea;
 }
 
+bool isWhole(const Bitmap& bitmap) {
+    return isDrawableSize(bitmap.width, bitmap.height) &&
+           bitmap.pixels.size() == std::size_t(bitmap.width) * std::size_t(bitmap.height);
+}
+
 CairoSurface surfaceOf(const Bitmap& bitmap) {
     // Cairo takes no const pixels; a surface that is only read from leaves them alone.
     auto* pixels = reinterpret_cast<unsigned char*>(const_cast<std::uint32_t*>(bitmap.pixels.data()));

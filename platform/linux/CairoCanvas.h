@@ -23,6 +23,21 @@ bool isDrawableSize(double width, double height);
 // A surface that shows the bitmap's own pixels. Requires: the bitmap is whole and outlives the surface.
 CairoSurface surfaceOf(const Bitmap& bitmap);
 
+// Whether the bitmap has all its pixels and is of a size that is drawn.
+bool isWhole(const Bitmap& bitmap);
+
+// Draws with `drawContent`, which sees an area of `contentSize`, over the bitmap. NO when `drawContent`
+// answers that or Cairo has failed. Requires: the bitmap is whole; isDrawableSize(contentSize).
+template <typename DrawContent>
+bool paintOver(Bitmap& bitmap, Size contentSize, const DrawContent& drawContent) {
+    const CairoSurface surface = surfaceOf(bitmap);
+    const CairoContext context(cairo_create(surface.get()));
+    cairo_scale(context.get(), bitmap.width / contentSize.width, bitmap.height / contentSize.height);
+    const bool isDrawn = drawContent(context.get()) && cairo_status(context.get()) == CAIRO_STATUS_SUCCESS;
+    cairo_surface_flush(surface.get());
+    return isDrawn;
+}
+
 // What `drawContent` draws on an area of `contentSize`, as a bitmap of the given pixels; nil for a size that
 // is not drawn, or when `drawContent` answers NO. Requires: isDrawableSize(contentSize).
 template <typename DrawContent>
@@ -30,12 +45,8 @@ std::optional<Bitmap> paint(int width, int height, Size contentSize, const DrawC
     if (!isDrawableSize(width, height))
         return std::nullopt;
     Bitmap bitmap{width, height, std::vector<std::uint32_t>(std::size_t(width) * std::size_t(height))};
-    const CairoSurface surface = surfaceOf(bitmap);
-    const CairoContext context(cairo_create(surface.get()));
-    cairo_scale(context.get(), width / contentSize.width, height / contentSize.height);
-    if (!drawContent(context.get()) || cairo_status(context.get()) != CAIRO_STATUS_SUCCESS)
+    if (!paintOver(bitmap, contentSize, drawContent))
         return std::nullopt;
-    cairo_surface_flush(surface.get());
     return bitmap;
 }
 

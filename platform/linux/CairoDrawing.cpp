@@ -48,10 +48,16 @@ bool holds(const Rect& rect, Size size) {
     return size.width <= rect.width && size.height <= rect.height;
 }
 
-// Plays steps back, on an area of `size` points that the context has scaled to pixels.
+// Plays steps back, on an area of `size` points that the context has scaled to pixels. On clear ground a
+// rectangle replaces what is there.
 class Player {
   public:
-    Player(cairo_t* context, Size size) : context_(context), size_(size) {
+    enum class Ground { clear, picture };
+
+    Player(cairo_t* context, Size size, Ground ground)
+        : context_(context),
+          size_(size),
+          rectOperator_(ground == Ground::clear ? CAIRO_OPERATOR_SOURCE : CAIRO_OPERATOR_OVER) {
         cairo_user_to_device_distance(context, &pixelsPerPointX_, &pixelsPerPointY_);
     }
 
@@ -60,7 +66,7 @@ class Player {
         if (isEmpty(rect))
             return;
         setColor(step.color);
-        cairo_set_operator(context_, CAIRO_OPERATOR_SOURCE);
+        cairo_set_operator(context_, rectOperator_);
         cairo_rectangle(context_, rect.x, top(rect), rect.width, rect.height);
         cairo_fill(context_);
         cairo_set_operator(context_, CAIRO_OPERATOR_OVER);
@@ -138,6 +144,7 @@ class Player {
 
     cairo_t* const context_;
     const Size size_;
+    const cairo_operator_t rectOperator_;
     double pixelsPerPointX_ = 1, pixelsPerPointY_ = 1;
 };
 
@@ -155,15 +162,38 @@ class Drawing::Recording final : public Picture {
     std::optional<Bitmap> draw(int width, int height) const override {
         if (!isDrawable())
             return std::nullopt;
-        return paint(width, height, size_, [this](cairo_t* context) {
-            const Player player(context, size_);
-            for (const Step& step : steps_)
-                std::visit(player, step);
-            return true;
-        });
+        return paint(width, height, size_,
+                     [this](cairo_t* context) { return play(context, Player::Ground::clear); });
+    }
+    bool drawOver(Bitmap& bitmap) const override {
+        if (!isDrawable() || !isWhole(bitmap) || takesAway())
+            return Picture::drawOver(bitmap);
+        return paintOver(bitmap, size_,
+                         [this](cairo_t* context) { return play(context, Player::Ground::picture); });
     }
 
   private:
+    bool play(cairo_t* context, Player::Ground ground) const {
+        const Player player(context, size_, ground);
+        for (const Step& step : steps_)
+            std::visit(player, step);
+        return true;
+    }
+    // Whether a rectangle that one can see through replaces what was drawn before. Over a picture it would
+    // have to take that away and leave the picture.
+    bool takesAway() const {
+        bool isClear = true;
+        for (const Step& step : steps_) {
+            if (isEmpty(partInside(size_, std::visit([](const auto& any) { return any.rect; }, step))))
+                continue;
+            const auto* fill = std::get_if<FilledRect>(&step);
+            if (!isClear && fill && !(fill->color.alpha >= 1))
+                return true;
+            isClear = false;
+        }
+        return false;
+    }
+
     static constexpr std::size_t usualSteps = 4;  // of an overlay
 
     const Size size_;

@@ -207,12 +207,17 @@ cairo_status_t appendBytes(void* closure, const unsigned char* buffer, unsigned 
     return CAIRO_STATUS_NO_MEMORY;  // no exception may pass through Cairo
 }
 
-bool isWhole(const Bitmap& bitmap) {
-    return isDrawableSize(bitmap.width, bitmap.height) &&
-           bitmap.pixels.size() == std::size_t(bitmap.width) * std::size_t(bitmap.height);
-}
-
 }  // namespace
+
+bool Picture::drawOver(Bitmap& bitmap) const {
+    const auto drawn = isWhole(bitmap) ? draw(bitmap.width, bitmap.height) : std::nullopt;
+    return drawn && paintOver(bitmap, {double(bitmap.width), double(bitmap.height)}, [&](cairo_t* context) {
+               const CairoSurface surface = surfaceOf(*drawn);
+               cairo_set_source_surface(context, surface.get(), 0, 0);
+               cairo_paint(context);
+               return true;
+           });
+}
 
 std::shared_ptr<const Picture> pictureWithData(std::span<const std::byte> data) {
     if (isPNG(data)) {

@@ -5,6 +5,7 @@
 
 #include "framework/DurationBadge.h"
 #include "platform/Drawing.h"
+#include "tests/support/Pixels.h"
 #include "tests/support/PluginTest.h"
 
 namespace reelix {
@@ -13,6 +14,9 @@ namespace {
 using platform::Bitmap;
 using platform::ImageRef;
 using platform::Size;
+using testing_support::areAlike;
+using testing_support::blended;
+using testing_support::channel;
 using vexo::VXMediaObjectRef;
 
 constexpr double infinity = std::numeric_limits<double>::infinity();
@@ -24,29 +28,6 @@ std::uint32_t& pixel(Bitmap& bitmap, int x, int y) {
 
 std::uint32_t pixel(const Bitmap& bitmap, int x, int y) {
     return bitmap.pixels[std::size_t(y * bitmap.width + x)];
-}
-
-std::uint32_t channel(std::uint32_t pixel, int shift) {
-    return pixel >> shift & 255;
-}
-
-// One pixel over another, both premultiplied.
-std::uint32_t blended(std::uint32_t over, std::uint32_t under) {
-    std::uint32_t result = 0;
-    for (int shift = 0; shift < 32; shift += 8) {
-        const std::uint32_t shown = (channel(under, shift) * (255 - (over >> 24)) + 127) / 255;
-        result |= (channel(over, shift) + shown) << shift;
-    }
-    return result;
-}
-
-// Alike but for what two ways to round can make of it.
-bool areAlike(std::uint32_t one, std::uint32_t other) {
-    for (int shift = 0; shift < 32; shift += 8) {
-        if (std::abs(int(channel(one, shift)) - int(channel(other, shift))) > 2)
-            return false;
-    }
-    return true;
 }
 
 // In pixels from the upper left corner, right and bottom excluded.

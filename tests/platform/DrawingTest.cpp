@@ -15,6 +15,8 @@ namespace {
 
 using testing::Each;
 using testing::Not;
+using testing_support::areAlike;
+using testing_support::blended;
 using testing_support::infinity;
 using testing_support::notANumber;
 using testing_support::opaqueBlue;
@@ -313,6 +315,77 @@ TEST(Drawing, KeepsNoMoreTextThanAFew) {
     for (int i = 0; i < 1000; ++i)
         ASSERT_GT(boldText(std::to_string(i)).size().width, 0);
     EXPECT_EQ(boldText("0").size(), first);
+}
+
+// What laying a drawing over a picture is to come to.
+Bitmap laidOver(Bitmap ground, const Picture& picture) {
+    const Bitmap drawn = picture.draw(ground.width, ground.height).value();
+    for (std::size_t i = 0; i < drawn.pixels.size(); ++i)
+        ground.pixels[i] = blended(drawn.pixels[i], ground.pixels[i]);
+    return ground;
+}
+
+Bitmap redAndBlueGround(int width, int height) {
+    Bitmap ground{width, height, {}};
+    for (int i = 0; i < width * height; ++i)
+        ground.pixels.push_back(i % 3 == 0 ? opaqueRed : i % 3 == 1 ? opaqueBlue : 0x40204010);
+    return ground;
+}
+
+void expectLaidOverAsDrawn(const Picture& picture) {
+    for (const auto& [width, height] : {std::pair(40, 20), std::pair(80, 40), std::pair(31, 17)}) {
+        Bitmap bitmap = redAndBlueGround(width, height);
+        const Bitmap expected = laidOver(bitmap, picture);
+        ASSERT_TRUE(picture.drawOver(bitmap));
+        for (std::size_t i = 0; i < expected.pixels.size(); ++i)
+            ASSERT_TRUE(areAlike(bitmap.pixels[i], expected.pixels[i]))
+                << i % std::size_t(width) << ", " << i / std::size_t(width) << " of " << width << std::hex
+                << ": " << bitmap.pixels[i] << ", not " << expected.pixels[i];
+    }
+}
+
+TEST(Drawing, LiesOverAPictureAsIfItWereDrawnByItself) {
+    Drawing drawing({40, 20});
+    drawing.setColor({0, 0, 0, 0.5});
+    drawing.fillRect({0, 0, 40, 6});
+    drawing.drawImage(redBesideBlueImage(), {2, 1, 10, 10});
+    drawing.setColor(red);
+    drawing.fillRect({4, 3, 10, 10});
+    drawing.setColor({1, 1, 0, 0.25});
+    drawing.fillRoundedRect({20, 2, 15, 12}, 4);
+    drawing.drawString(boldText("2:05"), {18, 2, 40, 15});
+    expectLaidOverAsDrawn(*drawing.image()->picture());
+}
+
+TEST(Drawing, WhatARectangleReplacedIsNotSeenOverAPictureEither) {
+    Drawing drawing({40, 20});
+    drawing.drawImage(redBesideBlueImage(), {0, 0, 30, 20});
+    drawing.setColor({0, 0, 0, 0.5});
+    drawing.fillRect({10, 5, 20, 10});
+    drawing.setColor(clear);
+    drawing.fillRect({12, 7, 5, 5});
+    expectLaidOverAsDrawn(*drawing.image()->picture());
+}
+
+TEST(Drawing, EveryPictureLiesOverAnother) {
+    expectLaidOverAsDrawn(*pictureWithBitmap({2, 1, {0x80400000, opaqueBlue}}));
+    expectLaidOverAsDrawn(*Drawing({6, 4}).image()->picture());
+}
+
+TEST(Drawing, LiesOverNothingThatIsNoBitmap) {
+    Drawing drawing({40, 20});
+    drawing.fillRect({0, 0, 40, 20});
+    const ImageRef image = drawing.image();
+    for (const Bitmap& broken : {Bitmap{}, Bitmap{4, 4, {1, 2, 3}}, Bitmap{-1, -1, {1}}}) {
+        Bitmap bitmap = broken;
+        EXPECT_FALSE(image->picture()->drawOver(bitmap));
+        EXPECT_FALSE(pictureWithBitmap({1, 1, {opaqueRed}})->drawOver(bitmap));
+        EXPECT_EQ(bitmap.pixels, broken.pixels);
+    }
+    Bitmap bitmap = redAndBlueGround(4, 4);
+    EXPECT_FALSE(Drawing({0, 4}).image()->picture()->drawOver(bitmap));
+    EXPECT_FALSE(pictureWithBitmap({})->drawOver(bitmap));
+    EXPECT_EQ(bitmap.pixels, redAndBlueGround(4, 4).pixels);
 }
 
 TEST(Drawing, IsMadeAndDrawnOnManyThreadsAtOnce) {

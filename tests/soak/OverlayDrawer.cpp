@@ -1,5 +1,6 @@
 #include "tests/soak/Actors.h"
 #include "tests/soak/TreePick.h"
+#include "tests/support/Pixels.h"
 
 namespace soak {
 namespace {
@@ -22,7 +23,8 @@ class OverlayDrawer final : public Actor {
             return false;
         const auto overlay = managerOf(host_).thumbnailOverlayForMediaObject(
             picked.item, {picked.group}, {double(64 + chance.below(200)), 96});
-        return overlay && overlay->picture()->draw(128, 96);
+        platform::Bitmap thumbnail = testing_support::plainBitmap(128, 96);
+        return overlay && overlay->picture()->drawOver(thumbnail);
     }
 
     vexo::Host& host_;
