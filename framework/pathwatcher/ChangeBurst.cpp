@@ -7,7 +7,7 @@ namespace vexo {
 void ChangeBurst::add(const std::string& watchedPath, std::string changedPath) {
     if (!latest_ || latest_->first != watchedPath)
         latest_ = &*changes_.try_emplace(watchedPath).first;
-    latest_->second.insert(std::move(changedPath));
+    latest_->second.push_back(std::move(changedPath));
 }
 
 void ChangeBurst::timeIs(Time now) {

@@ -1,5 +1,5 @@
-// What was seen to change since observers were last told, by the watched path that it was seen through. Each
-// path counts once.
+// What was seen to change since observers were last told, by the watched path that it was seen through. A
+// path that changed again and again may be there several times.
 //
 // Changes come in crowds: one saved project is dozens of events. So they are kept for a moment, counted from
 // the first, and then given out together. Knows no clock: the time is told.
@@ -10,14 +10,14 @@
 #include <map>
 #include <optional>
 #include <string>
-#include <unordered_set>
+#include <vector>
 
 namespace vexo {
 
 class ChangeBurst {
   public:
     using Time = std::chrono::steady_clock::time_point;
-    using Paths = std::unordered_set<std::string>;
+    using Paths = std::vector<std::string>;
     using Changes = std::map<std::string, Paths>;
 
     static constexpr std::chrono::milliseconds length{50};

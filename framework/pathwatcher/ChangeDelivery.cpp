@@ -1,6 +1,7 @@
 #include "framework/pathwatcher/ChangeDelivery.h"
 
 #include <algorithm>
+#include <iterator>
 #include <string>
 #include <utility>
 #include <vector>
@@ -16,21 +17,30 @@ namespace {
 
 constexpr double normalPriority = 0.5;
 
-std::vector<std::string> sorted(ChangeBurst::Paths paths) {
-    std::vector<std::string> list;
-    list.reserve(paths.size());
-    while (!paths.empty())
-        list.push_back(std::move(paths.extract(paths.begin()).value()));
-    std::sort(list.begin(), list.end());
-    return list;
+// What a subscriber that takes its time may have waiting besides as many as there are distinct paths.
+constexpr std::size_t mostRepetitions = 10'000;
+
+void sortWithoutRepetitions(ChangeBurst::Paths& paths) {
+    std::sort(paths.begin(), paths.end());
+    paths.erase(std::unique(paths.begin(), paths.end()), paths.end());
 }
 
 }  // namespace
 
-void ChangeDelivery::add(const Subscriber& subscriber, const ChangeBurst::Paths& changedPaths) {
+void ChangeDelivery::add(const Subscriber& subscriber, ChangeBurst::Paths changedPaths) {
     Locked lock(mutex_);
-    if (!closed_)
-        waiting_[subscriber].insert(changedPaths.begin(), changedPaths.end());
+    if (closed_)
+        return;
+    Report& report = waiting_[subscriber];
+    if (report.paths.empty()) {
+        report.paths = std::move(changedPaths);
+        return;
+    }
+    std::move(changedPaths.begin(), changedPaths.end(), std::back_inserter(report.paths));
+    if (report.paths.size() > mostRepetitions + 2 * report.distinct) {
+        sortWithoutRepetitions(report.paths);
+        report.distinct = report.paths.size();
+    }
 }
 
 void ChangeDelivery::begin() {
@@ -50,8 +60,10 @@ void ChangeDelivery::close() {
 }
 
 void ChangeDelivery::deliver() {
-    while (auto report = takeNext())
-        report.key().hear(sorted(std::move(report.mapped())));
+    while (auto report = takeNext()) {
+        sortWithoutRepetitions(report.mapped().paths);
+        report.key().hear(report.mapped().paths);
+    }
 }
 
 ChangeDelivery::Reports::node_type ChangeDelivery::takeNext() {

@@ -14,15 +14,19 @@ namespace vexo {
 
 class ChangeDelivery : public std::enable_shared_from_this<ChangeDelivery> {
   public:
-    // A path that waits for a subscriber already is told once.
-    void add(const Subscriber& subscriber, const ChangeBurst::Paths& changedPaths) VX_EXCLUDES(mutex_);
+    // A path that comes again before the subscriber was told is told once.
+    void add(const Subscriber& subscriber, ChangeBurst::Paths changedPaths) VX_EXCLUDES(mutex_);
     // Tells what was added. Requires: a platform::ServicesScope exists.
     void begin() VX_EXCLUDES(mutex_);
     // Nobody is told of anything any more; a call in progress goes on.
     void close() VX_EXCLUDES(mutex_);
 
   private:
-    using Reports = std::map<Subscriber, ChangeBurst::Paths>;
+    struct Report {
+        ChangeBurst::Paths paths;
+        std::size_t distinct = 0;  // of them, when it was last counted
+    };
+    using Reports = std::map<Subscriber, Report>;
 
     void deliver() VX_EXCLUDES(mutex_);
     // Empty when nothing waits; the thread is then to end.

@@ -124,13 +124,19 @@ ChangeBurst::Changes ChangeFollower::takeIn(const News& news) {
     return burst.isDue(Clock::now()) ? burst.take() : ChangeBurst::Changes();
 }
 
-void ChangeFollower::handOut(const ChangeBurst::Changes& changes) {
-    for (const auto& [watchedPath, changedPaths] : changes) {
-        const std::vector<Subscriber> subscribers = registrations_->subscribersOf(watchedPath);
+// The last subscriber gets the paths themselves; mostly there is but one.
+void ChangeFollower::handOut(ChangeBurst::Changes changes) {
+    for (auto& [watchedPath, changedPaths] : changes) {
+        std::vector<Subscriber> subscribers = registrations_->subscribersOf(watchedPath);
+        if (subscribers.empty()) {
+            forgetUnwanted(watchedPath);
+            continue;
+        }
+        const Subscriber last = std::move(subscribers.back());
+        subscribers.pop_back();
         for (const Subscriber& subscriber : subscribers)
             delivery_->add(subscriber, changedPaths);
-        if (subscribers.empty())
-            forgetUnwanted(watchedPath);
+        delivery_->add(last, std::move(changedPaths));
     }
     delivery_->begin();
     for (const std::string& warning : takeWarnings())

@@ -57,7 +57,7 @@ class ChangeFollower {
     std::chrono::milliseconds untilDue() const VX_EXCLUDES(mutex_);
     void letEventsGather() const;
     ChangeBurst::Changes takeIn(const News& news) VX_EXCLUDES(mutex_);
-    void handOut(const ChangeBurst::Changes& changes) VX_EXCLUDES(mutex_);
+    void handOut(ChangeBurst::Changes changes) VX_EXCLUDES(mutex_);
     std::vector<std::string> takeWarnings() VX_EXCLUDES(mutex_);
     void forgetUnwanted(const std::string& path) VX_EXCLUDES(mutex_);
 

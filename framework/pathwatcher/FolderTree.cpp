@@ -123,7 +123,7 @@ void FolderTree::heardOfContent(Folder& folder, const FileEvent& event) {
         return;
     if (tellsOfOtherFiles(event.name) || (folder.package && !typeOfFile(event.name).isMovie))
         return markChanged(folder);
-    means_.burst.add(reportedPath_, platform::path::appending(pathBelow(reportedPath_, folder), event.name));
+    means_.burst.add(reportedPath_, pathBelow(reportedPath_, folder, event.name));
 }
 
 // Writing a file is several events in a row, which say the same to a burst.
@@ -131,7 +131,9 @@ bool FolderTree::isContentKnown(const Folder& folder, std::string_view name) {
     const std::uint64_t burst = means_.burst.number();
     if (latestContent_.folder == &folder && latestContent_.burst == burst && latestContent_.name == name)
         return true;
-    latestContent_ = {&folder, std::string(name), burst};
+    latestContent_.folder = &folder;
+    latestContent_.name = name;
+    latestContent_.burst = burst;
     return false;
 }
 
@@ -322,18 +324,25 @@ void FolderTree::markChanged(Folder& folder) {
         means_.burst.add(reportedPath_, pathBelow(reportedPath_, reported));
 }
 
-std::string FolderTree::pathBelow(const std::string& base, const Folder& folder) const {
-    std::size_t length = base.size();
+std::string FolderTree::pathBelow(const std::string& base, const Folder& folder,
+                                  std::string_view entry) const {
+    const std::string_view start = base == "/" ? std::string_view() : base;
+    std::size_t length = start.size() + (entry.empty() ? 0 : entry.size() + 1);
     for (const Folder* each = &folder; each->parent; each = each->parent)
         length += each->name.size() + 1;
+    if (length == 0)
+        return base;
     std::string path(length, '/');
-    base.copy(path.data(), base.size());
-    for (const Folder* each = &folder; each->parent; each = each->parent) {
-        length -= each->name.size();
-        each->name.copy(path.data() + length, each->name.size());
-        --length;
-    }
-    return base == "/" && folder.parent ? path.substr(1) : path;
+    const auto putBefore = [&](std::size_t end, std::string_view name) {
+        name.copy(path.data() + end - name.size(), name.size());
+        return end - name.size();
+    };
+    putBefore(start.size(), start);
+    if (!entry.empty())
+        length = putBefore(length, entry) - 1;
+    for (const Folder* each = &folder; each->parent; each = each->parent)
+        length = putBefore(length, each->name) - 1;
+    return path;
 }
 
 // The folder at the path, or the last known one on the way to it.

@@ -81,7 +81,8 @@ class FolderTree {
 
     void markChanged(Folder& folder);
     std::string whyPolled(const Folder& folder) const;
-    std::string pathBelow(const std::string& base, const Folder& folder) const;
+    // The path of the folder, or of an entry in it, where the tree is at `base`.
+    std::string pathBelow(const std::string& base, const Folder& folder, std::string_view entry = {}) const;
     Folder& deepestKnown(const std::string& path, bool& isExact) const;
     template <typename Visit>
     void visitAll(Visit visit) const;

@@ -139,6 +139,28 @@ TEST_F(Reporting, WhatComesWhileAnObserverIsToldIsToldInOneGo) {
     EXPECT_EQ(environment.dispatcher.requests().size(), 1u);
 }
 
+TEST_F(Reporting, FilesThatAreWrittenToInTurnsAreToldOnceEach) {
+    const std::string a = folder.writeFile("a.mov"), b = folder.writeFile("b.mov");
+    watch(folder.path());
+    for (int i = 0; i < 10; ++i) {
+        folder.writeFile("a.mov", "content");
+        folder.writeFile("b.mov", "content");
+    }
+    settle();
+    EXPECT_THAT(observer->calls, ElementsAre(a, b));
+}
+
+// The paths of an observer that takes its time, sorted out on the way so that they don't pile up.
+TEST_F(Reporting, WhatChangesAgainAndAgainBeforeAnObserverIsToldIsToldOnce) {
+    watcher();
+    const auto delivery = std::make_shared<vexo::ChangeDelivery>();
+    for (int round = 0; round < 20'000; ++round)
+        delivery->add(vexo::Subscriber(observer), {"/b", "/a", "/" + std::to_string(round % 3)});
+    delivery->begin();
+    environment.dispatcher.runDueBlocks();
+    EXPECT_THAT(observer->calls, ElementsAre("/0", "/1", "/2", "/a", "/b"));
+}
+
 TEST_F(Reporting, AfterClosingWhatWaitsIsDropped) {
     watch(folder.path());
     folder.makeFolder("x");
