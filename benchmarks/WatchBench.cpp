@@ -109,19 +109,53 @@ class ToolsLoop {
     }
 };
 
-// Makes a file, writes to it and renames it, again and again, all over the folders: `count` operations.
-void storm(const std::vector<std::string>& folders, long count) {
-    for (long i = 0; i < count / 3; ++i) {
-        const std::string& folder = folders[static_cast<std::size_t>(i) % folders.size()];
-        const std::string name = folder + "/" + std::to_string(i);
-        const int file = open(name.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600);
-        if (file < 0 || write(file, "x", 1) != 1)
-            _exit(1);
-        close(file);
-        if (rename(name.c_str(), (name + ".mov").c_str()) != 0)
+// A hundred folders of files for a storm, which makes none itself: how long a file system takes to make a
+// million, and what that does to everything else, differs from one minute to the next.
+class StormGround {
+  public:
+    StormGround() : folders_(folder_.makeFolders(100)) {
+        for (long i = 0; i < files; ++i)
+            close(open(nameOf(i).c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600));
+    }
+
+    const std::string& path() const { return folder_.path(); }
+    const std::vector<std::string>& folders() const { return folders_; }
+
+    // Writes to each file, changes its rights and renames it, ten times over and in another process: a
+    // million operations. Everything is then as it was before.
+    void storm() const {
+        bench::runInChild([&] {
+            for (int round = 0; round < 10; ++round)
+                for (long file = 0; file < files; ++file) {
+                    disturb(file, round % 2 == 0);
+                    if (file % filesBetweenPauses == 0)
+                        std::this_thread::sleep_for(20ms);
+                }
+        });
+    }
+
+  private:
+    static constexpr long files = 33'334;
+    static constexpr long filesBetweenPauses = 300;
+
+    std::string nameOf(long file) const {
+        return folders_[static_cast<std::size_t>(file) % folders_.size()] + "/" + std::to_string(file);
+    }
+    void disturb(long file, bool becomesMovie) const {
+        std::string name = nameOf(file), next = name + ".mov";
+        if (!becomesMovie)
+            name.swap(next);
+        const int descriptor = open(name.c_str(), O_WRONLY | O_CLOEXEC);
+        const bool isWritten = descriptor >= 0 && write(descriptor, "x", 1) == 1;
+        close(descriptor);
+        if (!isWritten || chmod(name.c_str(), becomesMovie ? 0644 : 0600) != 0 ||
+            rename(name.c_str(), next.c_str()) != 0)
             _exit(1);
     }
-}
+
+    const bench::Folder folder_;
+    const std::vector<std::string> folders_;
+};
 
 // Counts what it hears.
 class CountingObserver final : public vexo::VXPathObserver {
@@ -149,21 +183,28 @@ struct Drained {
     long overflows = 0;
 };
 
+// A loop that runs on a thread of its own.
 template <typename Loop>
-Drained drainStorm(const bench::Folder& folder, long operations) {
-    const auto folders = folder.makeFolders(100);
-    Loop loop(folders);
-    std::atomic<bool> ended = false;
-    Drained drained;
-    std::thread thread([&] {
-        loop.drain(ended);
-        drained = {bench::processorTimeOfThread(), loop.events, loop.overflows};
-    });
-    bench::runInChild([&] { storm(folders, operations); });
-    ended = true;
-    thread.join();
-    return drained;
-}
+class Running {
+  public:
+    explicit Running(const std::vector<std::string>& folders)
+        : loop_(folders), thread_([this] {
+              loop_.drain(ended_);
+              drained_ = {bench::processorTimeOfThread(), loop_.events, loop_.overflows};
+          }) {}
+
+    Drained end() {
+        ended_ = true;
+        thread_.join();
+        return drained_;
+    }
+
+  private:
+    Loop loop_;
+    std::atomic<bool> ended_ = false;
+    Drained drained_;
+    std::thread thread_;
+};
 
 double microsecondsOfAnEvent(const Drained& drained) {
     return seconds(drained.time) * 1e6 / static_cast<double>(drained.events);
@@ -281,34 +322,35 @@ void PublishABurst(benchmark::State& state) {
 }
 BENCHMARK(PublishABurst)->Iterations(1)->UseManualTime()->Unit(benchmark::kSecond);
 
-// Processor time of an operation's events, in the watcher and in the bare loop. Of inotify-tools the time of
-// an event counts, because it may lose some. No storm's files are removed before the last has ended, and
-// nothing is measured after that: for minutes ext4 then makes new ones at a fraction of the speed.
+// Processor time for the events of a storm, in the watcher and in the bare loop, which both follow the same
+// one: a machine may be twice as slow in the next minute. Of inotify-tools the time of an event counts,
+// because it may lose some.
 void DrainAMillionOperations(benchmark::State& state) {
-    constexpr long operations = 999'999;
     for (auto _ : state) {
-        const bench::Folder bareFolder, toolsFolder, folder;
-        const Drained floor = drainStorm<BareLoop>(bareFolder, operations);
-        const Drained tools = drainStorm<ToolsLoop>(toolsFolder, operations);
-        if (floor.overflows > 0)
-            state.SkipWithError("the bare loop lost events");
-        if (tools.events == 0)
-            state.SkipWithError("inotify-tools saw nothing");
-        const auto folders = folder.makeFolders(100);
+        const StormGround ground;
         vexo::PathWatcher watcher;
         const bench::Services services;
         std::atomic<int> warnings = 0;
         watcher.setWarningHandler([&](const std::string&) { ++warnings; });
         watcher.start();
         const auto observer = std::make_shared<CountingObserver>();
-        watcher.watchPath(folder.path(), observer);
+        watcher.watchPath(ground.path(), observer);
+        Running<BareLoop> bareLoop(ground.folders());
         const auto before = bench::processorTime();
-        bench::runInChild([&] { storm(folders, operations); });
+        ground.storm();
+        const Drained floor = bareLoop.end();
         waitUntilQuiet(*observer);
-        const auto time = bench::processorTime() - before;
+        const auto time = bench::processorTime() - before - floor.time;
         watcher.close();
+        Running<ToolsLoop> toolsLoop(ground.folders());
+        ground.storm();
+        const Drained tools = toolsLoop.end();
+        if (floor.overflows > 0)
+            state.SkipWithError("the bare loop lost events");
         if (warnings > 0 || observer->reports == 0)
             state.SkipWithError("the watcher lost events");
+        if (tools.events == 0)
+            state.SkipWithError("inotify-tools saw nothing");
         state.SetIterationTime(seconds(time));
         const double perEvent = seconds(time) * 1e6 / static_cast<double>(floor.events);
         state.counters["floor_s"] = seconds(floor.time);
