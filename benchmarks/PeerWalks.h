@@ -1,6 +1,9 @@
-// What others offer for going through a folder: each looks at every entry's status and keeps nothing.
+// What others offer for going through libraries, doing the work of the bare walk: each looks at every entry's
+// status and every clip's attribute, answers the trailer test of every document with the packaged library,
+// and keeps nothing.
 //
-// They read no extended attribute and no document, so they do less than the floor of a first load does.
+// Grilo, the media framework, makes items of what it finds, as a load does; it knows neither the attribute
+// nor the documents.
 #pragma once
 
 #include <array>
@@ -8,20 +11,28 @@
 
 namespace bench {
 
-struct PeerWalk {
-    const char* name;
-    // How many plain files there are in a folder and those in it.
-    long (*countFiles)(const std::string& folder);
+// What a walk came by.
+struct PeerFindings {
+    long clips = 0;
+    long projects = 0;  // whose documents are no trailers'
 };
 
-long countWithStandardLibrary(const std::string& folder);
-long countWithGLib(const std::string& folder);
-long countWithFTS(const std::string& folder);
-long countWithFind(const std::string& folder);
+struct PeerWalk {
+    const char* name;
+    PeerFindings (*walk)(const std::string& folder);
+    bool knowsProjects = true;
+};
 
-inline constexpr std::array<PeerWalk, 4> peerWalks{{{"std_filesystem", countWithStandardLibrary},
-                                                    {"glib", countWithGLib},
-                                                    {"fts", countWithFTS},
-                                                    {"find", countWithFind}}};
+PeerFindings walkWithStandardLibrary(const std::string& folder);
+PeerFindings walkWithGLib(const std::string& folder);
+PeerFindings walkWithFTS(const std::string& folder);
+PeerFindings walkWithFind(const std::string& folder);
+PeerFindings walkWithGrilo(const std::string& folder);
+
+inline constexpr std::array<PeerWalk, 5> peerWalks{{{"std_filesystem", walkWithStandardLibrary},
+                                                    {"glib", walkWithGLib},
+                                                    {"fts", walkWithFTS},
+                                                    {"find", walkWithFind},
+                                                    {"grilo", walkWithGrilo, /*knowsProjects=*/false}}};
 
 }  // namespace bench

@@ -1,8 +1,9 @@
 // Libraries on disk for benchmarks, of any size.
 //
 // They imitate those of a person who has filmed for years: events of clips that the camera named by its
-// clock, projects in folders of a hundred, each with its document and no rendered movie. The clips are empty,
-// because loading a library reads none of them.
+// clock, projects in folders of a hundred, each with its document and no rendered movie. Loading a library
+// reads no clip, so each is one byte that takes up no room; programs that make nothing of empty files see
+// them, too.
 #pragma once
 
 #include <cstddef>
