@@ -27,7 +27,7 @@ using Clock = std::chrono::steady_clock;
 
 constexpr int rounds = 9;
 // Of who takes so many times longer, one round tells enough.
-constexpr double timesNotRepeated = 5;
+constexpr double timesNotRepeated = 15;
 
 // What one run took and came by; of several the least time counts.
 struct Run {
