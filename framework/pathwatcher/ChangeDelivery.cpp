@@ -2,9 +2,7 @@
 
 #include <algorithm>
 #include <iterator>
-#include <string>
 #include <utility>
-#include <vector>
 
 #include "platform/Dispatcher.h"
 #include "platform/Services.h"
@@ -17,14 +15,6 @@ namespace {
 
 constexpr double normalPriority = 0.5;
 
-// What a subscriber that takes its time may have waiting besides as many as there are distinct paths.
-constexpr std::size_t mostRepetitions = 10'000;
-
-void sortWithoutRepetitions(ChangeBurst::Paths& paths) {
-    std::sort(paths.begin(), paths.end());
-    paths.erase(std::unique(paths.begin(), paths.end()), paths.end());
-}
-
 }  // namespace
 
 void ChangeDelivery::add(const Subscriber& subscriber, ChangeBurst::Paths changedPaths) {
@@ -32,15 +22,11 @@ void ChangeDelivery::add(const Subscriber& subscriber, ChangeBurst::Paths change
     if (closed_)
         return;
     Report& report = waiting_[subscriber];
-    if (report.paths.empty()) {
-        report.paths = std::move(changedPaths);
-        return;
-    }
-    std::move(changedPaths.begin(), changedPaths.end(), std::back_inserter(report.paths));
-    if (report.paths.size() > mostRepetitions + 2 * report.distinct) {
-        sortWithoutRepetitions(report.paths);
-        report.distinct = report.paths.size();
-    }
+    if (report.burst.empty())
+        report.burst = std::move(changedPaths);
+    else
+        report.sinceThen.insert(std::move_iterator(changedPaths.begin()),
+                                std::move_iterator(changedPaths.end()));
 }
 
 void ChangeDelivery::begin() {
@@ -60,10 +46,17 @@ void ChangeDelivery::close() {
 }
 
 void ChangeDelivery::deliver() {
-    while (auto report = takeNext()) {
-        sortWithoutRepetitions(report.mapped().paths);
-        report.key().hear(report.mapped().paths);
-    }
+    while (auto report = takeNext())
+        report.key().hear(pathsOf(std::move(report.mapped())));
+}
+
+std::vector<std::string> ChangeDelivery::pathsOf(Report report) {
+    std::vector<std::string> paths = std::move(report.burst);
+    while (!report.sinceThen.empty())
+        paths.push_back(std::move(report.sinceThen.extract(report.sinceThen.begin()).value()));
+    std::sort(paths.begin(), paths.end());
+    paths.erase(std::unique(paths.begin(), paths.end()), paths.end());
+    return paths;
 }
 
 ChangeDelivery::Reports::node_type ChangeDelivery::takeNext() {

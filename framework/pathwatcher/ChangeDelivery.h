@@ -5,6 +5,9 @@
 
 #include <map>
 #include <memory>
+#include <string>
+#include <unordered_set>
+#include <vector>
 
 #include "framework/pathwatcher/ChangeBurst.h"
 #include "framework/pathwatcher/Subscriber.h"
@@ -22,15 +25,19 @@ class ChangeDelivery : public std::enable_shared_from_this<ChangeDelivery> {
     void close() VX_EXCLUDES(mutex_);
 
   private:
+    // A subscriber that keeps up has nothing but the paths of one burst waiting. For one that takes its time
+    // each path is kept once, however often it changes.
     struct Report {
-        ChangeBurst::Paths paths;
-        std::size_t distinct = 0;  // of them, when it was last counted
+        ChangeBurst::Paths burst;
+        std::unordered_set<std::string> sinceThen;
     };
     using Reports = std::map<Subscriber, Report>;
 
     void deliver() VX_EXCLUDES(mutex_);
     // Empty when nothing waits; the thread is then to end.
     Reports::node_type takeNext() VX_EXCLUDES(mutex_);
+    // In byte order, each once.
+    static std::vector<std::string> pathsOf(Report report);
 
     platform::Mutex mutex_;
     Reports waiting_ VX_GUARDED_BY(mutex_);

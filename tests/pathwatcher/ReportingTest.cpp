@@ -150,12 +150,11 @@ TEST_F(Reporting, FilesThatAreWrittenToInTurnsAreToldOnceEach) {
     EXPECT_THAT(observer->calls, ElementsAre(a, b));
 }
 
-// The paths of an observer that takes its time, sorted out on the way so that they don't pile up.
-TEST_F(Reporting, WhatChangesAgainAndAgainBeforeAnObserverIsToldIsToldOnce) {
+TEST_F(Reporting, WhatChangesInSeveralBurstsBeforeAnObserverIsToldIsToldOnce) {
     watcher();
     const auto delivery = std::make_shared<vexo::ChangeDelivery>();
-    for (int round = 0; round < 20'000; ++round)
-        delivery->add(vexo::Subscriber(observer), {"/b", "/a", "/" + std::to_string(round % 3)});
+    for (const char* path : {"/0", "/1", "/2", "/1"})
+        delivery->add(vexo::Subscriber(observer), {"/b", "/a", path, "/a"});
     delivery->begin();
     environment.dispatcher.runDueBlocks();
     EXPECT_THAT(observer->calls, ElementsAre("/0", "/1", "/2", "/a", "/b"));
