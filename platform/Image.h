@@ -45,8 +45,9 @@ class Picture {
     // The whole picture scaled to `width` x `height` pixels; nil when it can't be drawn, or for sizes below 1
     // or beyond what pictureWithData allows.
     virtual std::optional<Bitmap> draw(int width, int height) const = 0;
-    // Lays the whole picture over what the bitmap shows, scaled to its size; quicker than drawing it by
-    // itself first. NO when it can't be drawn, or the bitmap is none; the bitmap may then show a part of it.
+    // Lays the whole picture over what the bitmap shows, scaled to its size. NO when it can't be drawn, or
+    // the bitmap lacks pixels or is of a size that is not drawn; the bitmap may then show a part of it, and
+    // so it may when this raises. Where a picture knows no quicker way it is drawn by itself first.
     virtual bool drawOver(Bitmap& bitmap) const;
 };
 

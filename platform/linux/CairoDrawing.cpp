@@ -48,10 +48,11 @@ bool holds(const Rect& rect, Size size) {
     return size.width <= rect.width && size.height <= rect.height;
 }
 
-// Plays steps back, on an area of `size` points that the context has scaled to pixels. On clear ground a
-// rectangle replaces what is there.
+// Plays steps back, on an area of `size` points that the context has scaled to pixels.
 class Player {
   public:
+    // On clear ground a rectangle replaces what is there. Over a picture, which is to stay, it is laid over
+    // it: that comes to the same unless the rectangle would have to replace what another step drew.
     enum class Ground { clear, picture };
 
     Player(cairo_t* context, Size size, Ground ground)
@@ -85,7 +86,7 @@ class Player {
         if (isEmpty(partInside(size_, step.rect)) || !isDrawableSize(width, height))
             return;
         const auto bitmap = step.picture->draw(int(std::lround(width)), int(std::lround(height)));
-        if (bitmap)
+        if (bitmap && isWhole(*bitmap))
             draw(*bitmap, step.rect);
     }
     void operator()(const DrawnText& step) const {
@@ -166,7 +167,9 @@ class Drawing::Recording final : public Picture {
                      [this](cairo_t* context) { return play(context, Player::Ground::clear); });
     }
     bool drawOver(Bitmap& bitmap) const override {
-        if (!isDrawable() || !isWhole(bitmap) || takesAway())
+        if (!isDrawable() || !isWhole(bitmap))
+            return false;
+        if (replacesWhatWasDrawn())
             return Picture::drawOver(bitmap);
         return paintOver(bitmap, size_,
                          [this](cairo_t* context) { return play(context, Player::Ground::picture); });
@@ -179,9 +182,9 @@ class Drawing::Recording final : public Picture {
             std::visit(player, step);
         return true;
     }
-    // Whether a rectangle that one can see through replaces what was drawn before. Over a picture it would
-    // have to take that away and leave the picture.
-    bool takesAway() const {
+    // Whether a rectangle that one can see through may replace what another step drew; where exactly that is
+    // doesn't count.
+    bool replacesWhatWasDrawn() const {
         bool isClear = true;
         for (const Step& step : steps_) {
             if (isEmpty(partInside(size_, std::visit([](const auto& any) { return any.rect; }, step))))

@@ -22,6 +22,16 @@ struct Free {
 };
 using Handle = std::unique_ptr<RsvgHandle, Free>;
 
+// Draws the bitmap on an area of its own size. Cairo counts the users of a surface's pixels without a lock,
+// so each call has a surface of its own. Without padding the edges of an enlarged bitmap fade out.
+bool paintBitmap(cairo_t* context, const Bitmap& bitmap) {
+    const CairoSurface surface = surfaceOf(bitmap);
+    cairo_set_source_surface(context, surface.get(), 0, 0);
+    cairo_pattern_set_extend(cairo_get_source(context), CAIRO_EXTEND_PAD);
+    cairo_paint(context);
+    return true;
+}
+
 class UndrawablePicture final : public Picture {
   public:
     Size naturalSize() const override { return {}; }
@@ -36,16 +46,8 @@ class BitmapPicture final : public Picture {
     Size naturalSize() const override { return {double(bitmap_.width), double(bitmap_.height)}; }
     bool isDrawable() const override { return true; }
     std::optional<Bitmap> draw(int width, int height) const override {
-        return paint(width, height, naturalSize(), [this](cairo_t* context) {
-            // Cairo counts the users of a surface's pixels without a lock, so each call has a surface of its
-            // own.
-            const CairoSurface surface = surfaceOf(bitmap_);
-            cairo_set_source_surface(context, surface.get(), 0, 0);
-            // Without it the edges of an enlarged picture fade out.
-            cairo_pattern_set_extend(cairo_get_source(context), CAIRO_EXTEND_PAD);
-            cairo_paint(context);
-            return true;
-        });
+        return paint(width, height, naturalSize(),
+                     [this](cairo_t* context) { return paintBitmap(context, bitmap_); });
     }
 
   private:
@@ -211,12 +213,10 @@ cairo_status_t appendBytes(void* closure, const unsigned char* buffer, unsigned 
 
 bool Picture::drawOver(Bitmap& bitmap) const {
     const auto drawn = isWhole(bitmap) ? draw(bitmap.width, bitmap.height) : std::nullopt;
-    return drawn && paintOver(bitmap, {double(bitmap.width), double(bitmap.height)}, [&](cairo_t* context) {
-               const CairoSurface surface = surfaceOf(*drawn);
-               cairo_set_source_surface(context, surface.get(), 0, 0);
-               cairo_paint(context);
-               return true;
-           });
+    if (!drawn || !isWhole(*drawn))
+        return false;
+    return paintOver(bitmap, {double(drawn->width), double(drawn->height)},
+                     [&](cairo_t* context) { return paintBitmap(context, *drawn); });
 }
 
 std::shared_ptr<const Picture> pictureWithData(std::span<const std::byte> data) {

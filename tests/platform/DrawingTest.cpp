@@ -372,6 +372,35 @@ TEST(Drawing, EveryPictureLiesOverAnother) {
     expectLaidOverAsDrawn(*Drawing({6, 4}).image()->picture());
 }
 
+// A picture of a plug-in's, which may draw whatever it likes.
+class FixedPicture final : public Picture {
+  public:
+    explicit FixedPicture(Bitmap bitmap) : bitmap_(std::move(bitmap)) {}
+
+    Size naturalSize() const override { return {4, 4}; }
+    bool isDrawable() const override { return true; }
+    std::optional<Bitmap> draw(int, int) const override { return bitmap_; }
+
+  private:
+    const Bitmap bitmap_;
+};
+
+TEST(Drawing, APictureThatDrawsItselfInAnotherSizeIsScaled) {
+    Bitmap bitmap = redAndBlueGround(4, 4);
+    EXPECT_TRUE(FixedPicture({1, 1, {opaqueBlue}}).drawOver(bitmap));
+    EXPECT_EQ(pixel(bitmap, 1, 1), opaqueBlue);
+}
+
+TEST(Drawing, APictureThatDrawsItselfWithTooFewPixelsIsLeftOut) {
+    const auto broken = std::make_shared<FixedPicture>(Bitmap{100, 100, {opaqueBlue}});
+    Bitmap bitmap = redAndBlueGround(4, 4);
+    EXPECT_FALSE(broken->drawOver(bitmap));
+    EXPECT_EQ(bitmap.pixels, redAndBlueGround(4, 4).pixels);
+    Drawing drawing({4, 4});
+    drawing.drawImage(Image(broken), {0, 0, 4, 4});
+    EXPECT_THAT(pixelsOf(drawing).pixels, Each(transparent));
+}
+
 TEST(Drawing, LiesOverNothingThatIsNoBitmap) {
     Drawing drawing({40, 20});
     drawing.fillRect({0, 0, 40, 20});

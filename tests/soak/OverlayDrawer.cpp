@@ -12,17 +12,25 @@ class OverlayDrawer final : public Actor {
     std::string name() const override { return "overlays"; }
 
     void act() override {
-        static constexpr Deed<OverlayDrawer> deeds[] = {{"draw", &OverlayDrawer::draw}};
+        static constexpr Deed<OverlayDrawer> deeds[] = {{"draw", &OverlayDrawer::draw},
+                                                        {"draw over", &OverlayDrawer::drawOver}};
         doOneOf(*this, deeds);
     }
 
   private:
-    bool draw() {
+    platform::ImageRef overlayOfAnyItem() {
         const PickedItem picked = anyItem(host_, chance);
         if (!picked.item)
-            return false;
-        const auto overlay = managerOf(host_).thumbnailOverlayForMediaObject(
-            picked.item, {picked.group}, {double(64 + chance.below(200)), 96});
+            return nullptr;
+        return managerOf(host_).thumbnailOverlayForMediaObject(picked.item, {picked.group},
+                                                               {double(64 + chance.below(200)), 96});
+    }
+    bool draw() {
+        const auto overlay = overlayOfAnyItem();
+        return overlay && overlay->picture()->draw(128, 96);
+    }
+    bool drawOver() {
+        const auto overlay = overlayOfAnyItem();
         platform::Bitmap thumbnail = testing_support::plainBitmap(128, 96);
         return overlay && overlay->picture()->drawOver(thumbnail);
     }
