@@ -5,6 +5,7 @@
 #include <filesystem>
 #include <fstream>
 #include <memory>
+#include <stdexcept>
 #include <string_view>
 
 namespace bench {
@@ -43,6 +44,8 @@ bool isTrailerByLibplist(const std::string& document) {
     plist_t list = nullptr;
     plist_from_memory(bytes.data(), static_cast<std::uint32_t>(bytes.size()), &list);
     const std::unique_ptr<void, Release> owned(list);
+    if (!list)
+        throw std::runtime_error("libplist cannot read " + document);
     plist_t objects = plist_dict_get_item(list, "$objects");
     plist_t root = archived(objects, plist_access_path(list, 2, "$top", "root"));
     return archivedValueOf(objects, archivedValueOf(objects, root, "editInfo"), "trailer") != nullptr;

@@ -26,7 +26,7 @@ using namespace std::chrono_literals;
 using Clock = std::chrono::steady_clock;
 
 constexpr int rounds = 9;
-// Of who takes so many times longer, one round tells enough.
+// For a peer that takes this many times as long as we do, one round is enough.
 constexpr double timesNotRepeated = 15;
 
 // What one run took and came by; of several the least time counts.

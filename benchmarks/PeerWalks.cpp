@@ -45,7 +45,7 @@ void visitFile(const std::string& path, PeerFindings& findings) {
 }
 
 // GLib reads the attribute together with the status.
-void walkWithGLib(GFile* folder, PeerFindings& findings) {
+void visitFolder(GFile* folder, PeerFindings& findings) {
     const Owned<GFileEnumerator> entries(
         g_file_enumerate_children(folder, "standard::name,standard::type,standard::size,time::*,xattr::date",
                                   G_FILE_QUERY_INFO_NOFOLLOW_SYMLINKS, nullptr, nullptr));
@@ -55,7 +55,7 @@ void walkWithGLib(GFile* folder, PeerFindings& findings) {
     GFile* child = nullptr;
     while (g_file_enumerator_iterate(entries.get(), &info, &child, nullptr, nullptr) && info) {
         if (g_file_info_get_file_type(info) == G_FILE_TYPE_DIRECTORY)
-            walkWithGLib(child, findings);
+            visitFolder(child, findings);
         else if (isClip(g_file_info_get_name(info)))
             ++findings.clips;
         else
@@ -101,7 +101,7 @@ PeerFindings walkWithStandardLibrary(const std::string& folder) {
 PeerFindings walkWithGLib(const std::string& folder) {
     PeerFindings findings;
     const Owned<GFile> file(g_file_new_for_path(folder.c_str()));
-    walkWithGLib(file.get(), findings);
+    visitFolder(file.get(), findings);
     return findings;
 }
 

@@ -1,6 +1,6 @@
-// What others offer for going through libraries, doing the work of the bare walk: each looks at every entry's
-// status and every clip's attribute, answers the trailer test of every document with the packaged library,
-// and keeps nothing.
+// What others offer for going through libraries. All but Grilo do the work of the bare walk: they look at
+// every entry's status and every clip's attribute, answer the trailer test of every document with libplist,
+// and keep nothing.
 //
 // Grilo, the media framework, makes items of what it finds, as a load does; it knows neither the attribute
 // nor the documents.
