@@ -184,8 +184,8 @@ std::chrono::nanoseconds timeOf(const std::function<void()>& work) {
 }
 
 // Makes and draws the overlays of a list again and again, as scrolling does. Processor time, and the quickest
-// list of each kind: what else the machine does can only add to such a short task. The
-// time in front is the mean.
+// list of each kind: what else the machine does can only add to such a short task. The time in front is the
+// mean.
 void MakeAndDrawOverlays(benchmark::State& state) {
     const LoadedPlugin plugin;
     const BareShapes shapes(*plugin.manager().iconNamed("MBReelixAppIconSmall")->picture());

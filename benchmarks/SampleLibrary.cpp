@@ -40,12 +40,6 @@ std::string clipName(int number) {
                        number % 59);
 }
 
-void makeClip(const std::string& path) {
-    const platform::FileDescriptor file(open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0600));
-    if (!file || ftruncate(file.number(), 1) != 0)
-        throw std::runtime_error("cannot make " + path);
-}
-
 }  // namespace
 
 std::string eventsFolder(const std::string& home) {
@@ -67,7 +61,9 @@ void makeLibraries(const std::string& home, const LibrarySize& size) {
         const std::string event = fmt::format("{}/Event {:05}", eventsFolder(home), i / size.clipsAnEvent);
         if (i % size.clipsAnEvent == 0)
             fs::create_directories(event);
-        makeClip(event + "/" + clipName(i));
+        const std::string clip = event + "/" + clipName(i);
+        writeFile(clip, {});
+        fs::resize_file(clip, 1);
     }
     const auto document = sampleDocument(documentSize, /*isTrailer=*/false);
     for (int i = 0; i < size.projects; ++i) {

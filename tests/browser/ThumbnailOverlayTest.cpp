@@ -17,16 +17,13 @@ using platform::Size;
 using testing_support::areAlike;
 using testing_support::blended;
 using testing_support::channel;
+using testing_support::pixel;
 using vexo::VXMediaObjectRef;
 
 constexpr double infinity = std::numeric_limits<double>::infinity();
 constexpr double notANumber = std::numeric_limits<double>::quiet_NaN();
 
 std::uint32_t& pixel(Bitmap& bitmap, int x, int y) {
-    return bitmap.pixels[std::size_t(y * bitmap.width + x)];
-}
-
-std::uint32_t pixel(const Bitmap& bitmap, int x, int y) {
     return bitmap.pixels[std::size_t(y * bitmap.width + x)];
 }
 
