@@ -7,7 +7,7 @@ pkg_check_modules(CAIRO REQUIRED IMPORTED_TARGET cairo)               # drawing
 pkg_check_modules(PANGO REQUIRED IMPORTED_TARGET pangocairo)          # text on pictures
 pkg_check_modules(RSVG REQUIRED IMPORTED_TARGET librsvg-2.0)          # icons
 pkg_check_modules(PIXBUF REQUIRED IMPORTED_TARGET gdk-pixbuf-2.0)     # thumbnails: PNG with keys
-pkg_check_modules(EXPAT REQUIRED IMPORTED_TARGET expat)               # XML property lists
+pkg_check_modules(EXPAT REQUIRED IMPORTED_TARGET expat)               # XML property lists, a look at icons
 pkg_check_modules(SQLITE REQUIRED IMPORTED_TARGET sqlite3)            # the metadata index
 pkg_check_modules(FFMPEG REQUIRED IMPORTED_TARGET libavformat libavcodec libavutil libswscale)
 pkg_check_modules(SECCOMP REQUIRED IMPORTED_TARGET libseccomp)        # walls around what reads foreign files
@@ -15,5 +15,6 @@ find_package(fmt REQUIRED)
 find_package(nlohmann_json REQUIRED)
 find_package(CLI11 REQUIRED)
 
-set(VEXO_FRAMEWORK_LIBRARIES Threads::Threads PkgConfig::GIO PkgConfig::ICU PkgConfig::CAIRO PkgConfig::PANGO
-    PkgConfig::RSVG PkgConfig::PIXBUF PkgConfig::EXPAT PkgConfig::SQLITE fmt::fmt nlohmann_json::nlohmann_json ${CMAKE_DL_LIBS})
+set(VEXO_FRAMEWORK_LIBRARIES Threads::Threads PkgConfig::GIO PkgConfig::ICU PkgConfig::PIXBUF PkgConfig::EXPAT
+    PkgConfig::SQLITE fmt::fmt nlohmann_json::nlohmann_json ${CMAKE_DL_LIBS})
+set(VEXO_DRAWING_LIBRARIES PkgConfig::CAIRO PkgConfig::PANGO PkgConfig::RSVG PkgConfig::EXPAT)

@@ -1,7 +1,5 @@
 #include "framework/PluginSearch.h"
 
-#include <dlfcn.h>
-
 #include <algorithm>
 #include <cstdlib>
 #include <utility>
@@ -9,23 +7,13 @@
 #include "platform/FileManager.h"
 #include "platform/Path.h"
 #include "platform/Services.h"
+#include "platform/linux/OwnLibrary.h"
 #include "platform/linux/UserFolders.h"
 
 namespace vexo {
 namespace {
 
 namespace path = platform::path;
-
-// The folder of the host's shared library, by which a build tree and an installation are told apart.
-std::string libraryFolder() {
-    Dl_info info;
-    if (!dladdr(reinterpret_cast<const void*>(&pluginBundles), &info) || !info.dli_fname)
-        return {};
-    char* resolved = realpath(info.dli_fname, nullptr);
-    const std::string library = resolved ? resolved : info.dli_fname;
-    std::free(resolved);
-    return path::withoutLastComponent(library);
-}
 
 std::vector<std::string> splitAtColons(const char* text) {
     std::vector<std::string> parts;
@@ -69,7 +57,8 @@ std::vector<std::string> pluginBundles(const std::vector<std::string>& explicitB
             appendBundlesIn(folder, bundles);
     }
 
-    const std::string library = libraryFolder();
+    // A build tree and an installation are told apart by where the library lies.
+    const std::string library = platform::ownLibraryFolder();
     const std::string buildTree = path::withoutLastComponent(library);
     if (platform::services().fileManager.fileExistsAtPath(path::appending(buildTree, "CMakeCache.txt")))
         appendBundlesIn(buildTree, bundles);

@@ -54,7 +54,7 @@ class AttributedString {
 // Belongs to one thread; the image it makes is for all of them.
 class Drawing {
   public:
-    // A size that `pictureWithData` would not allow makes an image that is not drawable.
+    // A size that is not drawn makes an image that is not drawable.
     explicit Drawing(Size size);
     ~Drawing();
     Drawing(const Drawing&) = delete;

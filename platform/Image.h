@@ -24,6 +24,13 @@ struct Bitmap {
     std::vector<std::uint32_t> pixels;
 };
 
+// Whether pictures of that size are drawn at all, in points or in pixels: from 1 to 16384 a side and up to
+// 64 Mi in all.
+bool isDrawableSize(double width, double height);
+
+// Whether the bitmap has all its pixels and is of a size that is drawn.
+bool isWhole(const Bitmap& bitmap);
+
 // A picture that can be drawn at any size. Thread-safe.
 //
 // Most pictures never change. One that shows something on a disk may be drawn as a stand-in first and tell
@@ -42,8 +49,8 @@ class Picture {
     virtual Size naturalSize() const = 0;  // in points
     // False when the picture's data is damaged.
     virtual bool isDrawable() const = 0;
-    // The whole picture scaled to `width` x `height` pixels; nil when it can't be drawn, or for sizes below 1
-    // or beyond what pictureWithData allows.
+    // The whole picture scaled to `width` x `height` pixels; nil when it can't be drawn, or for a size that
+    // is not drawn.
     virtual std::optional<Bitmap> draw(int width, int height) const = 0;
     // Lays the whole picture over what the bitmap shows, scaled to its size. NO when it can't be drawn, or
     // the bitmap lacks pixels or is of a size that is not drawn; the bitmap may then show a part of it, and
@@ -80,9 +87,9 @@ class Image {
     bool scalesWhenResized_ = false;
 };
 
-// A picture of the bytes of an SVG or PNG file, which it copies, never nil. An SVG is parsed when something
-// is first asked of its picture. Damaged bytes give a picture that is not drawable; so do pictures of more
-// than 16384 points a side or 64 Mi points in all, and SVG that is compressed or not in UTF-8, declares
+// A picture of the bytes of an SVG or PNG file, which it copies, never nil. They are parsed when something is
+// first asked of the picture. Damaged bytes give a picture that is not drawable; so do pictures of a size
+// that is not drawn, and SVG that is compressed or not in UTF-8, declares
 // entities, embeds files, tells no size, or is larger or has more elements than any icon needs. Nothing
 // outside the bytes is loaded, whatever an SVG refers to.
 std::shared_ptr<const Picture> pictureWithData(std::span<const std::byte> data);

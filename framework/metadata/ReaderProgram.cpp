@@ -1,10 +1,10 @@
-#include <dlfcn.h>
 #include <unistd.h>
 
 #include <cstdlib>
 #include <filesystem>
 
 #include "framework/metadata/MediaReader.h"
+#include "platform/linux/OwnLibrary.h"
 
 namespace vexo {
 
@@ -20,12 +20,8 @@ fs::path besideRunningProgram() {
 }
 
 fs::path installedProgram() {
-    Dl_info library{};
-    if (!dladdr(reinterpret_cast<const void*>(&mediaReaderProgram), &library) || !library.dli_fname)
-        return programName;
-    std::error_code unknown;
-    const fs::path folder = fs::canonical(library.dli_fname, unknown).parent_path();
-    return (folder / VEXO_PROGRAMS_FROM_LIBRARY / programName).lexically_normal();
+    return (fs::path(platform::ownLibraryFolder()) / VEXO_PROGRAMS_FROM_LIBRARY / programName)
+        .lexically_normal();
 }
 
 }  // namespace

@@ -112,4 +112,37 @@ TEST_F(OverlayCommand, WantsAFile) {
     EXPECT_EQ(runVexo({"--home", home_.path(), "overlay", "--object", movie_, "--size", "80x60"}).status, 2);
 }
 
+class DrawingLibrary : public OverlayCommand {
+  protected:
+    // What the linker loaded, as it tells it.
+    static bool isLoaded(const Outcome& outcome) {
+        EXPECT_THAT(outcome.errors, HasSubstr("libVexoMediaBrowser"));
+        const bool isLoaded = outcome.errors.find("libVexoDrawing") != std::string::npos;
+        EXPECT_EQ(outcome.errors.find("libcairo") != std::string::npos, isLoaded);
+        return isLoaded;
+    }
+};
+
+TEST_F(DrawingLibrary, IsLoadedByWhatDrawsAlone) {
+    const ScopedEnvironment told("LD_DEBUG", "files");
+    const ScopedEnvironment noReader("VEXO_MEDIA_READER", "/nowhere/reader");  // which may load anything
+    EXPECT_FALSE(isLoaded(runVexo({"--home", home_.path(), "tree"})));
+    EXPECT_TRUE(isLoaded(overlay("80x60")));
+}
+
+TEST_F(DrawingLibrary, IsMissedByWhatDrawsAlone) {
+    const TemporaryFolder installation;
+    const std::string library = "libVexoMediaBrowser.so.0";
+    fs::copy_file(fs::path(VEXO_BIN_DIR) / "../lib" / library, installation.path(library));
+    const ScopedEnvironment libraries("LD_LIBRARY_PATH", installation.path().c_str());
+    const ScopedEnvironment plugins("VEXO_PLUGIN_PATH", REELIX_BUNDLE_DIR);
+    const Outcome tree = runVexo({"--home", home_.path(), "tree"});
+    EXPECT_EQ(tree.status, 0);
+    EXPECT_THAT(tree.output, HasSubstr("Summer"));
+    EXPECT_EQ(tree.errors, "");
+    const Outcome drawn = overlay("80x60");
+    EXPECT_EQ(drawn.status, 1);
+    EXPECT_THAT(drawn.errors, HasSubstr(installation.path("vexo/libVexoDrawing.so")));
+}
+
 }  // namespace

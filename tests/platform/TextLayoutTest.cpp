@@ -1,8 +1,8 @@
-#include "platform/linux/TextLayout.h"
+#include "platform/linux/drawing/TextLayout.h"
 
 #include <gtest/gtest.h>
 
-#include "platform/linux/CairoCanvas.h"
+#include "platform/linux/drawing/CairoCanvas.h"
 
 namespace platform {
 namespace {

@@ -17,14 +17,13 @@ struct CairoRelease {
 using CairoSurface = std::unique_ptr<cairo_surface_t, CairoRelease>;
 using CairoContext = std::unique_ptr<cairo_t, CairoRelease>;
 
-// Whether pictures of that size are drawn at all, in points or in pixels.
-bool isDrawableSize(double width, double height);
-
 // A surface that shows the bitmap's own pixels. Requires: the bitmap is whole and outlives the surface.
-CairoSurface surfaceOf(const Bitmap& bitmap);
-
-// Whether the bitmap has all its pixels and is of a size that is drawn.
-bool isWhole(const Bitmap& bitmap);
+inline CairoSurface surfaceOf(const Bitmap& bitmap) {
+    // Cairo takes no const pixels; a surface that is only read from leaves them alone.
+    auto* pixels = reinterpret_cast<unsigned char*>(const_cast<std::uint32_t*>(bitmap.pixels.data()));
+    return CairoSurface(cairo_image_surface_create_for_data(pixels, CAIRO_FORMAT_ARGB32, bitmap.width,
+                                                            bitmap.height, bitmap.width * 4));
+}
 
 // Draws with `drawContent`, which sees an area of `contentSize`, over the bitmap. NO when `drawContent`
 // answers that or Cairo has failed. Requires: the bitmap is whole; isDrawableSize(contentSize).

@@ -1,35 +1,16 @@
-// Drawings: what was said is recorded, and played back with Cairo and Pango.
+#include "platform/linux/drawing/DrawingPlayer.h"
+
 #include <algorithm>
 #include <cmath>
 #include <numbers>
 #include <variant>
-#include <vector>
 
-#include "platform/Drawing.h"
-#include "platform/linux/CairoCanvas.h"
-#include "platform/linux/TextLayout.h"
+#include "platform/linux/drawing/CairoCanvas.h"
+#include "platform/linux/drawing/CairoPicture.h"
+#include "platform/linux/drawing/TextLayout.h"
 
 namespace platform {
 namespace {
-
-struct FilledRect {
-    Rect rect;
-    Color color;
-};
-struct RoundedRect {
-    Rect rect;
-    double radius;
-    Color color;
-};
-struct DrawnImage {
-    std::shared_ptr<const Picture> picture;
-    Rect rect;
-};
-struct DrawnText {
-    AttributedString text;
-    Rect rect;
-};
-using Step = std::variant<FilledRect, RoundedRect, DrawnImage, DrawnText>;
 
 bool isEmpty(const Rect& rect) {
     return !(rect.width > 0 && rect.height > 0);
@@ -149,95 +130,41 @@ class Player {
     double pixelsPerPointX_ = 1, pixelsPerPointY_ = 1;
 };
 
+bool play(cairo_t* context, const RecordedDrawing& drawing, Player::Ground ground) {
+    const Player player(context, drawing.size, ground);
+    for (const DrawingStep& step : drawing.steps)
+        std::visit(player, step);
+    return true;
+}
+
+// Whether a rectangle that one can see through may replace what another step drew; where exactly that is
+// doesn't count.
+bool replacesWhatWasDrawn(const RecordedDrawing& drawing) {
+    bool isClear = true;
+    for (const DrawingStep& step : drawing.steps) {
+        if (isEmpty(partInside(drawing.size, std::visit([](const auto& any) { return any.rect; }, step))))
+            continue;
+        const auto* fill = std::get_if<FilledRect>(&step);
+        if (!isClear && fill && !(fill->color.alpha >= 1))
+            return true;
+        isClear = false;
+    }
+    return false;
+}
+
 }  // namespace
 
-// Not changed once it has become the picture of an image.
-class Drawing::Recording final : public Picture {
-  public:
-    explicit Recording(Size size) : size_(size) { steps_.reserve(usualSteps); }
-
-    void add(Step step) { steps_.push_back(std::move(step)); }
-
-    Size naturalSize() const override { return size_; }
-    bool isDrawable() const override { return isDrawableSize(size_.width, size_.height); }
-    std::optional<Bitmap> draw(int width, int height) const override {
-        if (!isDrawable())
-            return std::nullopt;
-        return paint(width, height, size_,
-                     [this](cairo_t* context) { return play(context, Player::Ground::clear); });
-    }
-    bool drawOver(Bitmap& bitmap) const override {
-        if (!isDrawable() || !isWhole(bitmap))
-            return false;
-        if (replacesWhatWasDrawn())
-            return Picture::drawOver(bitmap);
-        return paintOver(bitmap, size_,
-                         [this](cairo_t* context) { return play(context, Player::Ground::picture); });
-    }
-
-  private:
-    bool play(cairo_t* context, Player::Ground ground) const {
-        const Player player(context, size_, ground);
-        for (const Step& step : steps_)
-            std::visit(player, step);
-        return true;
-    }
-    // Whether a rectangle that one can see through may replace what another step drew; where exactly that is
-    // doesn't count.
-    bool replacesWhatWasDrawn() const {
-        bool isClear = true;
-        for (const Step& step : steps_) {
-            if (isEmpty(partInside(size_, std::visit([](const auto& any) { return any.rect; }, step))))
-                continue;
-            const auto* fill = std::get_if<FilledRect>(&step);
-            if (!isClear && fill && !(fill->color.alpha >= 1))
-                return true;
-            isClear = false;
-        }
-        return false;
-    }
-
-    static constexpr std::size_t usualSteps = 4;  // of an overlay
-
-    const Size size_;
-    std::vector<Step> steps_;
-};
-
-Drawing::Drawing(Size size) : recording_(std::make_shared<Recording>(size)) {}
-
-Drawing::~Drawing() = default;
-
-Size Drawing::size() const {
-    return recording_->naturalSize();
+std::optional<Bitmap> played(const RecordedDrawing& drawing, int width, int height) {
+    return paint(width, height, drawing.size,
+                 [&](cairo_t* context) { return play(context, drawing, Player::Ground::clear); });
 }
 
-void Drawing::fillRect(const Rect& rect) {
-    recording_->add(FilledRect{rect, color_});
-}
-
-void Drawing::fillRoundedRect(const Rect& rect, double radius) {
-    recording_->add(RoundedRect{rect, radius, color_});
-}
-
-void Drawing::drawImage(const Image& image, const Rect& inRect) {
-    if (image.picture())
-        recording_->add(DrawnImage{image.picture(), inRect});
-}
-
-void Drawing::drawString(const AttributedString& text, const Rect& inRect) {
-    recording_->add(DrawnText{text, inRect});
-}
-
-ImageRef Drawing::image() {
-    return std::make_shared<Image>(std::move(recording_));
-}
-
-AttributedString::AttributedString(std::string text, Font font, Color color)
-    : text_(std::move(text)), font_(font), color_(color) {}
-
-Size AttributedString::size() const {
-    const TextLine* line = lineOf(*this);
-    return line ? line->size() : Size{};
+bool playOver(Bitmap& bitmap, const RecordedDrawing& drawing) {
+    if (!replacesWhatWasDrawn(drawing))
+        return paintOver(bitmap, drawing.size,
+                         [&](cairo_t* context) { return play(context, drawing, Player::Ground::picture); });
+    const auto drawn = played(drawing, bitmap.width, bitmap.height);
+    return drawn && layOver(bitmap, *drawn);
 }
 
 }  // namespace platform

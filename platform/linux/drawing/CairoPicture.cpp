@@ -1,15 +1,15 @@
-// Pictures of data, drawn with Cairo: PNG by its own decoder, SVG by librsvg.
+#include "platform/linux/drawing/CairoPicture.h"
+
 #include <librsvg/rsvg.h>
 
 #include <array>
 #include <cstring>
-#include <mutex>
 #include <new>
 #include <utility>
 
 #include "platform/ThreadSafety.h"
-#include "platform/linux/CairoCanvas.h"
-#include "platform/linux/VectorCheck.h"
+#include "platform/linux/drawing/CairoCanvas.h"
+#include "platform/linux/drawing/VectorCheck.h"
 
 namespace platform {
 
@@ -31,13 +31,6 @@ bool paintBitmap(cairo_t* context, const Bitmap& bitmap) {
     cairo_paint(context);
     return true;
 }
-
-class UndrawablePicture final : public Picture {
-  public:
-    Size naturalSize() const override { return {}; }
-    bool isDrawable() const override { return false; }
-    std::optional<Bitmap> draw(int, int) const override { return std::nullopt; }
-};
 
 class BitmapPicture final : public Picture {
   public:
@@ -147,55 +140,31 @@ Size sizeOf(RsvgHandle& handle) {
     return hasViewBox ? Size{viewBox.width, viewBox.height} : Size{};
 }
 
-// An SVG, parsed when it is first needed: programs that only print names have icons and draw none.
 class VectorPicture final : public Picture {
   public:
-    explicit VectorPicture(Bytes data) : data_(data.begin(), data.end()) {}
+    VectorPicture(Handle handle, Size size) : handle_(std::move(handle)), size_(size) {}
 
-    Size naturalSize() const override { return document().size; }
-    bool isDrawable() const override { return naturalSize() != Size{}; }
+    Size naturalSize() const override { return size_; }
+    bool isDrawable() const override { return true; }
     std::optional<Bitmap> draw(int width, int height) const override {
         if (auto kept = renderings_.find(width, height))
             return kept;
-        const Size size = naturalSize();
-        if (size == Size{})
-            return std::nullopt;
-        auto bitmap = paint(width, height, size, [&](cairo_t* context) { return render(context, size); });
+        auto bitmap = paint(width, height, size_, [this](cairo_t* context) { return render(context); });
         if (bitmap)
             renderings_.keep(*bitmap);
         return bitmap;
     }
 
   private:
-    struct Document {
-        Handle handle;
-        Size size;  // nothing when it can't be drawn
-    };
-
-    const Document& document() const {
-        std::call_once(isParsed_, [this] {
-            document_ = parsed(data_);
-            data_ = {};
-        });
-        return document_;
-    }
-    static Document parsed(const std::vector<std::byte>& data) {
-        Handle handle = parsedSVG(data);
-        const Size size = handle ? sizeOf(*handle) : Size{};
-        if (!isDrawableSize(size.width, size.height))
-            return {};
-        return {std::move(handle), size};
-    }
     // Even drawing changes the state of a handle. Drawing may take long, so nobody else waits for it.
-    bool render(cairo_t* context, Size size) const VX_EXCLUDES(drawing_) {
-        const RsvgRectangle area{0, 0, size.width, size.height};
+    bool render(cairo_t* context) const VX_EXCLUDES(drawing_) {
+        const RsvgRectangle area{0, 0, size_.width, size_.height};
         Locked lock(drawing_);
-        return rsvg_handle_render_document(document().handle.get(), context, &area, nullptr);
+        return rsvg_handle_render_document(handle_.get(), context, &area, nullptr);
     }
 
-    mutable std::once_flag isParsed_;
-    mutable std::vector<std::byte> data_;  // until it is parsed
-    mutable Document document_;
+    const Handle handle_;
+    const Size size_;
     mutable Mutex drawing_;
     mutable Renderings renderings_;
 };
@@ -211,33 +180,29 @@ cairo_status_t appendBytes(void* closure, const unsigned char* buffer, unsigned 
 
 }  // namespace
 
-bool Picture::drawOver(Bitmap& bitmap) const {
-    const auto drawn = isWhole(bitmap) ? draw(bitmap.width, bitmap.height) : std::nullopt;
-    if (!drawn || !isWhole(*drawn))
-        return false;
-    return paintOver(bitmap, {double(drawn->width), double(drawn->height)},
-                     [&](cairo_t* context) { return paintBitmap(context, *drawn); });
+bool layOver(Bitmap& bitmap, const Bitmap& drawn) {
+    return paintOver(bitmap, {double(drawn.width), double(drawn.height)},
+                     [&](cairo_t* context) { return paintBitmap(context, drawn); });
 }
 
-std::shared_ptr<const Picture> pictureWithData(std::span<const std::byte> data) {
-    if (isPNG(data)) {
-        if (auto bitmap = decodedPNG(data))
-            return std::make_shared<BitmapPicture>(*std::move(bitmap));
-        return std::make_shared<UndrawablePicture>();
-    }
-    return std::make_shared<VectorPicture>(data);
-}
-
-std::shared_ptr<const Picture> pictureWithBitmap(Bitmap bitmap) {
-    if (!isWhole(bitmap))
-        return std::make_shared<UndrawablePicture>();
+std::shared_ptr<const Picture> newBitmapPicture(Bitmap bitmap) {
     return std::make_shared<BitmapPicture>(std::move(bitmap));
 }
 
-std::vector<std::byte> pngData(const Bitmap& bitmap) {
+std::shared_ptr<const Picture> newDataPicture(Bytes data) {
+    if (isPNG(data)) {
+        auto bitmap = decodedPNG(data);
+        return bitmap ? newBitmapPicture(*std::move(bitmap)) : nullptr;
+    }
+    Handle handle = parsedSVG(data);
+    const Size size = handle ? sizeOf(*handle) : Size{};
+    if (!isDrawableSize(size.width, size.height))
+        return nullptr;
+    return std::make_shared<VectorPicture>(std::move(handle), size);
+}
+
+std::vector<std::byte> encodedPNG(const Bitmap& bitmap) {
     std::vector<std::byte> bytes;
-    if (!isWhole(bitmap))
-        return bytes;
     const CairoSurface surface = surfaceOf(bitmap);
     if (cairo_surface_write_to_png_stream(surface.get(), appendBytes, &bytes) != CAIRO_STATUS_SUCCESS)
         bytes.clear();

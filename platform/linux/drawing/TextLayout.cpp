@@ -1,4 +1,4 @@
-#include "platform/linux/TextLayout.h"
+#include "platform/linux/drawing/TextLayout.h"
 
 #include <span>
 #include <unordered_map>

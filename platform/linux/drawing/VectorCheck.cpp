@@ -1,4 +1,4 @@
-#include "platform/linux/VectorCheck.h"
+#include "platform/linux/drawing/VectorCheck.h"
 
 #include <expat.h>
 #include <glib.h>

@@ -1,0 +1,27 @@
+#include "platform/linux/RendererModule.h"
+
+#include <dlfcn.h>
+
+#include <stdexcept>
+
+#include "platform/Path.h"
+#include "platform/linux/OwnLibrary.h"
+
+namespace platform {
+
+const Renderer& rendererOfModule(const std::string& path) {
+    // It is never unloaded: pictures of its classes may outlive everything else.
+    void* module = dlopen(path.c_str(), RTLD_LAZY | RTLD_LOCAL | RTLD_NODELETE);
+    void* entry = module ? dlsym(module, "vexoRenderer") : nullptr;
+    if (!entry)
+        throw std::runtime_error(dlerror());
+    return *reinterpret_cast<decltype(&vexoRenderer)>(entry)();
+}
+
+const Renderer& renderer() {
+    static const Renderer& installed =
+        rendererOfModule(path::appending(ownLibraryFolder(), "vexo/libVexoDrawing.so"));
+    return installed;
+}
+
+}  // namespace platform

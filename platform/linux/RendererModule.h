@@ -1,0 +1,16 @@
+// The library that draws, VexoDrawing, as the framework's finds and loads it.
+#pragma once
+
+#include <string>
+
+#include "platform/Renderer.h"
+
+// What the library exports. The renderer is the library's and lives as long as the process.
+extern "C" const platform::Renderer* vexoRenderer();
+
+namespace platform {
+
+// Of the library at `path`, which stays loaded. Throws a std::runtime_error that says why it can't be had.
+const Renderer& rendererOfModule(const std::string& path);
+
+}  // namespace platform
