@@ -26,6 +26,10 @@
 
 namespace reelix {
 
+namespace ReelixSupport {
+struct OrderedEvent;
+}
+
 class VXReelixPlugin : public vexo::VXMediaManager,
                        public vexo::VXMediaManagerPlugin_MustImplement,
                        public platform::KeyedUnarchiverDelegate {
@@ -235,7 +239,7 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     struct EventYears;
     class EventLibraryScan;
     class EventScansAhead;
-    using YearGroups = std::map<double, Group>;  // the year groups of one event library by their years
+    struct YearGroups;
 
     void scanProjectLibraries(Groups& libraries) VX_REQUIRES(_monitor);
     Group projectGroupForPackage(const std::string& package, const std::string& folder) VX_REQUIRES(_monitor);
@@ -246,7 +250,8 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     void scanEventLibraries(const Group& holder) VX_REQUIRES(_monitor);
     void watchEventLibrary(const std::string& folder);
     Group newEventLibraryGroup(const std::optional<std::string>& parentID);
-    void fileEventUnderItsYear(const Group& event, const Group& eventLibrary, YearGroups& years);
+    void fileEventUnderItsYear(ReelixSupport::OrderedEvent event, const Group& eventLibrary,
+                               YearGroups& years);
     Group newYearGroup(const std::optional<platform::Value>& year);
 
     // The one that was begun ahead, or a new one.

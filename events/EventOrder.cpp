@@ -21,22 +21,6 @@ std::optional<double> secondsOfDate(const platform::Dictionary& attributes, std:
     return date ? std::optional(date->secondsSinceReferenceDate()) : std::nullopt;
 }
 
-// What the comparisons by year look at.
-struct EventKeys {
-    explicit EventKeys(VXMediaGroupRef group) : event(std::move(group)) {
-        const auto attributes = event->attributes();
-        if (const platform::Value* value = platform::find(*attributes, VXReelixEventCreationYear))
-            year = value->doubleValue();
-        oldest = secondsOfDate(*attributes, VXReelixEventOldestClipDate);
-        newest = secondsOfDate(*attributes, VXReelixEventNewestClipDate);
-    }
-
-    VXMediaGroupRef event;
-    std::optional<double> year;
-    std::optional<double> oldest;
-    std::optional<double> newest;
-};
-
 // A missing date compares as same.
 ComparisonResult compareDates(const std::optional<double>& a, const std::optional<double>& b) {
     return a && b ? compareNumbers(*a, *b) : ComparisonResult::same;
@@ -50,7 +34,7 @@ ComparisonResult compareNames(const vexo::VXMediaGroup& a, const vexo::VXMediaGr
     return platform::caseInsensitiveCompare(*nameOfA, *nameOfB);
 }
 
-ComparisonResult compareOldestFirst(const EventKeys& a, const EventKeys& b) {
+ComparisonResult compareOldestFirst(const OrderedEvent& a, const OrderedEvent& b) {
     if (!a.year || !b.year)
         return ComparisonResult::same;
     if (const auto byYear = compareNumbers(*a.year, *b.year); byYear != ComparisonResult::same)
@@ -62,7 +46,7 @@ ComparisonResult compareOldestFirst(const EventKeys& a, const EventKeys& b) {
     return compareNames(*a.event, *b.event);
 }
 
-ComparisonResult compareNewestFirst(const EventKeys& a, const EventKeys& b) {
+ComparisonResult compareNewestFirst(const OrderedEvent& a, const OrderedEvent& b) {
     if (!a.year || !b.year)
         return ComparisonResult::same;
     if (const auto byYear = compareNumbers(*a.year, *b.year); byYear != ComparisonResult::same)
@@ -81,21 +65,34 @@ bool isEventLibrary(const VXMediaGroupRef& group) {
 }  // namespace
 
 ComparisonResult _eventComparisonByYearOldestFirst(const VXMediaGroupRef& a, const VXMediaGroupRef& b) {
-    return compareOldestFirst(EventKeys(a), EventKeys(b));
+    return compareOldestFirst(OrderedEvent(a), OrderedEvent(b));
 }
 
 ComparisonResult _eventComparisonByYearNewestFirst(const VXMediaGroupRef& a, const VXMediaGroupRef& b) {
-    return compareNewestFirst(EventKeys(a), EventKeys(b));
+    return compareNewestFirst(OrderedEvent(a), OrderedEvent(b));
 }
 
-vexo::VXMediaGroupList sortedByYear(const vexo::VXMediaGroupList& events, EventOrder order) {
-    const std::vector<EventKeys> keys(events.begin(), events.end());
-    std::vector<VXMediaGroupRef> sorted;
-    sorted.reserve(keys.size());
-    for (EventKeys& key :
-         stableSorted(keys, order == EventOrder::newestFirst ? compareNewestFirst : compareOldestFirst))
-        sorted.push_back(std::move(key.event));
-    return vexo::VXMediaGroupList(std::move(sorted));
+OrderedEvent::OrderedEvent(VXMediaGroupRef group) : event(std::move(group)) {
+    const auto attributes = event->attributes();
+    if (const platform::Value* value = platform::find(*attributes, VXReelixEventCreationYear))
+        year = value->doubleValue();
+    oldest = secondsOfDate(*attributes, VXReelixEventOldestClipDate);
+    newest = secondsOfDate(*attributes, VXReelixEventNewestClipDate);
+}
+
+std::vector<OrderedEvent> sortedByYear(std::vector<OrderedEvent> events, EventOrder order) {
+    std::vector<OrderedEvent*> inOrder;
+    inOrder.reserve(events.size());
+    for (OrderedEvent& event : events)
+        inOrder.push_back(&event);
+    const auto compare = order == EventOrder::newestFirst ? compareNewestFirst : compareOldestFirst;
+    inOrder =
+        stableSorted(inOrder, [&](const OrderedEvent* a, const OrderedEvent* b) { return compare(*a, *b); });
+    std::vector<OrderedEvent> sorted;
+    sorted.reserve(events.size());
+    for (OrderedEvent* event : inOrder)
+        sorted.push_back(std::move(*event));
+    return sorted;
 }
 
 ComparisonResult _eventComparisonAlphabetically(const VXMediaGroupRef& a, const VXMediaGroupRef& b) {

@@ -2,6 +2,9 @@
 // adds to VXMediaGroup, the receiver first. Callable from any thread.
 #pragma once
 
+#include <optional>
+#include <vector>
+
 #include "host/VXMediaGroup.h"
 #include "platform/Text.h"
 
@@ -22,9 +25,19 @@ ComparisonResult _eventComparisonByYearNewestFirst(const vexo::VXMediaGroupRef& 
 
 enum class EventOrder { oldestFirst, newestFirst };
 
-// Sorted by one of the two comparisons above. What these look at is asked of each event once, and not of two
-// events again and again.
-vexo::VXMediaGroupList sortedByYear(const vexo::VXMediaGroupList& events, EventOrder order);
+// An event with what the two comparisons above look at, asked of it once, and not of two events again and
+// again.
+struct OrderedEvent {
+    explicit OrderedEvent(vexo::VXMediaGroupRef group);
+
+    vexo::VXMediaGroupRef event;
+    std::optional<double> year;
+    std::optional<double> oldest;  // dates, in seconds from the reference date
+    std::optional<double> newest;
+};
+
+// Sorted by one of the two.
+std::vector<OrderedEvent> sortedByYear(std::vector<OrderedEvent> events, EventOrder order);
 
 // _eventComparisonAlphabetically:; nothing in the plug-in sorts by it.
 ComparisonResult _eventComparisonAlphabetically(const vexo::VXMediaGroupRef& a,

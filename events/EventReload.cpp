@@ -11,6 +11,7 @@ namespace reelix {
 
 using platform::Locked;
 using ReelixSupport::EventOrder;
+using ReelixSupport::OrderedEvent;
 using ReelixSupport::sortedByYear;
 using vexo::VXMediaGroupList;
 using vexo::VXPathWatcher;
@@ -23,7 +24,26 @@ std::optional<platform::Value> yearOf(const vexo::VXMediaGroup& group) {
     return year ? std::optional(*year) : std::nullopt;
 }
 
+VXMediaGroupList groupsOf(std::vector<OrderedEvent> events) {
+    std::vector<vexo::VXMediaGroupRef> groups;
+    groups.reserve(events.size());
+    for (OrderedEvent& event : events)
+        groups.push_back(std::move(event.event));
+    return VXMediaGroupList(std::move(groups));
+}
+
 }  // namespace
+
+// The year groups of one event library, with the events that were filed under them.
+struct VXReelixPlugin::YearGroups {
+    struct YearGroup {
+        Group group;
+        std::vector<OrderedEvent> events;
+    };
+
+    std::vector<YearGroup> inOrder;
+    std::map<double, std::size_t> placeOfYear;
+};
 
 // Duplicates stay, and so do folders that do not exist.
 void VXReelixPlugin::_prepareReelixEventsSearchPaths() {
@@ -56,16 +76,17 @@ VXReelixPlugin::Group VXReelixPlugin::_reloadReelixEvents(const std::optional<st
 
     const EventOrder order = _mostRecentEventFirst ? EventOrder::newestFirst : EventOrder::oldestFirst;
     const Group eventLibrary = newEventLibraryGroup(parentID);
+    const VXMediaGroupList events = holder->childGroups();
     YearGroups years;
-    for (const Group& event : sortedByYear(holder->childGroups(), order)) {
+    for (OrderedEvent& event : sortedByYear({events.begin(), events.end()}, order)) {
         if (isCancelLoadRequestPending())
             break;
-        fileEventUnderItsYear(event, eventLibrary, years);
+        fileEventUnderItsYear(std::move(event), eventLibrary, years);
     }
-    for (const Group& year : eventLibrary->childGroups()) {
+    for (YearGroups::YearGroup& year : years.inOrder) {
         if (isCancelLoadRequestPending())
             break;
-        year->setChildGroups(sortedByYear(year->childGroups(), order));
+        year.group->setChildGroups(groupsOf(sortedByYear(std::move(year.events), order)));
     }
 
     if (updateRootMediaGroup && !isCancelLoadRequestPending()) {
@@ -116,19 +137,18 @@ VXReelixPlugin::Group VXReelixPlugin::newEventLibraryGroup(const std::optional<s
 }
 
 // An event without a year matches no year group, so each such event gets one of its own.
-void VXReelixPlugin::fileEventUnderItsYear(const Group& event, const Group& eventLibrary, YearGroups& years) {
-    const std::optional<platform::Value> year = yearOf(*event);
-    const std::optional<double> number = year ? year->doubleValue() : std::nullopt;
-    const auto known = number ? years.find(*number) : years.end();
-    if (known != years.end()) {
-        known->second->addChildGroup(event);
-        return;
+void VXReelixPlugin::fileEventUnderItsYear(ReelixSupport::OrderedEvent event, const Group& eventLibrary,
+                                           YearGroups& years) {
+    std::size_t place = years.inOrder.size();
+    if (event.year)
+        place = years.placeOfYear.try_emplace(*event.year, place).first->second;
+    if (place == years.inOrder.size()) {
+        years.inOrder.push_back({newYearGroup(yearOf(*event.event)), {}});
+        eventLibrary->addChildGroup(years.inOrder.back().group);
     }
-    const Group yearGroup = newYearGroup(year);
-    yearGroup->addChildGroup(event);
-    eventLibrary->addChildGroup(yearGroup);
-    if (number)
-        years.emplace(*number, yearGroup);
+    YearGroups::YearGroup& year = years.inOrder[place];
+    year.group->addChildGroup(event.event);
+    year.events.push_back(std::move(event));
 }
 
 VXReelixPlugin::Group VXReelixPlugin::newYearGroup(const std::optional<platform::Value>& year) {

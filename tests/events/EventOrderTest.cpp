@@ -206,10 +206,11 @@ TEST(SortedEvents, AreThoseThatTheComparisonsSort) {
         const auto oldest = i % 5 == 0 ? std::nullopt : std::optional(i * 7 % 3);
         events.push_back(group({std::to_string(i * 31 % 60), year, oldest, i * 11 % 3}));
     }
-    const vexo::VXMediaGroupList list(events);
-    const auto sorted = [&list](order::EventOrder by) {
-        const auto result = order::sortedByYear(list, by);
-        return std::vector<VXMediaGroupRef>(result.begin(), result.end());
+    const auto sorted = [&events](order::EventOrder by) {
+        std::vector<VXMediaGroupRef> result;
+        for (const order::OrderedEvent& each : order::sortedByYear({events.begin(), events.end()}, by))
+            result.push_back(each.event);
+        return result;
     };
     EXPECT_EQ(sorted(order::EventOrder::oldestFirst),
               reelix::stableSorted(events, order::_eventComparisonByYearOldestFirst));
