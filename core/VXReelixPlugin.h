@@ -256,7 +256,8 @@ class VXReelixPlugin : public vexo::VXMediaManager,
 
     // The one that was begun ahead, or a new one.
     std::shared_ptr<EventLibraryScan> scanOfEventLibrary(const std::string& folder) VX_REQUIRES(_monitor);
-    Group eventGroupForFolder(const std::string& folder, const std::string& libraryFolder);
+    Group eventGroupForFolder(const std::string& folder, const std::string& libraryFolder,
+                              platform::DateRef modificationDate);
     // Gives the event its clips; false when it has none.
     bool finishEvent(ScannedEvent scanned);
     void writeEventAttributes(const Group& event, const EventYears& years);

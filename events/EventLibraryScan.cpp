@@ -58,16 +58,6 @@ int creationYear(const platform::DateRef& creationDate) {
     return creationDate ? platform::yearInCurrentCalendar(*creationDate) : yearWithoutCreationDate;
 }
 
-// The paths of the folders in a library that may be events.
-std::vector<std::string> eventFolders(const platform::Folder& library, const std::string& libraryFolder) {
-    std::vector<std::string> folders;
-    for (const platform::FolderItem& item : library.items()) {
-        if (!isHiddenName(item.name) && hasFlags(library.flagsOf(item), platform::itemIsContainer))
-            folders.push_back(path::appending(libraryFolder, item.name));
-    }
-    return folders;
-}
-
 }  // namespace
 
 void VXReelixPlugin::EventYears::add(const EventYears& following) {
@@ -95,7 +85,7 @@ VXReelixPlugin::EventLibraryScan::EventLibraryScan(VXReelixPlugin& plugin, std::
 
 bool VXReelixPlugin::EventLibraryScan::hasEntries() const {
     Locked lock(mutex_);
-    return hasEntries_;
+    return library_ && !library_->items().empty();
 }
 
 std::vector<VXReelixPlugin::ScannedEvent> VXReelixPlugin::EventLibraryScan::takeEvents() {
@@ -120,6 +110,7 @@ bool VXReelixPlugin::EventLibraryScan::scanNextClips() {
 std::optional<VXReelixPlugin::EventLibraryScan::Piece> VXReelixPlugin::EventLibraryScan::takePiece() {
     for (;;) {
         ScannedEvent* event = nullptr;
+        const platform::Folder* library = nullptr;
         {
             Locked lock(mutex_);
             if (!isOpened_)
@@ -128,21 +119,23 @@ std::optional<VXReelixPlugin::EventLibraryScan::Piece> VXReelixPlugin::EventLibr
             if (!openFolders_.empty())
                 return nextPiece();
             event = nextFolderToOpen();
+            library = library_.get();
         }
         if (!event)
             return std::nullopt;
-        openEvent(*event);
+        openEvent(*library, *event);
     }
 }
 
 void VXReelixPlugin::EventLibraryScan::openLibrary() {
     isOpened_ = true;
-    const auto library = platform::services().fileManager.openFolderAtPath(libraryFolder_);
-    if (!library)
+    library_ = platform::services().fileManager.openFolderAtPath(libraryFolder_);
+    if (!library_)
         return;
-    hasEntries_ = !library->items().empty();
-    for (std::string& folder : eventFolders(*library, libraryFolder_))
-        events_.push_back({std::move(folder), nullptr, nullptr, {}, {}});
+    for (const platform::FolderItem& item : library_->items()) {
+        if (!isHiddenName(item.name) && hasFlags(library_->flagsOf(item), platform::itemIsContainer))
+            events_.push_back({path::appending(libraryFolder_, item.name), &item, nullptr, nullptr, {}, {}});
+    }
 }
 
 void VXReelixPlugin::EventLibraryScan::waitForWork() {
@@ -168,11 +161,11 @@ VXReelixPlugin::ScannedEvent* VXReelixPlugin::EventLibraryScan::nextFolderToOpen
 }
 
 // Who waits for the folder hears that it's done, also when opening it raises.
-void VXReelixPlugin::EventLibraryScan::openEvent(ScannedEvent& event) {
+void VXReelixPlugin::EventLibraryScan::openEvent(const platform::Folder& library, ScannedEvent& event) {
     FolderRef folder;
     std::exception_ptr failure;
     try {
-        folder = folderOfEvent(event);
+        folder = folderOfEvent(library, event);
     } catch (...) {
         failure = std::current_exception();
     }
@@ -187,15 +180,16 @@ void VXReelixPlugin::EventLibraryScan::openEvent(ScannedEvent& event) {
 
 // An empty folder is no event.
 VXReelixPlugin::EventLibraryScan::FolderRef VXReelixPlugin::EventLibraryScan::folderOfEvent(
-    ScannedEvent& event) const {
-    const std::string& path = *event.folder.string();
-    FolderRef folder = platform::services().fileManager.openFolderAtPath(path);
+    const platform::Folder& library, ScannedEvent& event) const {
+    FolderRef folder = library.openFolder(*event.item);
     if (!folder || folder->items().empty())
         return nullptr;
     event.clips.resize(folder->items().size());
     event.years.resize((event.clips.size() - 1) / clipsAPiece + 1);
     event.clipIcon = iconCache().smallApplicationIcon.get();
-    event.event = plugin_.eventGroupForFolder(path, libraryFolder_);
+    const auto attributes = folder->attributes();
+    event.event = plugin_.eventGroupForFolder(*event.folder.string(), libraryFolder_,
+                                              attributes ? attributes->modificationDate : nullptr);
     return folder;
 }
 

@@ -36,11 +36,12 @@ struct VXReelixPlugin::EventYears {
 
 // A folder that may be an event, and what was found in it.
 struct VXReelixPlugin::ScannedEvent {
-    platform::Value folder;         // its path, one text for all its clips
-    Group event;                    // nil for a folder that is none
-    platform::ImageRef clipIcon;    // asked for once for all its clips
-    Objects clips;                  // one for each item of the folder, nil for what is no clip
-    std::vector<EventYears> years;  // of each piece of the clips
+    platform::Value folder;            // its path, one text for all its clips
+    const platform::FolderItem* item;  // of the library's folder, as long as that is open
+    Group event;                       // nil for a folder that is none
+    platform::ImageRef clipIcon;       // asked for once for all its clips
+    Objects clips;                     // one for each item of the folder, nil for what is no clip
+    std::vector<EventYears> years;     // of each piece of the clips
 };
 
 class VXReelixPlugin::EventLibraryScan {
@@ -93,9 +94,9 @@ class VXReelixPlugin::EventLibraryScan {
     Piece nextPiece() VX_REQUIRES(mutex_);
     // nil when there is none left.
     ScannedEvent* nextFolderToOpen() VX_REQUIRES(mutex_);
-    void openEvent(ScannedEvent& event) VX_EXCLUDES(mutex_);
+    void openEvent(const platform::Folder& library, ScannedEvent& event) VX_EXCLUDES(mutex_);
     // nil for a folder that is no event.
-    FolderRef folderOfEvent(ScannedEvent& event) const;
+    FolderRef folderOfEvent(const platform::Folder& library, ScannedEvent& event) const;
     // nil for what is no clip.
     Object clipForFile(const platform::Folder& folder, const ScannedEvent& event,
                        const platform::FolderItem& item, EventYears& years) const;
@@ -112,7 +113,7 @@ class VXReelixPlugin::EventLibraryScan {
 
     mutable platform::Mutex mutex_;
     bool isOpened_ VX_GUARDED_BY(mutex_) = false;
-    bool hasEntries_ VX_GUARDED_BY(mutex_) = false;
+    FolderRef library_ VX_GUARDED_BY(mutex_);                 // nil until it is opened, and when it can't be
     std::vector<ScannedEvent> events_ VX_GUARDED_BY(mutex_);  // each stays where it is
     std::size_t nextEvent_ VX_GUARDED_BY(mutex_) = 0;         // whose folder nobody has begun to open
     int foldersBeingOpened_ VX_GUARDED_BY(mutex_) = 0;

@@ -44,11 +44,12 @@ std::shared_ptr<VXReelixPlugin::EventLibraryScan> VXReelixPlugin::scanOfEventLib
 }
 
 VXReelixPlugin::Group VXReelixPlugin::eventGroupForFolder(const std::string& folder,
-                                                          const std::string& libraryFolder) {
+                                                          const std::string& libraryFolder,
+                                                          platform::DateRef modificationDate) {
     const Group event = newMediaGroupWithTypeIdentifier(vexo::VXReelixEventGroupTypeIdentifier, folder);
     event->setName(path::lastComponent(folder));
     event->setParentID(libraryFolder);
-    event->setModificationDate(vexo::VXMediaGroup::modDateForFile(folder));
+    event->setModificationDate(std::move(modificationDate));
     event->setIcon(iconCache().eventIcon.get());
     event->setPath(folder);
     return event;

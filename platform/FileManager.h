@@ -44,8 +44,8 @@ struct FolderItem {
 
 // A folder that is gone through. Each question answers as the operation by path does and costs as few calls
 // to the system as can be, often none: what the listing told is not asked again, so an item that has vanished
-// since may still be told of by everything but its attributes. It holds a file open: down a tree each is
-// closed before the next is entered.
+// since may still be told of by everything but its attributes. It holds a file open: down a tree,
+// which may be deep, each is closed before the next is entered.
 //
 // Callable from any thread.
 class Folder {
@@ -61,10 +61,14 @@ class Folder {
     virtual bool isPlainFile(const FolderItem& item) const = 0;
     // As attributesOfItemAtPath answers.
     virtual std::optional<FileAttributes> attributesOf(const FolderItem& item) const = 0;
+    // The folder's own, as they were when it was opened.
+    virtual std::optional<FileAttributes> attributes() const = 0;
     // As FileManager::extendedAttribute answers; nil when it is not even known whether the item is there.
     virtual std::optional<std::ptrdiff_t> extendedAttributeOf(const FolderItem& item,
                                                               std::string_view attribute,
                                                               std::span<char> buffer) const = 0;
+    // The folder that the item is, as openFolderAtPath opens it. It may outlive this one.
+    virtual std::unique_ptr<Folder> openFolder(const FolderItem& item) const = 0;
 };
 
 class FileManager {

@@ -79,7 +79,7 @@ FolderLook lookInto(const std::string& folder, const std::atomic<bool>& stopped)
     for (const platform::FolderItem& item : listing->items) {
         if (stopped)
             break;
-        add(look, dirfd(listing->folder.get()), item.name);
+        add(look, listing->folder.number(), item.name);
     }
     return look;
 }

@@ -3,7 +3,7 @@
 // attributes by path alone: there a folder that is moved has none any more.
 #pragma once
 
-#include <dirent.h>
+#include <sys/stat.h>
 
 #include <atomic>
 #include <cstdint>
@@ -15,23 +15,20 @@
 
 #include "platform/FileManager.h"
 #include "platform/SystemLog.h"
+#include "platform/linux/FileDescriptor.h"
 #include "platform/linux/HiddenNames.h"
 #include "platform/linux/MountReach.h"
-
-struct statx;
 
 namespace platform {
 
 // An open folder with what lies in it, in the order of the file system.
 struct FolderListing {
-    struct Closer {
-        void operator()(DIR* opened) const { closedir(opened); }
-    };
-
     // nil, and errno set, when the folder can't be listed.
     static std::optional<FolderListing> open(const std::string& path);
+    // By its name in an open folder.
+    static std::optional<FolderListing> open(int parent, const std::string& name);
 
-    std::unique_ptr<DIR, Closer> folder;
+    FileDescriptor folder;
     std::vector<FolderItem> items;
 };
 
@@ -45,17 +42,34 @@ class LinuxFolder final : public Folder {
         SystemLog& systemLog;
     };
 
-    // `path` is the one by which the kernel knows the folder. The services must outlive the folder.
+    // `path` is the one by which the kernel knows the folder. The services must outlive the folder, and those
+    // that are opened from it.
     LinuxFolder(FolderListing listing, std::string path, const Services& services);
 
     const std::vector<FolderItem>& items() const override { return listing_.items; }
     std::optional<std::uint32_t> flagsOf(const FolderItem& item) const override;
     bool isPlainFile(const FolderItem& item) const override;
     std::optional<FileAttributes> attributesOf(const FolderItem& item) const override;
+    std::optional<FileAttributes> attributes() const override;
     std::optional<std::ptrdiff_t> extendedAttributeOf(const FolderItem& item, std::string_view attribute,
                                                       std::span<char> buffer) const override;
+    std::unique_ptr<Folder> openFolder(const FolderItem& item) const override;
 
   private:
+    // What is found out once for the folders on one device, each opened from another.
+    struct Device {
+        explicit Device(const std::optional<struct ::statx>& folder);
+        bool holds(const std::optional<struct ::statx>& folder) const;
+
+        const std::optional<dev_t> number;
+        const bool mayHoldHiddenFlags;  // of FAT and NTFS
+        // Whether its files may have attributes by the names of foreign volumes' drivers.
+        std::atomic<bool> mayHaveForeignNames = true;
+    };
+
+    LinuxFolder(FolderListing listing, std::string path, const Services& services,
+                const std::shared_ptr<Device>& deviceOfParent);
+
     // Not behind a link to a mount that doesn't answer.
     bool isInReach(const FolderItem& item) const;
     std::optional<struct ::statx> statusOf(const FolderItem& item, int flags) const;
@@ -66,9 +80,8 @@ class LinuxFolder final : public Folder {
     const std::string path_;
     const Services& services_;
     const std::shared_ptr<const NameSet> hiddenNames_;  // nil for none
-    const bool mayHoldHiddenFlags_;                     // of FAT and NTFS
-    // Whether files on the folder's device may have attributes by the names of foreign volumes' drivers.
-    mutable std::atomic<bool> mayHaveForeignNames_ = true;
+    const std::optional<struct ::statx> status_;        // nil when the kernel didn't tell
+    const std::shared_ptr<Device> device_;
 };
 
 }  // namespace platform

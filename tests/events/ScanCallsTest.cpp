@@ -71,9 +71,9 @@ class ScanCallsTest : public PluginTest {
   protected:
     std::string library() const { return home().path("Movies/Reelix Events"); }
     // Each name begins as given and ends in a number of two digits.
-    void addClips(int count, const std::string& name) {
+    void addClips(int count, const std::string& name, const std::string& event = "Trip") {
         for (int i = 0; i < count; ++i, ++clips_)
-            home().writeFile("Movies/Reelix Events/Trip/" + name + std::to_string(10 + i) + ".mov");
+            home().writeFile("Movies/Reelix Events/" + event + "/" + name + std::to_string(10 + i) + ".mov");
     }
     Calls callsOfAScan() {
         const Calls before{looks, attributeReads};
@@ -111,6 +111,17 @@ TEST_F(ScanCallsTest, AClipWithoutADateTakesALookAtItsCreationDateAsWell) {
     EXPECT_EQ(many.looks - few.looks, 40);
     EXPECT_EQ(many.attributeReads - few.attributeReads, 40);
     EXPECT_GE(few.looks, 20);
+}
+
+// Whether a file system knows the names of foreign drivers' attributes is asked once for all its folders.
+TEST_F(ScanCallsTest, AnEventTakesOneLookAndNoReadBesideThoseOfItsClips) {
+    addClips(1, "one ");
+    const Calls one = callsOfAScan();
+    for (int i = 0; i < 10; ++i)
+        addClips(1, "clip-2009-07-01 08;30;", "Trip " + std::to_string(i));
+    const Calls many = callsOfAScan();
+    EXPECT_EQ(many.looks - one.looks, 10);
+    EXPECT_EQ(many.attributeReads - one.attributeReads, 10);
 }
 
 // In a process of its own: what a kernel can do is found out once.

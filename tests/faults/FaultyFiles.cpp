@@ -34,10 +34,20 @@ class FaultyFolder final : public platform::Folder {
     std::optional<platform::FileAttributes> attributesOf(const platform::FolderItem& item) const override {
         return asks(item) ? real_->attributesOf(item) : std::nullopt;
     }
+    std::optional<platform::FileAttributes> attributes() const override {
+        return goesOn(beforeOperation_, path_) ? real_->attributes() : std::nullopt;
+    }
     std::optional<std::ptrdiff_t> extendedAttributeOf(const platform::FolderItem& item,
                                                       std::string_view attribute,
                                                       std::span<char> buffer) const override {
         return asks(item) ? real_->extendedAttributeOf(item, attribute, buffer) : std::nullopt;
+    }
+
+    std::unique_ptr<platform::Folder> openFolder(const platform::FolderItem& item) const override {
+        auto opened = asks(item) ? real_->openFolder(item) : nullptr;
+        return opened ? std::make_unique<FaultyFolder>(
+                            std::move(opened), platform::path::appending(path_, item.name), beforeOperation_)
+                      : nullptr;
     }
 
   private:

@@ -145,6 +145,56 @@ TEST_F(FolderTest, AFolderThatCantBeListedIsNil) {
     EXPECT_EQ(log_.lines().size(), 1u);
 }
 
+TEST_F(FolderTest, HasTheAttributesThatItHasByPath) {
+    const auto attributes = open()->attributes();
+    const auto byPath = files_.attributesOfItemAtPath(home_.path());
+    ASSERT_TRUE(attributes && byPath);
+    EXPECT_EQ(attributes->creationDate->secondsSince1970(), byPath->creationDate->secondsSince1970());
+    EXPECT_EQ(attributes->modificationDate->secondsSince1970(), byPath->modificationDate->secondsSince1970());
+}
+
+TEST_F(FolderTest, AFolderInItIsOpenedAsByPath) {
+    fill(home_);
+    home_.makeFolder("folder/inner");
+    home_.writeFile("folder/.hidden", "hidden.mov");
+    home_.writeFile("folder/hidden.mov");
+    fileWithDate("folder/dated.mov");
+    home_.makeFolder("hidden folder");
+    for (const std::string name : {"folder", "package.qnproject", "link to folder", "hidden folder"}) {
+        const auto inFolder = open()->openFolder({name});  // which is closed again at once
+        const auto byPath = files_.openFolderAtPath(home_.path(name));
+        ASSERT_TRUE(inFolder && byPath) << name;
+        ASSERT_EQ(inFolder->items().size(), byPath->items().size()) << name;
+        for (const FolderItem& item : byPath->items()) {
+            EXPECT_EQ(told(*inFolder, item), told(*byPath, item)) << name << "/" << item.name;
+            EXPECT_EQ(attribute(*inFolder, item.name), attribute(*byPath, item.name)) << name;
+        }
+    }
+    EXPECT_EQ(told(*open()->openFolder({"folder"}), {"hidden.mov"}), "64 plain attributes");
+    EXPECT_EQ(attribute(*open()->openFolder({"folder"}), "dated.mov"), "2009");
+}
+
+TEST_F(FolderTest, WhatCantBeListedInItIsNilAsByPath) {
+    fill(home_);
+    const auto folder = open();
+    home_.remove("hidden folder");
+    for (const std::string name : {"missing", "hidden folder", "link to nothing.mov"})
+        EXPECT_EQ(folder->openFolder({name}), nullptr) << name;
+    EXPECT_THAT(log_.lines(), IsEmpty());
+    EXPECT_EQ(folder->openFolder({"fifo.mov"}), nullptr);
+    EXPECT_EQ(files_.openFolderAtPath(home_.path("fifo.mov")), nullptr);
+    ASSERT_EQ(log_.lines().size(), 2u);
+    EXPECT_EQ(log_.lines()[0], log_.lines()[1]);
+}
+
+TEST_F(FolderTest, AFolderOfAnotherFileSystemIsOpenedAsWell) {
+    const auto root = files_.openFolderAtPath("/");
+    ASSERT_TRUE(root);
+    const auto folder = root->openFolder({"proc"});
+    ASSERT_TRUE(folder);
+    EXPECT_TRUE(folder->isPlainFile(itemNamed(*folder, "version")));
+}
+
 TEST_F(FolderTest, AFileThatVanishesHasNoAttributes) {
     home_.writeFile("a.mov");
     const auto folder = open();

@@ -39,11 +39,18 @@ class PathFolder final : public platform::Folder {
     std::optional<platform::FileAttributes> attributesOf(const platform::FolderItem& item) const override {
         return files_.attributesOfItemAtPath(pathOf(item));
     }
+    std::optional<platform::FileAttributes> attributes() const override {
+        return files_.attributesOfItemAtPath(path_);
+    }
     std::optional<std::ptrdiff_t> extendedAttributeOf(const platform::FolderItem& item,
                                                       std::string_view attribute,
                                                       std::span<char> buffer) const override {
         const auto size = files_.extendedAttribute(pathOf(item), attribute, buffer);
         return size >= 0 || attributesOf(item) ? std::optional(size) : std::nullopt;
+    }
+
+    std::unique_ptr<platform::Folder> openFolder(const platform::FolderItem& item) const override {
+        return files_.openFolderAtPath(pathOf(item));
     }
 
   private:
