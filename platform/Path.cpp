@@ -62,7 +62,8 @@ std::string appending(std::string_view path, std::string_view component) {
     longer = head;
     if (!tail.empty() && head != "/")
         longer += '/';
-    return longer.append(tail);
+    longer += tail;
+    return longer;
 }
 
 std::string extension(std::string_view path) {
@@ -84,7 +85,8 @@ std::string appendingExtension(std::string_view path, std::string_view extension
     std::string longer(withoutTrailingSlashes(path));
     if (longer.empty() || longer == "/" || extension.empty())
         return longer;
-    return longer.append(".").append(extension);
+    longer.append(".").append(extension);
+    return longer;
 }
 
 std::vector<std::string> components(std::string_view path) {
