@@ -23,11 +23,7 @@ bool MemoryByteSource::read(std::uint64_t offset, std::span<std::byte> buffer) {
     return BorrowedByteSource(bytes_).read(offset, buffer);
 }
 
-// Pages come as they are needed: most documents are done with after one or two. Their room is there from the
-// beginning, so they stay where they are.
-PageCache::PageCache(ByteSource& source) : source_(source), size_(source.size()), latest_(nullptr) {
-    pages_.reserve(pageCount);
-}
+PageCache::PageCache(ByteSource& source) : source_(source), size_(source.size()) {}
 
 bool PageCache::read(std::uint64_t offset, std::span<std::byte> buffer) {
     if (!isInside(offset, buffer.size(), size_))

@@ -7,6 +7,7 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <list>
 #include <span>
 #include <string>
 #include <vector>
@@ -91,8 +92,8 @@ class PageCache {
 
     ByteSource& source_;
     const std::uint64_t size_;
-    std::vector<Page> pages_;
-    Page* latest_;
+    std::list<Page> pages_;  // made as they are needed: most documents are done with after one or two
+    Page* latest_ = nullptr;
     std::uint64_t uses_ = 0;
 };
 
