@@ -14,6 +14,7 @@ target_link_libraries(Reelix PRIVATE vexo_settings VexoMediaBrowser)
 target_link_options(Reelix PRIVATE LINKER:--version-script=${CMAKE_SOURCE_DIR}/cmake/plugin-exports.map)
 set_target_properties(Reelix PROPERTIES PREFIX ""
     LIBRARY_OUTPUT_DIRECTORY ${REELIX_BUNDLE}/Contents/Linux
-    LINK_DEPENDS ${CMAKE_SOURCE_DIR}/cmake/plugin-exports.map
-    INSTALL_RPATH "$ORIGIN/../../../../..")
+    LINK_DEPENDS ${CMAKE_SOURCE_DIR}/cmake/plugin-exports.map)
+# The host that loads the module has loaded the library.
+set_target_properties(Reelix PROPERTIES BUILD_WITH_INSTALL_RPATH ON)
 add_dependencies(Reelix reelix_resources)

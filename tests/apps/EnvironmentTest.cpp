@@ -13,7 +13,9 @@
 
 namespace {
 
+using testing::ContainsRegex;
 using testing::HasSubstr;
+using testing::Not;
 using testing::StartsWith;
 using testing_support::Outcome;
 using testing_support::runProgram;
@@ -56,6 +58,17 @@ class EnvironmentTest : public testing::Test {
     const std::string current = elsewhere.makeFolder("current");
     const std::string longText = std::string(10'000, 'x');
 };
+
+// Whoever can write there could otherwise run code of theirs. A path without a slash in front is one.
+TEST_F(EnvironmentTest, NoLibraryIsLookedForInTheCurrentFolder) {
+    for (const char* program : {"vexo", "vexo-media-reader", "vexo-sample-movie"}) {
+        const Outcome outcome = runProgram(
+            "/usr/bin/env",
+            {"--chdir=" + current, "LD_DEBUG=libs", VEXO_BIN_DIR "/" + std::string(program), "--version"});
+        EXPECT_THAT(outcome.errors, HasSubstr("trying file=/")) << program;
+        EXPECT_THAT(outcome.errors, Not(ContainsRegex("trying file=[^/]"))) << program;
+    }
+}
 
 TEST_F(EnvironmentTest, TheTreeIsTheSameInOddOnes) {
     const Outcome plain = tree({"TZ=UTC0"});
