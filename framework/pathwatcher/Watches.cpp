@@ -19,25 +19,34 @@ void Watches::remove(int watch, EventListener& listener) {
     const auto found = listeners_.find(watch);
     if (found == listeners_.end() || std::erase(found->second, &listener) == 0 || !found->second.empty())
         return;
-    listeners_.erase(found);
+    forget(watch);
     events_.remove(watch);
 }
 
 void Watches::dispatch(const FileEvent& event) {
-    const auto found = listeners_.find(event.watch);
-    if (found == listeners_.end())
-        return;
-    hearing_ = found->second;
+    if (!latest_ || latest_->first != event.watch) {
+        const auto found = listeners_.find(event.watch);
+        if (found == listeners_.end())
+            return;
+        latest_ = &*found;
+    }
+    hearing_ = latest_->second;
     if (event.kinds & IN_IGNORED)
-        listeners_.erase(found);
+        forget(event.watch);
     for (std::size_t i = 0; i < hearing_.size(); ++i)
         if (hearing_[i])
             hearing_[i]->heard(event);
     hearing_.clear();
 }
 
+void Watches::forget(int watch) {
+    listeners_.erase(watch);
+    latest_ = nullptr;
+}
+
 void Watches::reopen() {
     listeners_.clear();
+    latest_ = nullptr;
     events_.reopen();
 }
 

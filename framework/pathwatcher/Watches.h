@@ -39,9 +39,14 @@ class Watches {
     std::size_t count() const { return listeners_.size(); }
 
   private:
+    void forget(int watch);
+
+    using Listeners = std::unordered_map<int, std::vector<EventListener*>>;
+
     FileEvents& events_;
-    std::unordered_map<int, std::vector<EventListener*>> listeners_;
-    std::vector<EventListener*> hearing_;  // those told of the current event; nil for who was removed
+    Listeners listeners_;
+    Listeners::value_type* latest_ = nullptr;  // whose event was dispatched last: events come in runs
+    std::vector<EventListener*> hearing_;      // those told of the current event; nil for who was removed
 };
 
 }  // namespace vexo
