@@ -12,6 +12,7 @@
 #include <unistd.h>
 
 #include <future>
+#include <map>
 #include <stdexcept>
 
 #include "platform/linux/LinuxDispatcher.h"
@@ -363,6 +364,40 @@ TEST(ThreadPriority, MapsToStepsOfTheNiceValue) {
     EXPECT_EQ(niceStepForPriority(0.75), -10);
     EXPECT_EQ(niceStepForPriority(1.0), -20);
     EXPECT_EQ(niceStepForPriority(7.0), -20);
+}
+
+TEST(LinuxDispatcher, AThreadThatIsDoneLetsGoOfItsBlockAndTakesTheNext) {
+    CollectedLog log;
+    LinuxDispatcher dispatcher(log);
+    constexpr int blocks = 200;
+    std::map<pid_t, std::weak_ptr<int>> heldByLatestBlock;
+    for (int i = 0; i < blocks; ++i) {
+        auto held = std::make_shared<int>(i);
+        const std::weak_ptr<int> watched = held;
+        std::promise<pid_t> thread;
+        dispatcher.detachThread("next", 0.5, [&thread, &heldByLatestBlock, held = std::move(held)] {
+            EXPECT_TRUE(heldByLatestBlock[gettid()].expired());
+            thread.set_value(gettid());
+        });
+        heldByLatestBlock[thread.get_future().get()] = watched;
+    }
+    EXPECT_LT(heldByLatestBlock.size(), blocks / 2);
+}
+
+TEST(LinuxDispatcher, BlocksOfSeveralPrioritiesHaveTheirOwn) {
+    CollectedLog log;
+    LinuxDispatcher dispatcher(log);
+    const int normal = getpriority(PRIO_PROCESS, static_cast<id_t>(gettid()));
+    constexpr int lowest = 19;
+    for (int i = 0; i < 50; ++i) {
+        for (const auto& [priority, expected] : {std::pair(0.5, normal), std::pair(0.0, lowest)}) {
+            std::promise<int> promise;
+            dispatcher.detachThread("any", priority, [&] {
+                promise.set_value(getpriority(PRIO_PROCESS, static_cast<id_t>(gettid())));
+            });
+            ASSERT_EQ(promise.get_future().get(), expected);
+        }
+    }
 }
 
 TEST(LinuxDispatcher, ThreadsCarryTheBeginningOfTheirName) {
