@@ -43,10 +43,10 @@ std::optional<std::vector<FolderItem>> readItems(int folder) {
     alignas(dirent64) std::array<char, 32 * 1024> buffer;
     for (;;) {
         const auto size = uninterrupted([&] { return getdents64(folder, buffer.data(), buffer.size()); });
+        if (size == 0 || (size < 0 && errno == ENOENT))  // the latter of a folder that is gone
+            return items;
         if (size < 0)
             return std::nullopt;
-        if (size == 0)
-            return items;
         for (const char* next = buffer.data(); next < buffer.data() + size;) {
             const auto& entry = *reinterpret_cast<const dirent64*>(next);
             if (!isDotOrDotDot(entry.d_name))

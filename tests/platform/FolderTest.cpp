@@ -191,8 +191,21 @@ TEST_F(FolderTest, AFolderOfAnotherFileSystemIsOpenedAsWell) {
     const auto root = files_.openFolderAtPath("/");
     ASSERT_TRUE(root);
     const auto folder = root->openFolder({"proc"});
-    ASSERT_TRUE(folder);
+    const auto byPath = files_.openFolderAtPath("/proc");
+    ASSERT_TRUE(folder && byPath);
     EXPECT_TRUE(folder->isPlainFile(itemNamed(*folder, "version")));
+    // Where files may be hidden by a flag the file is looked at, and found missing.
+    const FolderItem missing{"missing", FolderItem::Kind::plainFile};
+    EXPECT_EQ(folder->flagsOf(missing), byPath->flagsOf(missing));
+}
+
+TEST_F(FolderTest, AFolderThatIsGoneBeforeItIsListedIsEmpty) {
+    const platform::FileDescriptor gone(::open(home_.makeFolder("gone").c_str(), O_RDONLY | O_DIRECTORY));
+    home_.remove("gone");
+    const auto folder = files_.openFolderAtPath("/proc/self/fd/" + std::to_string(gone.number()));
+    ASSERT_TRUE(folder);
+    EXPECT_THAT(folder->items(), IsEmpty());
+    EXPECT_THAT(log_.lines(), IsEmpty());
 }
 
 TEST_F(FolderTest, AFileThatVanishesHasNoAttributes) {
