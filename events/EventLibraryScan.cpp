@@ -85,7 +85,7 @@ VXReelixPlugin::EventLibraryScan::EventLibraryScan(VXReelixPlugin& plugin, std::
 
 bool VXReelixPlugin::EventLibraryScan::hasEntries() const {
     Locked lock(mutex_);
-    return library_ && !library_->items().empty();
+    return hasEntries_;
 }
 
 std::vector<VXReelixPlugin::ScannedEvent> VXReelixPlugin::EventLibraryScan::takeEvents() {
@@ -132,10 +132,18 @@ void VXReelixPlugin::EventLibraryScan::openLibrary() {
     library_ = platform::services().fileManager.openFolderAtPath(libraryFolder_);
     if (!library_)
         return;
+    hasEntries_ = !library_->items().empty();
     for (const platform::FolderItem& item : library_->items()) {
         if (!isHiddenName(item.name) && hasFlags(library_->flagsOf(item), platform::itemIsContainer))
             events_.push_back({path::appending(libraryFolder_, item.name), &item, nullptr, nullptr, {}, {}});
     }
+    closeLibraryWhenDone();
+}
+
+// An open folder keeps its volume from being unmounted.
+void VXReelixPlugin::EventLibraryScan::closeLibraryWhenDone() {
+    if (nextEvent_ == events_.size() && foldersBeingOpened_ == 0)
+        library_ = nullptr;
 }
 
 void VXReelixPlugin::EventLibraryScan::waitForWork() {
@@ -171,6 +179,7 @@ void VXReelixPlugin::EventLibraryScan::openEvent(const platform::Folder& library
     }
     Locked lock(mutex_);
     --foldersBeingOpened_;
+    closeLibraryWhenDone();
     folderOpened_.notify_all();
     if (failure)
         std::rethrow_exception(failure);

@@ -89,6 +89,7 @@ class VXReelixPlugin::EventLibraryScan {
     bool scanNextClips() VX_EXCLUDES(mutex_);
     std::optional<Piece> takePiece() VX_EXCLUDES(mutex_);
     void openLibrary() VX_REQUIRES(mutex_);
+    void closeLibraryWhenDone() VX_REQUIRES(mutex_);
     // Waits where only what other threads are opening can bring more.
     void waitForWork() VX_REQUIRES(mutex_);
     Piece nextPiece() VX_REQUIRES(mutex_);
@@ -113,7 +114,8 @@ class VXReelixPlugin::EventLibraryScan {
 
     mutable platform::Mutex mutex_;
     bool isOpened_ VX_GUARDED_BY(mutex_) = false;
-    FolderRef library_ VX_GUARDED_BY(mutex_);                 // nil until it is opened, and when it can't be
+    FolderRef library_ VX_GUARDED_BY(mutex_);  // nil but as long as there are events to open
+    bool hasEntries_ VX_GUARDED_BY(mutex_) = false;
     std::vector<ScannedEvent> events_ VX_GUARDED_BY(mutex_);  // each stays where it is
     std::size_t nextEvent_ VX_GUARDED_BY(mutex_) = 0;         // whose folder nobody has begun to open
     int foldersBeingOpened_ VX_GUARDED_BY(mutex_) = 0;
