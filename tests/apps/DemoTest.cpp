@@ -374,6 +374,7 @@ class DemoObstacleTest : public testing::Test {
 
     TemporaryFolder bin_;
     TemporaryFolder place_;
+    const ScopedEnvironment libraries_{"LD_LIBRARY_PATH", VEXO_BIN_DIR "/../lib"};
 };
 
 const auto oneLine = MatchesRegex("vexo: [^\n]+\n");

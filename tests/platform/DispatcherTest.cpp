@@ -366,6 +366,12 @@ TEST(ThreadPriority, MapsToStepsOfTheNiceValue) {
     EXPECT_EQ(niceStepForPriority(7.0), -20);
 }
 
+std::string nameOfThisThread() {
+    char name[32] = {};
+    pthread_getname_np(pthread_self(), name, sizeof name);
+    return name;
+}
+
 TEST(LinuxDispatcher, AThreadThatIsDoneLetsGoOfItsBlockAndTakesTheNext) {
     CollectedLog log;
     LinuxDispatcher dispatcher(log);
@@ -374,9 +380,11 @@ TEST(LinuxDispatcher, AThreadThatIsDoneLetsGoOfItsBlockAndTakesTheNext) {
     for (int i = 0; i < blocks; ++i) {
         auto held = std::make_shared<int>(i);
         const std::weak_ptr<int> watched = held;
+        const std::string name = "block " + std::to_string(i);
         std::promise<pid_t> thread;
-        dispatcher.detachThread("next", 0.5, [&thread, &heldByLatestBlock, held = std::move(held)] {
+        dispatcher.detachThread(name, 0.5, [&thread, &heldByLatestBlock, name, held = std::move(held)] {
             EXPECT_TRUE(heldByLatestBlock[gettid()].expired());
+            EXPECT_EQ(nameOfThisThread(), name);
             thread.set_value(gettid());
         });
         heldByLatestBlock[thread.get_future().get()] = watched;
@@ -404,11 +412,7 @@ TEST(LinuxDispatcher, ThreadsCarryTheBeginningOfTheirName) {
     CollectedLog log;
     LinuxDispatcher dispatcher(log);
     std::promise<std::string> promise;
-    dispatcher.detachThread("mount notification", 0.5, [&] {
-        char name[32] = {};
-        pthread_getname_np(pthread_self(), name, sizeof name);
-        promise.set_value(name);
-    });
+    dispatcher.detachThread("mount notification", 0.5, [&] { promise.set_value(nameOfThisThread()); });
     EXPECT_EQ(promise.get_future().get(), "mount notificat");
 }
 
