@@ -35,8 +35,9 @@ class Dispatcher {
     // performSelector:withObject:afterDelay:inModes: on the main run loop.
     virtual void performOnMainRunLoop(Delay delay, std::vector<RunLoopMode> modes, Block block) = 0;
 
-    // detachNewThreadSelector:toTarget:withObject:; a thread of its own for one block. `priority` is 0.0
-    // (lowest) to 1.0; 0.5 is normal, and what is above may need rights that the process lacks.
+    // detachNewThreadSelector:toTarget:withObject:; a thread of its own for one block, as long as that
+    // runs. `priority` is 0.0 (lowest) to 1.0; 0.5 is normal, and what is above may need rights that the
+    // process lacks.
     virtual void detachThread(std::string_view name, double priority, Block block) = 0;
 
     virtual void setFailureHandler(FailureHandler handler) = 0;

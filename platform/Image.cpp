@@ -18,6 +18,20 @@ class UndrawablePicture final : public Picture {
     std::optional<Bitmap> draw(int, int) const override { return std::nullopt; }
 };
 
+class BitmapPicture final : public Picture {
+  public:
+    explicit BitmapPicture(Bitmap bitmap) : bitmap_(std::move(bitmap)) {}
+
+    Size naturalSize() const override { return {double(bitmap_.width), double(bitmap_.height)}; }
+    bool isDrawable() const override { return true; }
+    std::optional<Bitmap> draw(int width, int height) const override {
+        return renderer().draw(bitmap_, width, height);
+    }
+
+  private:
+    const Bitmap bitmap_;
+};
+
 // What bytes show, read when it is first needed: programs that only print names have icons and draw none.
 class DataPicture final : public Picture {
   public:
@@ -34,7 +48,7 @@ class DataPicture final : public Picture {
             picture_ = renderer().pictureOfData(data_);
             if (!picture_)
                 picture_ = std::make_shared<UndrawablePicture>();
-            data_ = {};
+            std::exchange(data_, {});  // assigning {} would keep its memory
         });
         return *picture_;
     }
@@ -87,7 +101,7 @@ std::shared_ptr<const Picture> pictureWithData(std::span<const std::byte> data) 
 std::shared_ptr<const Picture> pictureWithBitmap(Bitmap bitmap) {
     if (!isWhole(bitmap))
         return std::make_shared<UndrawablePicture>();
-    return renderer().pictureOfBitmap(std::move(bitmap));
+    return std::make_shared<BitmapPicture>(std::move(bitmap));
 }
 
 std::shared_ptr<const Picture> pictureWithContentsOfFile(const std::string& path) {

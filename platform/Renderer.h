@@ -1,6 +1,6 @@
 // What makes pixels of pictures, drawings and text. It lies in a library of its own, which is loaded when
-// something is first drawn or measured: loading that takes longer than everything else that a program does
-// which only prints names.
+// something is first drawn, measured or asked whether it can be drawn: loading it takes about as long as
+// everything else that a program does which only prints names.
 #pragma once
 
 #include <memory>
@@ -43,10 +43,10 @@ class Renderer {
   public:
     virtual ~Renderer() = default;
 
-    // What pictureWithData and pictureWithBitmap answer with; nil for data that can't be drawn.
+    // What data shows, of which pictureWithData makes a picture; nil for data that can't be drawn.
     virtual std::shared_ptr<const Picture> pictureOfData(std::span<const std::byte> data) const = 0;
-    // Requires: isWhole(bitmap).
-    virtual std::shared_ptr<const Picture> pictureOfBitmap(Bitmap bitmap) const = 0;
+    // Scaled. Requires: isWhole(bitmap).
+    virtual std::optional<Bitmap> draw(const Bitmap& bitmap, int width, int height) const = 0;
     // Requires: isDrawableSize(drawing.size).
     virtual std::optional<Bitmap> draw(const RecordedDrawing& drawing, int width, int height) const = 0;
     // Requires: isDrawableSize(drawing.size), isWhole(bitmap).

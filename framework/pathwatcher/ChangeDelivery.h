@@ -1,4 +1,4 @@
-// Tells subscribers of changes, on a thread of its own that lives while there is something to tell: one that
+// Tells subscribers of changes, on a thread of its own while there is something to tell: one that
 // takes its time doesn't keep the watcher from taking in events. What comes meanwhile is told in one go.
 // Thread-safe.
 #pragma once

@@ -8,11 +8,11 @@ namespace platform {
 
 std::string ownLibraryFolder() {
     Dl_info library{};
-    if (!dladdr(reinterpret_cast<const void*>(&ownLibraryFolder), &library) || !library.dli_fname)
-        return {};
     std::error_code unknown;
-    const auto resolved = std::filesystem::canonical(library.dli_fname, unknown);
-    return (unknown ? std::filesystem::path(library.dli_fname) : resolved).parent_path();
+    if (dladdr(reinterpret_cast<const void*>(&ownLibraryFolder), &library) && library.dli_fname)
+        if (const auto file = std::filesystem::canonical(library.dli_fname, unknown); !unknown)
+            return file.parent_path();
+    return "/";
 }
 
 }  // namespace platform

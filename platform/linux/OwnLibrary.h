@@ -5,7 +5,8 @@
 
 namespace platform {
 
-// The folder of the shared library that this code is in, links resolved. Callable from any thread.
+// The folder of the shared library that this code is in, links resolved; "/" where it can't be told, which
+// nobody but root can put anything into. Callable from any thread.
 std::string ownLibraryFolder();
 
 }  // namespace platform

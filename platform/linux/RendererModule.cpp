@@ -11,11 +11,14 @@ namespace platform {
 
 const Renderer& rendererOfModule(const std::string& path) {
     // It is never unloaded: pictures of its classes may outlive everything else.
-    void* module = dlopen(path.c_str(), RTLD_LAZY | RTLD_LOCAL | RTLD_NODELETE);
+    void* module = dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL | RTLD_NODELETE);
     void* entry = module ? dlsym(module, "vexoRenderer") : nullptr;
     if (!entry)
         throw std::runtime_error(dlerror());
-    return *reinterpret_cast<decltype(&vexoRenderer)>(entry)();
+    const Renderer* renderer = reinterpret_cast<decltype(&vexoRenderer)>(entry)(VEXO_VERSION);
+    if (!renderer)
+        throw std::runtime_error(path + " is of another version");
+    return *renderer;
 }
 
 const Renderer& renderer() {

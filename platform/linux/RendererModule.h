@@ -5,8 +5,9 @@
 
 #include "platform/Renderer.h"
 
-// What the library exports. The renderer is the library's and lives as long as the process.
-extern "C" const platform::Renderer* vexoRenderer();
+// What the library exports: the renderer, which is the library's and lives as long as the process; nil where
+// the caller is of another version. One may be installed over the other while a program runs.
+extern "C" const platform::Renderer* vexoRenderer(const char* version);
 
 namespace platform {
 

@@ -61,13 +61,16 @@ class EnvironmentTest : public testing::Test {
 
 // Whoever can write there could otherwise run code of theirs. A path without a slash in front is one.
 TEST_F(EnvironmentTest, NoLibraryIsLookedForInTheCurrentFolder) {
-    for (const char* program : {"vexo", "vexo-media-reader", "vexo-sample-movie"}) {
-        const Outcome outcome = runProgram(
-            "/usr/bin/env",
-            {"--chdir=" + current, "LD_DEBUG=libs", VEXO_BIN_DIR "/" + std::string(program), "--version"});
-        EXPECT_THAT(outcome.errors, HasSubstr("trying file=/")) << program;
-        EXPECT_THAT(outcome.errors, Not(ContainsRegex("trying file=[^/]"))) << program;
-    }
+    const auto expectNone = [](const Outcome& outcome) {
+        EXPECT_THAT(outcome.errors, HasSubstr("trying file=/"));
+        EXPECT_THAT(outcome.errors, Not(ContainsRegex("trying file=[^/]")));
+    };
+    const Outcome whole = run({"LD_DEBUG=libs"}, {"--home", home.path(), "tree", "--json"});
+    for (const char* library : {"libVexoMediaBrowser.so", "Reelix.so", "libVexoDrawing.so", "libavformat.so"})
+        EXPECT_THAT(whole.errors, HasSubstr(library));
+    expectNone(whole);
+    expectNone(runProgram("/usr/bin/env", {"--chdir=" + current, "LD_DEBUG=libs",
+                                           VEXO_BIN_DIR "/vexo-sample-movie", "--version"}));
 }
 
 TEST_F(EnvironmentTest, TheTreeIsTheSameInOddOnes) {

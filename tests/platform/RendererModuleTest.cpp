@@ -23,5 +23,11 @@ TEST(RendererModule, ThatIsMissingOrNoneIsToldOf) {
                     ThrowsMessage<std::runtime_error>(HasSubstr(reason)));
 }
 
+TEST(RendererModule, HandsItsRendererToItsOwnVersionAlone) {
+    EXPECT_NE(vexoRenderer(VEXO_VERSION), nullptr);
+    EXPECT_EQ(vexoRenderer(VEXO_VERSION ".1"), nullptr);
+    EXPECT_EQ(vexoRenderer(""), nullptr);
+}
+
 }  // namespace
 }  // namespace platform

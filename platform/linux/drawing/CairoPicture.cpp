@@ -32,21 +32,6 @@ bool paintBitmap(cairo_t* context, const Bitmap& bitmap) {
     return true;
 }
 
-class BitmapPicture final : public Picture {
-  public:
-    explicit BitmapPicture(Bitmap bitmap) : bitmap_(std::move(bitmap)) {}
-
-    Size naturalSize() const override { return {double(bitmap_.width), double(bitmap_.height)}; }
-    bool isDrawable() const override { return true; }
-    std::optional<Bitmap> draw(int width, int height) const override {
-        return paint(width, height, naturalSize(),
-                     [this](cairo_t* context) { return paintBitmap(context, bitmap_); });
-    }
-
-  private:
-    const Bitmap bitmap_;
-};
-
 // The last few renderings of a picture. Drawing an icon from its shapes costs a thousand times what copying
 // its pixels does, and lists draw one icon at one size again and again.
 class Renderings {
@@ -185,14 +170,15 @@ bool layOver(Bitmap& bitmap, const Bitmap& drawn) {
                      [&](cairo_t* context) { return paintBitmap(context, drawn); });
 }
 
-std::shared_ptr<const Picture> newBitmapPicture(Bitmap bitmap) {
-    return std::make_shared<BitmapPicture>(std::move(bitmap));
+std::optional<Bitmap> scaled(const Bitmap& bitmap, int width, int height) {
+    return paint(width, height, {double(bitmap.width), double(bitmap.height)},
+                 [&](cairo_t* context) { return paintBitmap(context, bitmap); });
 }
 
 std::shared_ptr<const Picture> newDataPicture(Bytes data) {
     if (isPNG(data)) {
         auto bitmap = decodedPNG(data);
-        return bitmap ? newBitmapPicture(*std::move(bitmap)) : nullptr;
+        return bitmap ? pictureWithBitmap(*std::move(bitmap)) : nullptr;
     }
     Handle handle = parsedSVG(data);
     const Size size = handle ? sizeOf(*handle) : Size{};

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <memory>
+#include <optional>
 #include <span>
 #include <vector>
 
@@ -9,8 +10,8 @@
 
 namespace platform {
 
-// Requires: isWhole(bitmap).
-std::shared_ptr<const Picture> newBitmapPicture(Bitmap bitmap);
+// nil for a size that is not drawn. Requires: isWhole(bitmap).
+std::optional<Bitmap> scaled(const Bitmap& bitmap, int width, int height);
 
 // Of the bytes of an SVG or PNG file; nil when they are damaged, or the picture is one that is not drawn.
 std::shared_ptr<const Picture> newDataPicture(std::span<const std::byte> data);

@@ -1,4 +1,6 @@
 // The one way into this library.
+#include <string_view>
+
 #include "platform/Renderer.h"
 #include "platform/linux/RendererModule.h"
 #include "platform/linux/drawing/CairoPicture.h"
@@ -13,8 +15,8 @@ class CairoRenderer final : public Renderer {
     std::shared_ptr<const Picture> pictureOfData(std::span<const std::byte> data) const override {
         return newDataPicture(data);
     }
-    std::shared_ptr<const Picture> pictureOfBitmap(Bitmap bitmap) const override {
-        return newBitmapPicture(std::move(bitmap));
+    std::optional<Bitmap> draw(const Bitmap& bitmap, int width, int height) const override {
+        return scaled(bitmap, width, height);
     }
     std::optional<Bitmap> draw(const RecordedDrawing& drawing, int width, int height) const override {
         return played(drawing, width, height);
@@ -33,7 +35,8 @@ class CairoRenderer final : public Renderer {
 }  // namespace
 }  // namespace platform
 
-const platform::Renderer* vexoRenderer() {
-    static const platform::CairoRenderer renderer;
-    return &renderer;
+// Pictures may be drawn as long as any thread runs, so the renderer is never destroyed.
+const platform::Renderer* vexoRenderer(const char* version) {
+    static const auto* const renderer = new platform::CairoRenderer;
+    return std::string_view(version) == VEXO_VERSION ? renderer : nullptr;
 }
