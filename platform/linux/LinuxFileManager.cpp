@@ -238,10 +238,7 @@ std::optional<std::string> LinuxFileManager::volumeNameAt(const std::string& mou
 }
 
 std::optional<FolderListing> LinuxFileManager::listingOfFolder(const std::string& path) const {
-    auto listing = FolderListing::open(path);
-    if (!listing && errno != ENOENT)
-        logFailure("list", path, errno);
-    return listing;
+    return FolderListing::openOrLog(AT_FDCWD, path, path, systemLog_);
 }
 
 void LinuxFileManager::logFailure(std::string_view operation, const std::string& path, int error) const {

@@ -69,10 +69,6 @@ dev_t deviceOf(const struct statx& status) {
 
 }  // namespace
 
-std::optional<FolderListing> FolderListing::open(const std::string& path) {
-    return open(AT_FDCWD, path);
-}
-
 std::optional<FolderListing> FolderListing::open(int parent, const std::string& name) {
     constexpr int flags = O_RDONLY | O_DIRECTORY | O_CLOEXEC | O_NONBLOCK;
     FileDescriptor folder(uninterrupted([&] { return openat(parent, name.c_str(), flags); }));
@@ -82,6 +78,14 @@ std::optional<FolderListing> FolderListing::open(int parent, const std::string& 
     if (!items)
         return std::nullopt;
     return FolderListing{std::move(folder), std::move(*items)};
+}
+
+std::optional<FolderListing> FolderListing::openOrLog(int parent, const std::string& name,
+                                                      const std::string& path, SystemLog& log) {
+    auto listing = open(parent, name);
+    if (!listing && errno != ENOENT)
+        log.log(failureLine("list", path, errno));
+    return listing;
 }
 
 // What is in a folder can be hidden by a flag where the folder itself can.
@@ -161,12 +165,9 @@ std::unique_ptr<Folder> LinuxFolder::openFolder(const FolderItem& item) const {
     std::string path = pathOf(item.name);
     if (!services_.reach.isInReach(path))
         return nullptr;
-    auto listing = FolderListing::open(listing_.folder.number(), item.name);
-    if (!listing) {
-        if (errno != ENOENT)
-            services_.systemLog.log(failureLine("list", path, errno));
+    auto listing = FolderListing::openOrLog(listing_.folder.number(), item.name, path, services_.systemLog);
+    if (!listing)
         return nullptr;
-    }
     return std::unique_ptr<Folder>(new LinuxFolder(std::move(*listing), std::move(path), services_, device_));
 }
 

@@ -3,6 +3,7 @@
 // attributes by path alone: there a folder that is moved has none any more.
 #pragma once
 
+#include <fcntl.h>
 #include <sys/stat.h>
 
 #include <atomic>
@@ -24,9 +25,12 @@ namespace platform {
 // An open folder with what lies in it, in the order of the file system.
 struct FolderListing {
     // nil, and errno set, when the folder can't be listed.
-    static std::optional<FolderListing> open(const std::string& path);
+    static std::optional<FolderListing> open(const std::string& path) { return open(AT_FDCWD, path); }
     // By its name in an open folder.
     static std::optional<FolderListing> open(int parent, const std::string& name);
+    // The same; why it can't be listed, of the folder at `path`, is logged, unless it is not there.
+    static std::optional<FolderListing> openOrLog(int parent, const std::string& name,
+                                                  const std::string& path, SystemLog& log);
 
     FileDescriptor folder;
     std::vector<FolderItem> items;
