@@ -54,6 +54,8 @@ void makeSmallLibrary(HostEnvironment& environment, Documents documents) {
     home.writeFile(std::string(events) + "Ski/clip-2009-02-03 10;20;30.mov");
     home.makeLink(std::string(events) + "Ski/link.mov", home.writeFile("elsewhere.mov"));
     home.makeFifo(std::string(events) + "Ski/pipe.txt");
+    home.writeFile(std::string(events) + "Walk/clip-2009-05-06 11;00;00.mov");
+    home.writeFile(std::string(events) + "Walk/undated.mov");
 }
 
 std::ostream& operator<<(std::ostream& stream, const TreeEntry& entry) {
