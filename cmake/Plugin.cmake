@@ -14,7 +14,6 @@ target_link_libraries(Reelix PRIVATE vexo_settings VexoMediaBrowser)
 target_link_options(Reelix PRIVATE LINKER:--version-script=${CMAKE_SOURCE_DIR}/cmake/plugin-exports.map)
 set_target_properties(Reelix PROPERTIES PREFIX ""
     LIBRARY_OUTPUT_DIRECTORY ${REELIX_BUNDLE}/Contents/Linux
-    LINK_DEPENDS ${CMAKE_SOURCE_DIR}/cmake/plugin-exports.map)
-# The host that loads the module has loaded the library.
-set_target_properties(Reelix PROPERTIES BUILD_WITH_INSTALL_RPATH ON)
+    LINK_DEPENDS ${CMAKE_SOURCE_DIR}/cmake/plugin-exports.map
+    BUILD_WITH_INSTALL_RPATH ON)  # none: the host that loads the module has loaded the library
 add_dependencies(Reelix reelix_resources)

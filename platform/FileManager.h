@@ -44,8 +44,8 @@ struct FolderItem {
 
 // A folder that is gone through. Each question answers as the operation by path does and costs as few calls
 // to the system as can be, often none: what the listing told is not asked again, so an item that has vanished
-// since may still be told of by everything but its attributes. It holds a file open, so each
-// is closed before the next one further down is entered where a tree may be deep.
+// since may still be told of by everything but its attributes. It holds a file open, so each is
+// closed before the next one further down is entered where a tree may be deep.
 //
 // Callable from any thread.
 class Folder {

@@ -89,9 +89,9 @@ class Image {
 
 // A picture of the bytes of an SVG or PNG file, which it copies, never nil. They are parsed when something is
 // first asked of the picture. Damaged bytes give a picture that is not drawable; so do pictures of a size
-// that is not drawn, and SVG that is compressed or not in UTF-8, declares
-// entities, embeds files, tells no size, or is larger or has more elements than any icon needs. Nothing
-// outside the bytes is loaded, whatever an SVG refers to.
+// that is not drawn, and SVG that is compressed or not in UTF-8, declares entities, embeds files, tells no
+// size, or is larger or has more elements than any icon needs. Nothing outside the bytes is loaded, whatever
+// an SVG refers to.
 std::shared_ptr<const Picture> pictureWithData(std::span<const std::byte> data);
 
 // A picture of those pixels; one that is not drawable for a bitmap that lacks some or has too many.
