@@ -1,16 +1,27 @@
 #include "platform/CivilTime.h"
 
 #include <algorithm>
+#include <chrono>
 #include <cmath>
 
 namespace platform {
 
 namespace {
 
+namespace chrono = std::chrono;
+
 constexpr std::int64_t secondsPerDay = 86400;
-constexpr std::int64_t daysPerEra = 146097;  // an era is the 400 years after which the calendar repeats
+constexpr double daysPerYear = 365.2425;
+constexpr double billionYears = 1e9 * daysPerYear * secondsPerDay;
+
+// The standard library's years have 16 bits. So dates are looked up in one era, the 400 years after which the
+// calendar repeats, days of the week included.
+constexpr chrono::year firstYearOfEra{2000};
+constexpr chrono::sys_days firstDayOfEra = firstYearOfEra / chrono::January / 1;
 constexpr std::int64_t yearsPerEra = 400;
-constexpr double billionYears = 1e9 * (static_cast<double>(daysPerEra) / yearsPerEra) * secondsPerDay;
+constexpr std::int64_t daysPerEra =
+    (chrono::sys_days((firstYearOfEra + chrono::years(yearsPerEra)) / 1 / 1) - firstDayOfEra).count();
+constexpr std::int64_t referenceDay = (chrono::sys_days(chrono::year{2001} / 1 / 1) - firstDayOfEra).count();
 
 struct Division {
     std::int64_t quotient;
@@ -18,60 +29,38 @@ struct Division {
 };
 
 constexpr Division divide(std::int64_t dividend, std::int64_t divisor) {
-    const std::int64_t remainder = (dividend % divisor + divisor) % divisor;
-    return {(dividend - remainder) / divisor, remainder};
+    const Division division{dividend / divisor, dividend % divisor};
+    return division.remainder < 0 ? Division{division.quotient - 1, division.remainder + divisor} : division;
 }
 
-constexpr bool isLeapYear(std::int64_t year) {
-    return year % 4 == 0 && (year % 100 != 0 || year % 400 == 0);
-}
-
-constexpr int daysInMonth(std::int64_t year, int month) {
-    constexpr int days[] = {31, 28, 31, 30, 31, 30, 31, 31, 30, 31, 30, 31};
-    return days[month - 1] + (month == 2 && isLeapYear(year) ? 1 : 0);
-}
-
-constexpr int daysBeforeMonth(std::int64_t year, int month) {
-    constexpr int days[] = {0, 31, 59, 90, 120, 151, 181, 212, 243, 273, 304, 334};
-    return days[month - 1] + (month > 2 && isLeapYear(year) ? 1 : 0);
-}
-
-// Days from the start of an era (1 January of year 0, 400, 2000, …) to that of one of its years.
-constexpr std::int64_t daysBeforeYearOfEra(std::int64_t year) {
-    return year == 0 ? 0 : year * 365 + (year - 1) / 4 - (year - 1) / 100 + 1;
-}
-
-constexpr std::int64_t daysBeforeYear(std::int64_t year) {
-    const Division era = divide(year, yearsPerEra);
-    return era.quotient * daysPerEra + daysBeforeYearOfEra(era.remainder);
-}
-
-constexpr std::int64_t referenceDay = daysBeforeYear(2001);
-
-struct DayOfYear {
-    std::int64_t year;
-    int day;  // from 0
+// A date of the era in place of one of any year.
+struct EraDate {
+    std::int64_t eras;  // from the one that is looked up to the one that is meant
+    chrono::year_month_day date;
 };
 
-DayOfYear dayOfYearOf(std::int64_t day) {
-    const Division era = divide(day, daysPerEra);
-    // As if no year were a leap year, which is right or, in the last days of a year, one too many.
-    std::int64_t year = era.remainder / 365;
-    if (daysBeforeYearOfEra(year) > era.remainder)
-        --year;
-    return {era.quotient * yearsPerEra + year, static_cast<int>(era.remainder - daysBeforeYearOfEra(year))};
+EraDate eraDateOf(int year, int month, int day) {
+    const Division era = divide(year - std::int64_t{static_cast<int>(firstYearOfEra)}, yearsPerEra);
+    return {era.quotient, (firstYearOfEra + chrono::years(era.remainder)) /
+                              chrono::month(static_cast<unsigned>(month)) /
+                              chrono::day(static_cast<unsigned>(day))};
+}
+
+// From the era's first day.
+std::int64_t dayOf(const EraDate& date) {
+    return date.eras * daysPerEra + (chrono::sys_days(date.date) - firstDayOfEra).count();
 }
 
 std::int64_t dayOf(const CivilTime& time) {
-    return daysBeforeYear(time.year) + daysBeforeMonth(time.year, time.month) + time.day - 1;
+    return dayOf(eraDateOf(time.year, time.month, time.day));
 }
 
-void setDate(CivilTime& time, DayOfYear date) {
-    time.year = static_cast<int>(date.year);
-    time.month = date.day / 32 + 1;  // or the one after it
-    while (time.month < 12 && daysBeforeMonth(date.year, time.month + 1) <= date.day)
-        ++time.month;
-    time.day = date.day - daysBeforeMonth(date.year, time.month) + 1;
+void setDate(CivilTime& time, std::int64_t day) {
+    const Division era = divide(day, daysPerEra);
+    const chrono::year_month_day date(firstDayOfEra + chrono::days(era.remainder));
+    time.year = static_cast<int>(static_cast<int>(date.year()) + era.quotient * yearsPerEra);
+    time.month = static_cast<int>(static_cast<unsigned>(date.month()));
+    time.day = static_cast<int>(static_cast<unsigned>(date.day()));
 }
 
 bool isWithin(int value, int lowest, int highest) {
@@ -81,8 +70,9 @@ bool isWithin(int value, int lowest, int highest) {
 }  // namespace
 
 bool isValid(const CivilTime& time) {
-    return isWithin(time.month, 1, 12) && isWithin(time.day, 1, daysInMonth(time.year, time.month)) &&
-           isWithin(time.hour, 0, 23) && isWithin(time.minute, 0, 59) && isWithin(time.second, 0, 60);
+    return isWithin(time.month, 1, 12) && isWithin(time.day, 1, 31) &&
+           eraDateOf(time.year, time.month, time.day).date.ok() && isWithin(time.hour, 0, 23) &&
+           isWithin(time.minute, 0, 59) && isWithin(time.second, 0, 60);
 }
 
 std::int64_t secondsOf(const CivilTime& time) {
@@ -92,7 +82,7 @@ std::int64_t secondsOf(const CivilTime& time) {
 CivilTime civilTimeOf(std::int64_t seconds) {
     const Division day = divide(seconds, secondsPerDay);
     CivilTime time;
-    setDate(time, dayOfYearOf(referenceDay + day.quotient));
+    setDate(time, referenceDay + day.quotient);
     time.hour = static_cast<int>(day.remainder / 3600);
     time.minute = static_cast<int>(day.remainder / 60 % 60);
     time.second = static_cast<int>(day.remainder % 60);
@@ -100,17 +90,17 @@ CivilTime civilTimeOf(std::int64_t seconds) {
 }
 
 int dayOfYear(const CivilTime& time) {
-    return daysBeforeMonth(time.year, time.month) + time.day;
+    return static_cast<int>(dayOf(time) - dayOf(eraDateOf(time.year, 1, 1))) + 1;
 }
 
 int dayOfWeek(const CivilTime& time) {
-    constexpr std::int64_t weekdayOfDayZero = 6;  // 1 January of year 0 is a Saturday
-    return static_cast<int>(divide(dayOf(time) + weekdayOfDayZero, 7).remainder);
+    const EraDate date = eraDateOf(time.year, time.month, time.day);
+    return static_cast<int>(chrono::weekday(chrono::sys_days(date.date)).c_encoding());
 }
 
 CivilTime dateOfDayOfYear(int year, int day) {
     CivilTime time;
-    setDate(time, dayOfYearOf(daysBeforeYear(year) + day - 1));
+    setDate(time, dayOf(eraDateOf(year, 1, 1)) + day - 1);
     return time;
 }
 
