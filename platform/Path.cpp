@@ -29,13 +29,14 @@ std::string_view lastComponentView(std::string_view path) {
     return trimmed.substr(trimmed.rfind('/') + 1);
 }
 
-// The extension with its dot; empty when there is none.
+// The extension with its dot; empty when there is none. Looked for from the end, where it is: paths are long.
 std::string_view dottedExtension(std::string_view path) {
-    const std::string_view name = lastComponentView(path);
-    const std::size_t dot = name.rfind('.');
-    if (dot == none || dot == 0 || dot + 1 == name.size())
+    const std::string_view trimmed = withoutTrailingSlashes(path);
+    const std::size_t dot = trimmed.rfind('.');
+    if (dot == none || dot == 0 || trimmed[dot - 1] == '/' || dot + 1 == trimmed.size())
         return {};
-    return name.substr(dot);
+    const std::string_view dotted = trimmed.substr(dot);
+    return dotted.find('/') == none ? dotted : std::string_view();
 }
 
 }  // namespace
