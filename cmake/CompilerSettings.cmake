@@ -2,6 +2,10 @@
 add_library(vexo_settings INTERFACE)
 target_compile_options(vexo_settings INTERFACE -Wall -Wextra -Wpedantic -Wshadow -Wnon-virtual-dtor
                                                -Woverloaded-virtual -fno-omit-frame-pointer)
+# Nobody puts functions of their own in the place of a library's, so the library's calls of them need not go through
+# its table of symbols and can be inlined.
+target_compile_options(vexo_settings INTERFACE -fno-semantic-interposition)
+target_link_options(vexo_settings INTERFACE LINKER:-Bsymbolic-functions)
 # Operations and fields of the system begin with an underscore and keep their names to the letter. As class
 # members they clash with nothing, so Clang's warning about reserved names says nothing useful here.
 if(CMAKE_CXX_COMPILER_ID STREQUAL "Clang")
