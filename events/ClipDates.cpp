@@ -22,22 +22,23 @@ platform::CalendarDateRef PathDate::_vxMBCalendarDateFromFileName(const std::str
     return dateFromFileName(fileName, ClipNameTexts(plugin));
 }
 
-platform::CalendarDateRef PathDate::dateFromFileName(const std::string& fileName,
-                                                     const ClipNameTexts& texts) {
+platform::CalendarDateRef PathDate::dateFromFileName(const std::string& fileName, const ClipNameTexts& texts,
+                                                     const platform::LocalZone& zone) {
     const std::string_view stem = path::withoutExtensionView(fileName);
     if (!stem.starts_with(texts.prefix))
         return nullptr;
-    const auto date = platform::CalendarDate::dateWithString(stem.substr(texts.prefix.size()), texts.format);
+    const auto date =
+        platform::CalendarDate::dateWithString(stem.substr(texts.prefix.size()), texts.format, zone);
     const int year = date ? date->yearOfCommonEra() : 0;
     return 1900 <= year && year <= 2100 ? date : nullptr;
 }
 
-platform::CalendarDateRef ClipDateValue::date() const {
+platform::CalendarDateRef ClipDateValue::date(const platform::LocalZone& zone) const {
     const std::string_view text(bytes_.data(), std::strlen(bytes_.data()));
     if (!platform::isValidUTF8(text))
         return nullptr;
     static const platform::CalendarFormat format("%Y-%m-%d %H;%M;%S");
-    return platform::CalendarDate::dateWithString(text, format);
+    return platform::CalendarDate::dateWithString(text, format, zone);
 }
 
 platform::CalendarDateRef VXReelixPlugin::_dateFromExtendedFileAttributeAtPath(const std::string& path) {

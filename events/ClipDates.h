@@ -29,7 +29,8 @@ namespace PathDate {
 // of the plug-in; nil for any other name and for years outside 1900 to 2100.
 platform::CalendarDateRef _vxMBCalendarDateFromFileName(const std::string& fileName,
                                                         const VXReelixPlugin& plugin);
-platform::CalendarDateRef dateFromFileName(const std::string& fileName, const ClipNameTexts& texts);
+platform::CalendarDateRef dateFromFileName(const std::string& fileName, const ClipNameTexts& texts,
+                                           const platform::LocalZone& zone = platform::LocalZone::current());
 
 }  // namespace PathDate
 
@@ -42,7 +43,7 @@ class ClipDateValue {
     // Where a value goes. The last byte stays NUL.
     std::span<char> room() { return std::span(bytes_).first(bytes_.size() - 1); }
     // nil for anything but a date.
-    platform::CalendarDateRef date() const;
+    platform::CalendarDateRef date(const platform::LocalZone& zone = platform::LocalZone::current()) const;
 
   private:
     std::array<char, 201> bytes_{};

@@ -80,6 +80,7 @@ VXReelixPlugin::EventLibraryScan::EventLibraryScan(VXReelixPlugin& plugin, std::
     : plugin_(plugin),
       texts_(plugin),
       locale_(platform::Locale::current()),
+      zone_(platform::LocalZone::current()),
       libraryFolder_(std::move(libraryFolder)),
       work_([this] { return scanNextClips(); }) {}
 
@@ -232,9 +233,9 @@ std::optional<VXReelixPlugin::EventLibraryScan::ClipDates> VXReelixPlugin::Event
     const platform::Folder& folder, const platform::FolderItem& item) const {
     ClipDateValue value;
     const auto valueSize = folder.extendedAttributeOf(item, clipDateAttribute, value.room());
-    auto own = valueSize.value_or(0) > 0 ? value.date() : nullptr;
+    auto own = valueSize.value_or(0) > 0 ? value.date(zone_) : nullptr;
     if (!own)
-        own = PathDate::dateFromFileName(item.name, texts_);
+        own = PathDate::dateFromFileName(item.name, texts_, zone_);
     const std::optional<int> year = usableYear(own);
     if (year && valueSize)
         return ClipDates{own, nullptr, *year};

@@ -110,6 +110,7 @@ class VXReelixPlugin::EventLibraryScan {
     VXReelixPlugin& plugin_;
     const ClipNameTexts texts_;
     const platform::Locale locale_;
+    const platform::LocalZone zone_;
     const std::string libraryFolder_;
 
     mutable platform::Mutex mutex_;

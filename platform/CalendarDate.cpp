@@ -6,7 +6,6 @@
 #include "platform/CalendarParser.h"
 #include "platform/CalendarPrinter.h"
 #include "platform/CivilTime.h"
-#include "platform/LocalZone.h"
 
 namespace platform {
 
@@ -28,15 +27,16 @@ bool isGMT(std::string_view zoneAbbreviation) {
 }
 
 // nil for a zone abbreviation that means nothing at that time.
-std::optional<ZonedTime> zonedTime(std::int64_t civilSeconds, const ParsedFields& fields) {
+std::optional<ZonedTime> zonedTime(std::int64_t civilSeconds, const ParsedFields& fields,
+                                   const LocalZone& zone) {
     if (fields.secondsFromGMT)
-        return ZonedTime{civilSeconds - *fields.secondsFromGMT, *fields.secondsFromGMT, {}};
-    LocalTimes times = timesOfLocalClock(civilSeconds);
-    if (!fields.zoneAbbreviation || times.first.abbreviation == fields.zoneAbbreviation)
-        return std::move(times.first);
-    if (times.second && times.second->abbreviation == fields.zoneAbbreviation)
-        return std::move(times.second);
-    return isGMT(*fields.zoneAbbreviation) ? std::optional(ZonedTime{civilSeconds, 0, {}}) : std::nullopt;
+        return ZonedTime{civilSeconds - *fields.secondsFromGMT, *fields.secondsFromGMT};
+    const LocalTimes times = zone.timesOfClock(civilSeconds);
+    if (fields.zoneAbbreviation.empty() || zone.abbreviation(times.first.seconds) == fields.zoneAbbreviation)
+        return times.first;
+    if (times.second && zone.abbreviation(times.second->seconds) == fields.zoneAbbreviation)
+        return times.second;
+    return isGMT(fields.zoneAbbreviation) ? std::optional(ZonedTime{civilSeconds, 0}) : std::nullopt;
 }
 
 // The nearest, except that they never make a full second.
@@ -58,10 +58,11 @@ Locale Locale::current() {
 CalendarDate::CalendarDate(double secondsSinceReferenceDate, int secondsFromGMT)
     : Date(secondsSinceReferenceDate), secondsFromGMT_(secondsFromGMT) {}
 
-CalendarDateRef CalendarDate::dateWithString(std::string_view string, const CalendarFormat& calendarFormat) {
+CalendarDateRef CalendarDate::dateWithString(std::string_view string, const CalendarFormat& calendarFormat,
+                                             const LocalZone& zone) {
     const auto fields = CalendarParser(string).parse(calendarFormat);
     const auto civilTime = fields ? fields->civilTime() : std::nullopt;
-    const auto zoned = civilTime ? zonedTime(secondsOf(*civilTime), *fields) : std::nullopt;
+    const auto zoned = civilTime ? zonedTime(secondsOf(*civilTime), *fields, zone) : std::nullopt;
     if (!zoned)
         return nullptr;
     const double fraction = static_cast<double>(fields->millisecond) / millisecondsPerSecond;

@@ -12,9 +12,9 @@
 //
 // The calendar is the Gregorian one for all times; the year before year 1 is year 0.
 //
-// Thread-safe. Parsing and printing use the local time zone at the moment of the call, so a change of TZ
-// or of the machine's zone counts from the next call on; a CalendarDate keeps the zone offset it was made
-// with.
+// Thread-safe. Parsing and printing use the local time zone at the moment of the call, unless they are handed
+// one, so a change of TZ or of the machine's zone counts from the next call on; a CalendarDate keeps the zone
+// offset it was made with.
 #pragma once
 
 #include <memory>
@@ -24,6 +24,7 @@
 
 #include "platform/CalendarFormat.h"
 #include "platform/Date.h"
+#include "platform/LocalZone.h"
 
 namespace platform {
 
@@ -59,7 +60,8 @@ class CalendarDate final : public Date {
     // A local time that a daylight-saving change skips is moved forward by the length of the gap; one that
     // occurs twice is the earlier, unless %Z says which. %z, and "GMT" or "UTC" for %Z, mean that zone
     // instead of the local one; other abbreviations must be the local zone's at that time.
-    static CalendarDateRef dateWithString(std::string_view string, const CalendarFormat& calendarFormat);
+    static CalendarDateRef dateWithString(std::string_view string, const CalendarFormat& calendarFormat,
+                                          const LocalZone& zone = LocalZone::current());
 
     // descriptionWithCalendarFormat:locale:
     // In the date's own zone. %Z is printed like %z when the local zone has another offset at that time.

@@ -19,6 +19,10 @@ bool isConversion(std::string_view piece) {
     return piece.size() == 2 && conversions[static_cast<unsigned char>(piece[1])];
 }
 
+bool couldBeOfNumber(const CalendarFormat::Piece& piece) {
+    return piece.isConversion() || (piece.literal[0] >= '0' && piece.literal[0] <= '9');
+}
+
 void addLiteral(std::vector<CalendarFormat::Piece>& pieces, std::string_view text) {
     if (pieces.empty() || pieces.back().isConversion())
         pieces.push_back({});
@@ -37,6 +41,8 @@ std::vector<CalendarFormat::Piece> CalendarFormat::piecesOf(std::string_view for
         else
             addLiteral(pieces, piece == "%%" ? piece.substr(1) : piece);
     }
+    for (std::size_t i = 0; i + 1 < pieces.size(); ++i)
+        pieces[i].runsOn = couldBeOfNumber(pieces[i + 1]);
     return pieces;
 }
 

@@ -17,6 +17,8 @@ class CalendarFormat {
     struct Piece {
         char conversion = 0;  // the letter after "%"; 0 for text
         std::string literal;  // never empty for text
+        // Whether what comes next could be taken for more digits of a number.
+        bool runsOn = false;
 
         bool isConversion() const { return conversion != 0; }
     };

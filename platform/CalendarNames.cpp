@@ -158,13 +158,16 @@ CalendarNames::Tables::Tables(const icu::Locale& locale)
 }
 
 std::shared_ptr<const CalendarNames> CalendarNames::ofLocale(const Locale& locale) {
-    thread_local std::string identifier;
-    thread_local std::shared_ptr<const CalendarNames> names;
-    if (!names || identifier != locale.identifier) {
-        names.reset(new CalendarNames(locale));
-        identifier = locale.identifier;
+    struct Last {
+        std::string identifier;
+        std::shared_ptr<const CalendarNames> names;
+    };
+    thread_local Last last;
+    if (!last.names || last.identifier != locale.identifier) {
+        last.names.reset(new CalendarNames(locale));
+        last.identifier = locale.identifier;
     }
-    return names;
+    return last.names;
 }
 
 CalendarNames::CalendarNames(const Locale& locale)
@@ -172,10 +175,10 @@ CalendarNames::CalendarNames(const Locale& locale)
 
 CalendarNames::~CalendarNames() = default;
 
-std::string CalendarNames::name(NameKind kind, int index) const {
+std::string_view CalendarNames::name(NameKind kind, int index) const {
     const Names& names = tables_->names(kind);
     const auto position = static_cast<std::size_t>(index);
-    return position < names.size() ? names[position].text : std::string();
+    return position < names.size() ? names[position].text : std::string_view();
 }
 
 std::optional<CalendarNames::Match> CalendarNames::match(NameKind kind, std::string_view text) const {

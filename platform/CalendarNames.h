@@ -29,7 +29,7 @@ class CalendarNames {
     CalendarNames& operator=(const CalendarNames&) = delete;
 
     // Counted from 0: January, Sunday and the morning come first. Empty where the locale has no such name.
-    std::string name(NameKind kind, int index) const;
+    std::string_view name(NameKind kind, int index) const;
 
     struct Match {
         int index;

@@ -23,11 +23,6 @@ std::size_t countLeading(std::string_view text, Predicate&& predicate) {
     return static_cast<std::size_t>(std::find_if_not(text.begin(), text.end(), predicate) - text.begin());
 }
 
-// Whether what the piece reads could be taken for more digits of a number before it.
-bool couldBeOfNumber(const CalendarFormat::Piece& piece) {
-    return piece.isConversion() || isDigit(piece.literal[0]);
-}
-
 }  // namespace
 
 std::optional<CivilTime> ParsedFields::civilTime() const {
@@ -46,21 +41,18 @@ std::optional<CivilTime> ParsedFields::civilTime() const {
 }
 
 std::optional<ParsedFields> CalendarParser::parse(const CalendarFormat& format) {
-    const auto& pieces = format.pieces();
-    for (std::size_t i = 0; i < pieces.size(); ++i) {
-        const auto& piece = pieces[i];
-        const bool runsOn = i + 1 < pieces.size() && couldBeOfNumber(pieces[i + 1]);
-        if (!(piece.isConversion() ? readConversion(piece.conversion, runsOn) : readLiteral(piece.literal)))
+    for (const CalendarFormat::Piece& piece : format.pieces()) {
+        if (!(piece.isConversion() ? readConversion(piece) : readLiteral(piece.literal)))
             return std::nullopt;
     }
-    return rest_.empty() ? std::optional(std::move(fields_)) : std::nullopt;
+    return rest_.empty() ? std::optional(fields_) : std::nullopt;
 }
 
-bool CalendarParser::readConversion(char letter, bool runsOn) {
+bool CalendarParser::readConversion(const CalendarFormat::Piece& piece) {
     std::optional<int> ignored;
-    switch (letter) {
+    switch (piece.conversion) {
         case 'Y':
-            return readYear(/*hasFourDigits=*/runsOn);
+            return readYear(/*hasFourDigits=*/piece.runsOn);
         case 'y':
             return readYearOfCentury();
         case 'm':
@@ -87,7 +79,7 @@ bool CalendarParser::readConversion(char letter, bool runsOn) {
         case 'Z':
             return readZoneName();
         default:
-            return readInLocale(letter);
+            return readInLocale(piece.conversion);
     }
 }
 
@@ -208,7 +200,7 @@ bool CalendarParser::readZoneName() {
     const std::size_t letters = countLeading(rest_, isLetter);
     if (letters == 0)
         return readZoneOffset();
-    fields_.zoneAbbreviation = std::string(rest_.substr(0, letters));
+    fields_.zoneAbbreviation = rest_.substr(0, letters);
     rest_.remove_prefix(letters);
     return true;
 }

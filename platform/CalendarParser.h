@@ -25,7 +25,7 @@ struct ParsedFields {
     int second = 0;
     int millisecond = 0;
     std::optional<int> secondsFromGMT;
-    std::optional<std::string> zoneAbbreviation;
+    std::string_view zoneAbbreviation;  // a part of the text; empty when it has none
 
     // nil when there is no such day.
     std::optional<CivilTime> civilTime() const;
@@ -46,9 +46,8 @@ class CalendarParser {
         int highest;
     };
 
-    // Each moves past what it reads and answers false when that is not there. With `runsOn`, what the format
-    // has next could be taken for more digits.
-    bool readConversion(char letter, bool runsOn);
+    // Each moves past what it reads and answers false when that is not there.
+    bool readConversion(const CalendarFormat::Piece& piece);
     bool readInLocale(char letter);
     bool readLiteral(std::string_view literal);
     bool readYear(bool hasFourDigits);

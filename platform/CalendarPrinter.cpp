@@ -3,7 +3,6 @@
 #include <fmt/compile.h>
 
 #include <cstdlib>
-#include <iterator>
 
 #include "platform/CalendarNames.h"
 #include "platform/LocalZone.h"
@@ -12,17 +11,21 @@ namespace platform {
 
 namespace {
 
-// At least four digits after the sign.
-void appendYear(std::string& text, int year) {
-    if (year < 0)
-        text += '-';
-    fmt::format_to(std::back_inserter(text), FMT_COMPILE("{:04}"), std::abs(year));
+void append(fmt::memory_buffer& text, std::string_view more) {
+    text.append(more);
 }
 
 // Of a number below 100.
-void appendTwoDigits(std::string& text, int number) {
-    text += static_cast<char>('0' + number / 10);
-    text += static_cast<char>('0' + number % 10);
+void appendTwoDigits(fmt::memory_buffer& text, int number) {
+    text.push_back(static_cast<char>('0' + number / 10));
+    text.push_back(static_cast<char>('0' + number % 10));
+}
+
+// At least four digits after the sign.
+void appendYear(fmt::memory_buffer& text, int year) {
+    if (year < 0)
+        text.push_back('-');
+    fmt::format_to(fmt::appender(text), FMT_COMPILE("{:04}"), std::abs(year));
 }
 
 int yearOfCentury(int year) {
@@ -40,18 +43,18 @@ CalendarPrinter::CalendarPrinter(std::int64_t seconds, int milliseconds, int sec
       time_(civilTimeOf(seconds + secondsFromGMT)) {}
 
 std::string CalendarPrinter::print(const CalendarFormat& format) const {
-    std::string text;
+    fmt::memory_buffer text;
     for (const CalendarFormat::Piece& piece : format.pieces()) {
         if (piece.isConversion())
             appendConversion(text, piece.conversion);
         else
-            text += piece.literal;
+            append(text, piece.literal);
     }
-    return text;
+    return fmt::to_string(text);
 }
 
-void CalendarPrinter::appendConversion(std::string& text, char letter) const {
-    const auto end = std::back_inserter(text);
+void CalendarPrinter::appendConversion(fmt::memory_buffer& text, char letter) const {
+    const fmt::appender end(text);
     switch (letter) {
         case 'Y':
             return appendYear(text, time_.year);
@@ -82,35 +85,33 @@ void CalendarPrinter::appendConversion(std::string& text, char letter) const {
             fmt::format_to(end, FMT_COMPILE("{:03}"), milliseconds_);
             return;
         case 'z':
-            text += zoneOffset();
-            return;
+            return append(text, zoneOffset());
         case 'Z':
-            text += zoneName();
-            return;
+            return append(text, zoneName());
         default:
-            text += inLocale(letter);
+            appendInLocale(text, letter);
     }
 }
 
-std::string CalendarPrinter::inLocale(char letter) const {
+void CalendarPrinter::appendInLocale(fmt::memory_buffer& text, char letter) const {
     const auto names = CalendarNames::ofLocale(locale_);
     switch (letter) {
         case 'a':
-            return names->name(NameKind::shortWeekday, dayOfWeek(time_));
+            return append(text, names->name(NameKind::shortWeekday, dayOfWeek(time_)));
         case 'A':
-            return names->name(NameKind::weekday, dayOfWeek(time_));
+            return append(text, names->name(NameKind::weekday, dayOfWeek(time_)));
         case 'b':
-            return names->name(NameKind::shortMonth, time_.month - 1);
+            return append(text, names->name(NameKind::shortMonth, time_.month - 1));
         case 'B':
-            return names->name(NameKind::month, time_.month - 1);
+            return append(text, names->name(NameKind::month, time_.month - 1));
         case 'p':
-            return names->name(NameKind::halfOfDay, time_.hour / 12);
+            return append(text, names->name(NameKind::halfOfDay, time_.hour / 12));
         case 'c':
-            return names->print(LocaleForm::dateAndTime, time_);
+            return append(text, names->print(LocaleForm::dateAndTime, time_));
         case 'x':
-            return names->print(LocaleForm::date, time_);
+            return append(text, names->print(LocaleForm::date, time_));
         default:  // 'X'
-            return names->print(LocaleForm::time, time_);
+            return append(text, names->print(LocaleForm::time, time_));
     }
 }
 
@@ -124,8 +125,8 @@ std::string CalendarPrinter::zoneOffset() const {
 
 // A date knows its offset only; the local zone has a name for it when it is the local one.
 std::string CalendarPrinter::zoneName() const {
-    const ZonedTime local = localZoneAt(seconds_);
-    return local.secondsFromGMT == secondsFromGMT_ ? local.abbreviation : zoneOffset();
+    const LocalZone zone = LocalZone::current();
+    return zone.secondsFromGMT(seconds_) == secondsFromGMT_ ? zone.abbreviation(seconds_) : zoneOffset();
 }
 
 }  // namespace platform

@@ -1,6 +1,8 @@
 // Prints a point in time by a calendar format.
 #pragma once
 
+#include <fmt/format.h>
+
 #include <cstdint>
 #include <string>
 
@@ -17,8 +19,8 @@ class CalendarPrinter {
     std::string print(const CalendarFormat& format) const;
 
   private:
-    void appendConversion(std::string& text, char letter) const;
-    std::string inLocale(char letter) const;
+    void appendConversion(fmt::memory_buffer& text, char letter) const;
+    void appendInLocale(fmt::memory_buffer& text, char letter) const;
     std::string zoneOffset() const;
     std::string zoneName() const;
 

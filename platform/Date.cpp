@@ -21,7 +21,7 @@ std::string_view signOf(int year) {
 
 int yearInCurrentCalendar(const Date& date) {
     const auto seconds = wholeSeconds(date.secondsSinceReferenceDate());
-    return seconds ? civilTimeOf(*seconds + localZoneAt(*seconds).secondsFromGMT).year : 0;
+    return seconds ? civilTimeOf(*seconds + LocalZone::current().secondsFromGMT(*seconds)).year : 0;
 }
 
 std::string iso8601String(const Date& date) {

@@ -1,24 +1,21 @@
-// The local time zone: what TZ, else the machine's own setting, says at the moment of the call.
-// Without TZ, a new setting of the machine's counts within a second.
+// The local time zone: what TZ, else the machine's own setting, says. Without TZ, a new setting of the
+// machine's counts within a second.
 //
 // Callable from any thread, as long as no thread changes the environment meanwhile.
 #pragma once
 
 #include <cstdint>
+#include <ctime>
 #include <optional>
 #include <string>
 
 namespace platform {
 
-// A point in time together with the zone in which it is meant.
+// A point in time together with the offset of the zone in which it is meant.
 struct ZonedTime {
     std::int64_t seconds;  // from 2001-01-01 00:00:00 UTC
     int secondsFromGMT;
-    std::string abbreviation;  // "CET"
 };
-
-// The zone's offset and abbreviation at a point in time, in seconds from 2001-01-01 00:00:00 UTC.
-ZonedTime localZoneAt(std::int64_t seconds);
 
 // The points in time at which a clock shows the same, the earlier first.
 struct LocalTimes {
@@ -26,9 +23,34 @@ struct LocalTimes {
     std::optional<ZonedTime> second;  // nil but where the clock is put back
 };
 
-// The points in time at which the clock shows `civilSeconds` (from 2001-01-01 00:00:00 on that clock). Where
-// the clock is put forward past them, it is the one at which a clock that had not been put forward would show
-// them.
-LocalTimes timesOfLocalClock(std::int64_t civilSeconds);
+// To look at the setting costs more than to look at a time by it, so one zone does for dates that are read
+// one after another. When the setting changes, zones made before may go by the old one or by the new.
+class LocalZone {
+  public:
+    // As it is set at this moment.
+    static LocalZone current();
+
+    // Points in time are seconds from 2001-01-01 00:00:00 UTC.
+    int secondsFromGMT(std::int64_t seconds) const;
+    std::string abbreviation(std::int64_t seconds) const;  // "CET"
+
+    // The points in time at which the clock shows `civilSeconds` (from 2001-01-01 00:00:00 on that clock).
+    // Where the clock is put forward past them, it is the one at which a clock that had not been put forward
+    // would show them.
+    LocalTimes timesOfClock(std::int64_t civilSeconds) const;
+
+  private:
+    class QuietTime;
+
+    LocalZone() = default;
+
+    // localtime_r, after the setting has been looked up where that is needed; nil for years that no int can
+    // hold.
+    std::optional<std::tm> fieldsAt(std::int64_t seconds) const;
+    ZonedTime zonedTime(std::int64_t seconds) const;
+
+    std::optional<std::string> TZ_;
+    std::time_t second_ = -1;  // in which the machine's own setting was looked at; with TZ, it isn't
+};
 
 }  // namespace platform

@@ -13,7 +13,7 @@ constexpr int monthsPerYear = 12;
 
 CivilTime midnightOf(const platform::Date& now) {
     const std::int64_t seconds = platform::wholeSeconds(now.secondsSinceReferenceDate()).value_or(0);
-    CivilTime time = platform::civilTimeOf(seconds + platform::localZoneAt(seconds).secondsFromGMT);
+    CivilTime time = platform::civilTimeOf(seconds + platform::LocalZone::current().secondsFromGMT(seconds));
     time.hour = time.minute = time.second = 0;
     return time;
 }
@@ -64,7 +64,7 @@ double QueryTime::secondsSince1970(const platform::Date& now) const {
     if (unit == QueryTimeUnit::now)
         return now.secondsSince1970() + amount;
     const CivilTime time = beginning(unit, static_cast<int>(amount), midnightOf(now));
-    const auto seconds = platform::timesOfLocalClock(platform::secondsOf(time)).first.seconds;
+    const auto seconds = platform::LocalZone::current().timesOfClock(platform::secondsOf(time)).first.seconds;
     return static_cast<double>(seconds) + platform::Date::secondsFrom1970ToReferenceDate;
 }
 
