@@ -22,7 +22,7 @@ platform::CalendarDateRef PathDate::_vxMBCalendarDateFromFileName(const std::str
     return dateFromFileName(fileName, ClipNameTexts(plugin));
 }
 
-platform::CalendarDateRef PathDate::dateFromFileName(const std::string& fileName, const ClipNameTexts& texts,
+platform::CalendarDateRef PathDate::dateFromFileName(std::string_view fileName, const ClipNameTexts& texts,
                                                      const platform::LocalZone& zone) {
     const std::string_view stem = path::withoutExtensionView(fileName);
     if (!stem.starts_with(texts.prefix))

@@ -29,7 +29,7 @@ namespace PathDate {
 // of the plug-in; nil for any other name and for years outside 1900 to 2100.
 platform::CalendarDateRef _vxMBCalendarDateFromFileName(const std::string& fileName,
                                                         const VXReelixPlugin& plugin);
-platform::CalendarDateRef dateFromFileName(const std::string& fileName, const ClipNameTexts& texts,
+platform::CalendarDateRef dateFromFileName(std::string_view fileName, const ClipNameTexts& texts,
                                            const platform::LocalZone& zone = platform::LocalZone::current());
 
 }  // namespace PathDate

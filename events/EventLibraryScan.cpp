@@ -18,7 +18,7 @@ namespace path = platform::path;
 
 constexpr int yearWithoutCreationDate = -1;
 
-bool isHiddenName(const std::string& name) {
+bool isHiddenName(std::string_view name) {
     return name.empty() || name.front() == '.';
 }
 
@@ -216,7 +216,7 @@ VXReelixPlugin::Object VXReelixPlugin::EventLibraryScan::clipForFile(const platf
     if (!isSupportedMovie(clip, folder.isPlainFile(item))) {
         if (!isMovieByMetadata(*vexo::VXMediaObject::spotlightProperties(clip)))
             return nullptr;
-        mediaObject = newClip(item.name, std::move(clip), event);
+        mediaObject = newClip(std::string(item.name), std::move(clip), event);
     }
     const auto dates = datesOfClip(folder, item);
     if (!dates)
@@ -259,7 +259,7 @@ VXReelixPlugin::Object VXReelixPlugin::EventLibraryScan::newClip(std::string nam
 }
 
 std::string VXReelixPlugin::EventLibraryScan::clipName(const platform::CalendarDateRef& date,
-                                                       const std::string& fileName) const {
+                                                       std::string_view fileName) const {
     return date ? date->descriptionWithCalendarFormat(texts_.displayFormat, locale_)
                 : path::withoutExtension(fileName);
 }

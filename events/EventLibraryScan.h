@@ -105,7 +105,7 @@ class VXReelixPlugin::EventLibraryScan {
     std::optional<ClipDates> datesOfClip(const platform::Folder& folder,
                                          const platform::FolderItem& item) const;
     Object newClip(std::string name, std::string clip, const ScannedEvent& event) const;
-    std::string clipName(const platform::CalendarDateRef& date, const std::string& fileName) const;
+    std::string clipName(const platform::CalendarDateRef& date, std::string_view fileName) const;
 
     VXReelixPlugin& plugin_;
     const ClipNameTexts texts_;

@@ -38,7 +38,7 @@ struct FolderItem {
     // `other` stands for everything else, and for what the listing says nothing about.
     enum class Kind : std::uint8_t { other, plainFile, folder };
 
-    std::string name;
+    std::string_view name;  // lives as long as its folder is open; a NUL follows it
     Kind kind = Kind::other;
 };
 

@@ -61,14 +61,14 @@ struct FolderLook {
 };
 
 // The entries are summed up, because servers list them in any order.
-void add(FolderLook& look, int folder, const std::string& name) {
+void add(FolderLook& look, int folder, std::string_view name) {
     struct stat status {};
     constexpr int flags = AT_SYMLINK_NOFOLLOW | AT_NO_AUTOMOUNT;
-    if (uninterrupted([&] { return fstatat(folder, name.c_str(), &status, flags); }) != 0)
+    if (uninterrupted([&] { return fstatat(folder, name.data(), &status, flags); }) != 0)
         return;
-    look.signature += Signature(std::hash<std::string>()(name), signatureOf(status)).value();
+    look.signature += Signature(std::hash<std::string_view>()(name), signatureOf(status)).value();
     if (S_ISDIR(status.st_mode))
-        look.folders.push_back(name);
+        look.folders.emplace_back(name);
 }
 
 FolderLook lookInto(const std::string& folder, const std::atomic<bool>& stopped) {
@@ -76,7 +76,7 @@ FolderLook lookInto(const std::string& folder, const std::atomic<bool>& stopped)
     if (!listing)
         return {Signature(errno).value(), {}};
     FolderLook look;
-    for (const platform::FolderItem& item : listing->items) {
+    for (const platform::FolderItem& item : listing->content.items) {
         if (stopped)
             break;
         add(look, listing->folder.number(), item.name);

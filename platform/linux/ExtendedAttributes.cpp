@@ -71,13 +71,13 @@ std::ptrdiff_t attributeOfSidecar(const std::string& path, std::string_view name
 }  // namespace
 
 AttributedFile::AttributedFile(const std::string& path)
-    : folder_(AT_FDCWD), folderPath_(nullptr), name_(path) {}
+    : folder_(AT_FDCWD), folderPath_(nullptr), name_(path.c_str()) {}
 
-AttributedFile::AttributedFile(int folder, const std::string& folderPath, const std::string& name)
+AttributedFile::AttributedFile(int folder, const std::string& folderPath, const char* name)
     : folder_(folder), folderPath_(&folderPath), name_(name) {}
 
 std::ptrdiff_t AttributedFile::attribute(const std::string& name, std::span<char> buffer) const {
-    if (const auto size = attributeInFolder(folder_, name_.c_str(), name.c_str(), buffer))
+    if (const auto size = attributeInFolder(folder_, name_, name.c_str(), buffer))
         return *size;
     const auto size =
         uninterrupted([&] { return getxattr(path().c_str(), name.c_str(), buffer.data(), buffer.size()); });

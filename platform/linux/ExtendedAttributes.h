@@ -23,7 +23,7 @@ class AttributedFile {
   public:
     AttributedFile(const std::string& path);  // NOLINT: a path is what says which file is meant
     // `folder` is the descriptor of the folder at `folderPath`. All of these outlive the object.
-    AttributedFile(int folder, const std::string& folderPath, const std::string& name);
+    AttributedFile(int folder, const std::string& folderPath, const char* name);
 
     // getxattr, with the negative errno for a failure.
     std::ptrdiff_t attribute(const std::string& name, std::span<char> buffer) const;
@@ -32,7 +32,7 @@ class AttributedFile {
   private:
     const int folder_;
     const std::string* const folderPath_;  // nil when the name is a path
-    const std::string& name_;
+    const char* const name_;
 };
 
 // The attribute "user.<name>", else "osx.<name>", by which drivers for foreign volumes show it, else, where

@@ -43,11 +43,11 @@ std::string fuseTypeName(const std::string& path) {
     return name;
 }
 
-std::vector<std::string> namesOf(std::vector<FolderItem> items) {
+std::vector<std::string> namesOf(const std::vector<FolderItem>& items) {
     std::vector<std::string> names;
     names.reserve(items.size());
-    for (FolderItem& item : items)
-        names.push_back(std::move(item.name));
+    for (const FolderItem& item : items)
+        names.emplace_back(item.name);
     return names;
 }
 
@@ -96,8 +96,8 @@ std::optional<std::vector<std::string>> LinuxFileManager::contentsOfDirectoryAtP
     const auto real = kernelPath(path);
     if (!real)
         return std::nullopt;
-    auto listing = listingOfFolder(*real);
-    return listing ? std::optional(namesOf(std::move(listing->items))) : std::nullopt;
+    const auto listing = listingOfFolder(*real);
+    return listing ? std::optional(namesOf(listing->content.items)) : std::nullopt;
 }
 
 std::unique_ptr<Folder> LinuxFileManager::openFolderAtPath(const std::string& path) const {
@@ -238,7 +238,7 @@ std::optional<std::string> LinuxFileManager::volumeNameAt(const std::string& mou
 }
 
 std::optional<FolderListing> LinuxFileManager::listingOfFolder(const std::string& path) const {
-    return FolderListing::openOrLog(AT_FDCWD, path, path, systemLog_);
+    return FolderListing::openOrLog(AT_FDCWD, path.c_str(), path, systemLog_);
 }
 
 void LinuxFileManager::logFailure(std::string_view operation, const std::string& path, int error) const {

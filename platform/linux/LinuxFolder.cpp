@@ -36,30 +36,38 @@ FolderItem::Kind kindOf(const dirent64& entry) {
     }
 }
 
+// Of a block as getdents64 fills it, in which their names stay.
+void addItems(std::vector<FolderItem>& items, const char* block, const char* end) {
+    while (block < end) {
+        const auto& entry = *reinterpret_cast<const dirent64*>(block);
+        if (!isDotOrDotDot(entry.d_name))
+            items.push_back({entry.d_name, kindOf(entry)});
+        block += entry.d_reclen;
+    }
+}
+
 // nil, and errno set, when reading fails. Without the C library's stream of a folder, which costs a call and
 // a block of memory a folder, in libraries of small ones a tenth of the load.
-std::optional<std::vector<FolderItem>> readItems(int folder) {
-    std::vector<FolderItem> items;
+std::optional<FolderItems> readItems(int folder) {
+    FolderItems content;
     alignas(dirent64) std::array<char, 32 * 1024> buffer;
     for (;;) {
         const auto size = uninterrupted([&] { return getdents64(folder, buffer.data(), buffer.size()); });
         if (size == 0 || (size < 0 && errno == ENOENT))  // the latter of a folder that is gone
-            return items;
+            return content;
         if (size < 0)
             return std::nullopt;
-        for (const char* next = buffer.data(); next < buffer.data() + size;) {
-            const auto& entry = *reinterpret_cast<const dirent64*>(next);
-            if (!isDotOrDotDot(entry.d_name))
-                items.push_back({entry.d_name, kindOf(entry)});
-            next += entry.d_reclen;
-        }
+        auto block = std::make_unique_for_overwrite<char[]>(static_cast<std::size_t>(size));
+        std::copy_n(buffer.data(), size, block.get());
+        addItems(content.items, block.get(), block.get() + size);
+        content.names.push_back(std::move(block));
     }
 }
 
 // In any case of letters, because some file systems find the file by any.
 bool holdsHiddenFile(const FolderListing& listing) {
-    return std::ranges::any_of(listing.items, [](const FolderItem& item) {
-        return item.name.starts_with('.') && strcasecmp(item.name.c_str(), ".hidden") == 0;
+    return std::ranges::any_of(listing.content.items, [](const FolderItem& item) {
+        return item.name.starts_with('.') && strcasecmp(item.name.data(), ".hidden") == 0;
     });
 }
 
@@ -69,19 +77,19 @@ dev_t deviceOf(const struct statx& status) {
 
 }  // namespace
 
-std::optional<FolderListing> FolderListing::open(int parent, const std::string& name) {
+std::optional<FolderListing> FolderListing::open(int parent, const char* name) {
     constexpr int flags = O_RDONLY | O_DIRECTORY | O_CLOEXEC | O_NONBLOCK;
-    FileDescriptor folder(uninterrupted([&] { return openat(parent, name.c_str(), flags); }));
+    FileDescriptor folder(uninterrupted([&] { return openat(parent, name, flags); }));
     if (!folder)
         return std::nullopt;
-    auto items = readItems(folder.number());
-    if (!items)
+    auto content = readItems(folder.number());
+    if (!content)
         return std::nullopt;
-    return FolderListing{std::move(folder), std::move(*items)};
+    return FolderListing{std::move(folder), std::move(*content)};
 }
 
-std::optional<FolderListing> FolderListing::openOrLog(int parent, const std::string& name,
-                                                      const std::string& path, SystemLog& log) {
+std::optional<FolderListing> FolderListing::openOrLog(int parent, const char* name, const std::string& path,
+                                                      SystemLog& log) {
     auto listing = open(parent, name);
     if (!listing && errno != ENOENT)
         log.log(failureLine("list", path, errno));
@@ -151,8 +159,8 @@ std::optional<std::ptrdiff_t> LinuxFolder::extendedAttributeOf(const FolderItem&
     const bool isLikeOthers = item.kind == FolderItem::Kind::plainFile;
     const auto foreignNames =
         isLikeOthers && !device_->mayHaveForeignNames ? ForeignNames::knownToBeMissing : ForeignNames::asked;
-    const AttributeAnswer answer = platform::extendedAttribute({listing_.folder.number(), path_, item.name},
-                                                               attribute, buffer, foreignNames);
+    const AttributeAnswer answer = platform::extendedAttribute(
+        {listing_.folder.number(), path_, item.name.data()}, attribute, buffer, foreignNames);
     if (isLikeOthers && !answer.hasForeignNames)
         device_->mayHaveForeignNames = false;
     if (answer.size < 0 && !isUsualForAttributes(static_cast<int>(-answer.size)))
@@ -165,7 +173,8 @@ std::unique_ptr<Folder> LinuxFolder::openFolder(const FolderItem& item) const {
     std::string path = pathOf(item.name);
     if (!services_.reach.isInReach(path))
         return nullptr;
-    auto listing = FolderListing::openOrLog(listing_.folder.number(), item.name, path, services_.systemLog);
+    auto listing =
+        FolderListing::openOrLog(listing_.folder.number(), item.name.data(), path, services_.systemLog);
     if (!listing)
         return nullptr;
     return std::unique_ptr<Folder>(new LinuxFolder(std::move(*listing), std::move(path), services_, device_));
@@ -176,17 +185,17 @@ bool LinuxFolder::isInReach(const FolderItem& item) const {
 }
 
 std::optional<struct statx> LinuxFolder::statusOf(const FolderItem& item, int flags) const {
-    const auto status = statusOfFile(listing_.folder.number(), item.name.c_str(), flags);
+    const auto status = statusOfFile(listing_.folder.number(), item.name.data(), flags);
     if (!status && !meansMissing(errno))
         services_.systemLog.log(failureLine("look at", pathOf(item.name), errno));
     return status;
 }
 
-bool LinuxFolder::isInvisibleByName(const std::string& name) const {
+bool LinuxFolder::isInvisibleByName(std::string_view name) const {
     return name.starts_with('.') || (hiddenNames_ && hiddenNames_->contains(name));
 }
 
-std::string LinuxFolder::pathOf(const std::string& name) const {
+std::string LinuxFolder::pathOf(std::string_view name) const {
     return path::appending(path_, name);
 }
 

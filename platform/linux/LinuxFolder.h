@@ -22,18 +22,24 @@
 
 namespace platform {
 
-// An open folder with what lies in it, in the order of the file system.
+// What lies in a folder, in the order of the file system.
+struct FolderItems {
+    std::vector<FolderItem> items;
+    std::vector<std::unique_ptr<const char[]>> names;  // blocks as the kernel filled them
+};
+
+// An open folder with what lies in it.
 struct FolderListing {
     // nil, and errno set, when the folder can't be listed.
-    static std::optional<FolderListing> open(const std::string& path) { return open(AT_FDCWD, path); }
+    static std::optional<FolderListing> open(const std::string& path) { return open(AT_FDCWD, path.c_str()); }
     // By its name in an open folder.
-    static std::optional<FolderListing> open(int parent, const std::string& name);
+    static std::optional<FolderListing> open(int parent, const char* name);
     // The same; why it can't be listed, of the folder at `path`, is logged, unless it is not there.
-    static std::optional<FolderListing> openOrLog(int parent, const std::string& name,
-                                                  const std::string& path, SystemLog& log);
+    static std::optional<FolderListing> openOrLog(int parent, const char* name, const std::string& path,
+                                                  SystemLog& log);
 
     FileDescriptor folder;
-    std::vector<FolderItem> items;
+    FolderItems content;
 };
 
 class LinuxFolder final : public Folder {
@@ -50,7 +56,7 @@ class LinuxFolder final : public Folder {
     // that are opened from it.
     LinuxFolder(FolderListing listing, std::string path, const Services& services);
 
-    const std::vector<FolderItem>& items() const override { return listing_.items; }
+    const std::vector<FolderItem>& items() const override { return listing_.content.items; }
     std::optional<std::uint32_t> flagsOf(const FolderItem& item) const override;
     bool isPlainFile(const FolderItem& item) const override;
     std::optional<FileAttributes> attributesOf(const FolderItem& item) const override;
@@ -77,8 +83,8 @@ class LinuxFolder final : public Folder {
     // Not behind a link to a mount that doesn't answer.
     bool isInReach(const FolderItem& item) const;
     std::optional<struct ::statx> statusOf(const FolderItem& item, int flags) const;
-    bool isInvisibleByName(const std::string& name) const;
-    std::string pathOf(const std::string& name) const;
+    bool isInvisibleByName(std::string_view name) const;
+    std::string pathOf(std::string_view name) const;
 
     const FolderListing listing_;
     const std::string path_;

@@ -26,11 +26,11 @@ using testing::UnorderedElementsAre;
 class FolderTest : public testing::Test {
   protected:
     std::unique_ptr<Folder> open() const { return files_.openFolderAtPath(home_.path()); }
-    static FolderItem itemNamed(const Folder& folder, const std::string& name) {
+    static FolderItem itemNamed(const Folder& folder, std::string_view name) {
         const auto found = std::ranges::find(folder.items(), name, &FolderItem::name);
         return found != folder.items().end() ? *found : FolderItem{name};
     }
-    static std::string attribute(const Folder& folder, const std::string& name) {
+    static std::string attribute(const Folder& folder, std::string_view name) {
         std::array<char, 16> value{};
         const auto size = folder.extendedAttributeOf(itemNamed(folder, name), "date", value);
         if (!size)
@@ -83,7 +83,7 @@ TEST_F(FolderTest, ItemsAreThoseOfTheListing) {
     const auto folder = open();
     std::vector<std::string> names;
     for (const FolderItem& item : folder->items())
-        names.push_back(item.name);
+        names.emplace_back(item.name);
     EXPECT_EQ(names, files_.contentsOfDirectoryAtPath(home_.path()));
 }
 
@@ -93,7 +93,7 @@ TEST_F(FolderTest, ItemsAreToldOfAsByPath) {
     const auto folder = open();
     const auto byPath = PathFolder::open(files_, home_.path());
     std::vector<FolderItem> items = folder->items();
-    for (const std::string name : {".", "missing", "file.mov/below"})
+    for (const char* name : {".", "missing", "file.mov/below"})
         items.push_back({name});
     for (const FolderItem& item : items) {
         EXPECT_EQ(told(*folder, item), told(*byPath, item)) << item.name;

@@ -20,11 +20,11 @@ class PathFolder final : public platform::Folder {
     static std::unique_ptr<platform::Folder> open(const platform::FileManager& files,
                                                   const std::string& path) {
         auto names = files.contentsOfDirectoryAtPath(path);
-        return names ? std::make_unique<PathFolder>(files, path, *names) : nullptr;
+        return names ? std::make_unique<PathFolder>(files, path, std::move(*names)) : nullptr;
     }
-    PathFolder(const platform::FileManager& files, std::string path, const std::vector<std::string>& names)
-        : files_(files), path_(std::move(path)) {
-        for (const std::string& name : names)
+    PathFolder(const platform::FileManager& files, std::string path, std::vector<std::string> names)
+        : files_(files), path_(std::move(path)), names_(std::move(names)) {
+        for (const std::string& name : names_)
             items_.push_back({name});
     }
 
@@ -60,6 +60,7 @@ class PathFolder final : public platform::Folder {
 
     const platform::FileManager& files_;
     const std::string path_;
+    const std::vector<std::string> names_;
     std::vector<platform::FolderItem> items_;
 };
 
