@@ -25,7 +25,11 @@ void appendTwoDigits(fmt::memory_buffer& text, int number) {
 void appendYear(fmt::memory_buffer& text, int year) {
     if (year < 0)
         text.push_back('-');
-    fmt::format_to(fmt::appender(text), FMT_COMPILE("{:04}"), std::abs(year));
+    const int size = std::abs(year);
+    if (size > 9999)
+        return append(text, fmt::format_int(size).c_str());
+    appendTwoDigits(text, size / 100);
+    appendTwoDigits(text, size % 100);
 }
 
 int yearOfCentury(int year) {
