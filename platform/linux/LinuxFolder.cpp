@@ -161,7 +161,8 @@ std::optional<std::ptrdiff_t> LinuxFolder::extendedAttributeOf(const FolderItem&
         isLikeOthers && !device_->mayHaveForeignNames ? ForeignNames::knownToBeMissing : ForeignNames::asked;
     const AttributeAnswer answer = platform::extendedAttribute(
         {listing_.folder.number(), path_, item.name.data()}, attribute, buffer, foreignNames);
-    if (isLikeOthers && !answer.hasForeignNames)
+    // Written once: threads that write what others read wait for each other.
+    if (foreignNames == ForeignNames::asked && isLikeOthers && !answer.hasForeignNames)
         device_->mayHaveForeignNames = false;
     if (answer.size < 0 && !isUsualForAttributes(static_cast<int>(-answer.size)))
         services_.systemLog.log(
