@@ -54,6 +54,12 @@ std::optional<int> usableYear(const platform::CalendarDateRef& date) {
     return 0 <= year && year <= 9999 ? std::optional(year) : std::nullopt;
 }
 
+// The same image, whose owners are counted on their own: threads that count them in one place wait for each
+// other at every clip.
+platform::ImageRef countedApart(const platform::ImageRef& image) {
+    return {std::make_shared<platform::ImageRef>(image), image.get()};
+}
+
 int creationYear(const platform::DateRef& creationDate) {
     return creationDate ? platform::yearInCurrentCalendar(*creationDate) : yearWithoutCreationDate;
 }
@@ -196,7 +202,7 @@ VXReelixPlugin::EventLibraryScan::FolderRef VXReelixPlugin::EventLibraryScan::fo
         return nullptr;
     event.clips.resize(folder->items().size());
     event.years.resize((event.clips.size() - 1) / clipsAPiece + 1);
-    event.clipIcon = iconCache().smallApplicationIcon.get();
+    event.clipIcon = countedApart(iconCache().smallApplicationIcon.get());
     const auto attributes = folder->attributes();
     event.event = plugin_.eventGroupForFolder(*event.folder.string(), libraryFolder_,
                                               attributes ? attributes->modificationDate : nullptr);

@@ -61,7 +61,7 @@ class VXReelixPlugin::EventLibraryScan {
     std::vector<ScannedEvent> takeEvents() VX_EXCLUDES(mutex_);
 
   private:
-    static constexpr std::size_t clipsAPiece = 64;
+    static constexpr std::size_t clipsAPiece = 128;
 
     using FolderRef = std::shared_ptr<const platform::Folder>;
 
