@@ -147,8 +147,8 @@ void VXMediaObject::setThumbnailImage(platform::ImageRef image) {
 std::optional<platform::Value> VXMediaObject::attributeForKey(std::string_view key) const {
     {
         Locked lock(mutex_);
-        if (const Attribute* attribute = findAttribute(key))
-            return attribute->value;
+        if (const platform::Value* attribute = attributes_.find(key))
+            return *attribute;
     }
     return metadataAttributeForKey(key);
 }
@@ -173,24 +173,43 @@ std::optional<platform::Value> VXMediaObject::metadataAttributeForKey(std::strin
 void VXMediaObject::setAttribute(platform::Value attribute, std::string_view forKey) {
     const std::string_view key = lastingText(forKey);
     Locked lock(mutex_);
-    std::erase_if(attributes_, [key](const Attribute& each) { return each.key == key; });
-    attributes_.push_back({key, std::move(attribute)});
-}
-
-const VXMediaObject::Attribute* VXMediaObject::findAttribute(std::string_view key) const {
-    for (const Attribute& attribute : attributes_) {
-        if (attribute.key == key)
-            return &attribute;
-    }
-    return nullptr;
+    attributes_.set({key, std::move(attribute)});
 }
 
 platform::Dictionary VXMediaObject::attributes() const {
-    platform::Dictionary attributes;
     Locked lock(mutex_);
-    for (const auto& [key, value] : attributes_)
-        attributes.emplace(key, value);
-    return attributes;
+    return attributes_.dictionary();
+}
+
+const platform::Value* VXMediaObject::Attributes::find(std::string_view key) const {
+    if (first_ && first_->key == key)
+        return &first_->value;
+    if (!others_)
+        return nullptr;
+    const auto found = std::ranges::find(*others_, key, &Attribute::key);
+    return found != others_->end() ? &found->value : nullptr;
+}
+
+void VXMediaObject::Attributes::set(Attribute attribute) {
+    if (!first_ || first_->key == attribute.key) {
+        first_ = std::move(attribute);
+        return;
+    }
+    if (!others_)
+        others_ = std::make_unique<std::vector<Attribute>>();
+    std::erase_if(*others_, [&](const Attribute& other) { return other.key == attribute.key; });
+    others_->push_back(std::move(attribute));
+}
+
+platform::Dictionary VXMediaObject::Attributes::dictionary() const {
+    platform::Dictionary dictionary;
+    if (first_)
+        dictionary.emplace(first_->key, first_->value);
+    if (others_) {
+        for (const auto& [key, value] : *others_)
+            dictionary.emplace(key, value);
+    }
+    return dictionary;
 }
 
 void VXMediaObject::setSpotlightProperties(VXMetadataPropertiesRef properties) {

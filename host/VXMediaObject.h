@@ -83,9 +83,19 @@ class VXMediaObject final {
         std::string_view key;  // lives as long as the process
         platform::Value value;
     };
+    // Nearly all items have one attribute, which needs no memory of its own.
+    class Attributes {
+      public:
+        const platform::Value* find(std::string_view key) const;
+        void set(Attribute attribute);
+        platform::Dictionary dictionary() const;
+
+      private:
+        std::optional<Attribute> first_;
+        std::unique_ptr<std::vector<Attribute>> others_;  // nil for none
+    };
 
     std::optional<platform::Value> metadataAttributeForKey(std::string_view key) const;
-    const Attribute* findAttribute(std::string_view key) const VX_REQUIRES(mutex_);
 
     const std::string ID_;
     const int mediaType_;
@@ -96,7 +106,7 @@ class VXMediaObject final {
     mutable bool propertiesAreOfID_ VX_GUARDED_BY(mutex_) = false;
     std::string name_ VX_GUARDED_BY(mutex_);
     std::unique_ptr<const std::string> otherPath_ VX_GUARDED_BY(mutex_);  // nil when the path is the ID
-    std::vector<Attribute> attributes_ VX_GUARDED_BY(mutex_);             // as they came: they are few
+    Attributes attributes_ VX_GUARDED_BY(mutex_);
     platform::ImageRef icon_ VX_GUARDED_BY(mutex_);
     mutable platform::ImageRef thumbnailImage_ VX_GUARDED_BY(mutex_);  // made when first asked for
     mutable VXMetadataPropertiesRef spotlightProperties_ VX_GUARDED_BY(mutex_);
