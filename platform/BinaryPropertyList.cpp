@@ -25,6 +25,13 @@ unsigned lowHalf(std::uint64_t marker) {
     return static_cast<unsigned>(marker) & 0xF;
 }
 
+std::uint64_t bigEndian(std::span<const std::byte> digits) {
+    std::uint64_t number = 0;
+    for (const std::byte digit : digits)
+        number = number << 8 | std::to_integer<std::uint64_t>(digit);
+    return number;
+}
+
 std::string_view characters(std::span<const std::byte> bytes) {
     return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
 }
@@ -273,17 +280,17 @@ void BinaryPropertyList::read(std::uint64_t offset, std::span<std::byte> buffer)
         throw PropertyListError("the file can't be read to its end");
 }
 
+// Nearly every number lies in the page that was read last.
 std::uint64_t BinaryPropertyList::number(std::uint64_t offset, std::size_t width) {
-    std::array<std::byte, 8> buffer;
-    const std::byte* digits = bytes_.inLatestPage(offset, width);
-    if (!digits) {
-        read(offset, std::span(buffer).first(width));
-        digits = buffer.data();
-    }
-    std::uint64_t number = 0;
-    for (const std::byte digit : std::span(digits, width))
-        number = number << 8 | std::to_integer<std::uint64_t>(digit);
-    return number;
+    if (const std::byte* digits = bytes_.inLatestPage(offset, width))
+        return bigEndian({digits, width});
+    return readNumber(offset, width);
+}
+
+std::uint64_t BinaryPropertyList::readNumber(std::uint64_t offset, std::size_t width) {
+    std::array<std::byte, 8> digits;
+    read(offset, std::span(digits).first(width));
+    return bigEndian(std::span(digits).first(width));
 }
 
 }  // namespace platform
