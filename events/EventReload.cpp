@@ -173,7 +173,7 @@ void VXReelixPlugin::finishReloadReelixEvents(const Group& eventLibrary) {
     const Group root = rootMediaGroup();
     if (!root)
         return;
-    const bool hasClips = eventLibrary && !eventLibrary->mediaObjects().empty();
+    const bool hasClips = eventLibrary && eventLibrary->mediaObjectCount() > 0;
     bool placed = false;
     Groups children;
     for (const Group& child : root->childGroups()) {

@@ -77,20 +77,27 @@ void VXMediaGroup::addChildGroups(const VXMediaGroupList& childGroups) {
 }
 
 VXMediaObjectList VXMediaGroup::mediaObjects() const {
-    if (std::optional<VXMediaObjectList> own = ownMediaObjects())
-        return *own;
     std::vector<VXMediaObjectList> lists;
-    addListsOfChildren(lists);
+    addLists(lists);
     return VXMediaObjectList::joining(lists);
 }
 
-void VXMediaGroup::addListsOfChildren(std::vector<VXMediaObjectList>& lists) const {
-    for (const VXMediaGroupRef& childGroup : childGroups()) {
-        if (std::optional<VXMediaObjectList> own = childGroup->ownMediaObjects())
-            lists.push_back(std::move(*own));
-        else
-            childGroup->addListsOfChildren(lists);
+std::size_t VXMediaGroup::mediaObjectCount() const {
+    std::vector<VXMediaObjectList> lists;
+    addLists(lists);
+    std::size_t count = 0;
+    for (const VXMediaObjectList& list : lists)
+        count += list.size();
+    return count;
+}
+
+void VXMediaGroup::addLists(std::vector<VXMediaObjectList>& lists) const {
+    if (std::optional<VXMediaObjectList> own = ownMediaObjects()) {
+        lists.push_back(std::move(*own));
+        return;
     }
+    for (const VXMediaGroupRef& childGroup : childGroups())
+        childGroup->addLists(lists);
 }
 
 void VXMediaGroup::setMediaObjects(VXMediaObjectList mediaObjects) {

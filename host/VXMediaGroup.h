@@ -49,6 +49,8 @@ class VXMediaGroup final {
     // The items of the group. A group that was never given any reports those of its children, gathered in
     // order; one that was given a list, even an empty one, reports that list.
     VXMediaObjectList mediaObjects() const VX_EXCLUDES(mutex_);
+    // How many these are, without a list of them all.
+    std::size_t mediaObjectCount() const VX_EXCLUDES(mutex_);
     void setMediaObjects(VXMediaObjectList mediaObjects) VX_EXCLUDES(mutex_);
     // The list the group was given; nil when it was given none.
     std::optional<VXMediaObjectList> ownMediaObjects() const VX_EXCLUDES(mutex_);
@@ -71,7 +73,8 @@ class VXMediaGroup final {
     VXMediaGroupRef copy() const VX_EXCLUDES(mutex_);
 
   private:
-    void addListsOfChildren(std::vector<VXMediaObjectList>& lists) const VX_EXCLUDES(mutex_);
+    // Its own, or those of its children.
+    void addLists(std::vector<VXMediaObjectList>& lists) const VX_EXCLUDES(mutex_);
 
     // Everything a copy shares with its original.
     struct Fields {

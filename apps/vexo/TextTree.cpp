@@ -41,7 +41,7 @@ struct Contents {
             ++projects;
         if (type == VXReelixEventGroupTypeIdentifier) {
             ++events;
-            clips += group.mediaObjects().size();
+            clips += group.mediaObjectCount();
         }
         for (const VXMediaGroupRef& child : group.childGroups())
             add(*child);
@@ -68,12 +68,12 @@ Contents contentsBelow(const VXMediaGroup& group) {
 
 std::string describe(const VXMediaGroup& group) {
     if (isProject(group)) {
-        const std::size_t movies = group.mediaObjects().size();
+        const std::size_t movies = group.mediaObjectCount();
         return std::string(isTrailer(group) ? "trailer" : "project") + " · " +
                (movies > 0 ? counted(movies, "movie") : "not rendered");
     }
     if (group.typeIdentifier() == VXReelixEventGroupTypeIdentifier)
-        return counted(group.mediaObjects().size(), "clip");
+        return counted(group.mediaObjectCount(), "clip");
     const std::string contents = contentsBelow(group).text();
     return contents.empty() ? "empty" : contents;
 }

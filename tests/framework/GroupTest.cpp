@@ -55,6 +55,7 @@ TEST(GroupTest, AGroupThatWasGivenNoItemsReportsThoseOfItsChildren) {
     parent->addChildGroup(second);
 
     EXPECT_EQ(IDs(parent->mediaObjects()), (std::vector<std::string>{"a", "b", "c"}));
+    EXPECT_EQ(parent->mediaObjectCount(), 3u);
     EXPECT_EQ(parent->ownMediaObjects(), std::nullopt);
 }
 
@@ -72,6 +73,7 @@ TEST(GroupTest, ItemsAreGatheredThroughGroupsWithoutItemsAndNotBelowThoseWithSom
     last->setMediaObjects({item("a"), item("b")});
 
     EXPECT_EQ(IDs(root->mediaObjects()), (std::vector<std::string>{"a", "b", "a", "b", "a", "b"}));
+    EXPECT_EQ(root->mediaObjectCount(), 6u);
 }
 
 TEST(GroupTest, AGroupThatWasGivenAnEmptyListReportsNone) {
@@ -82,6 +84,7 @@ TEST(GroupTest, AGroupThatWasGivenAnEmptyListReportsNone) {
 
     parent->setMediaObjects({});
     EXPECT_TRUE(parent->mediaObjects().empty());
+    EXPECT_EQ(parent->mediaObjectCount(), 0u);
 }
 
 TEST(GroupTest, AddingNilLeavesTheChildrenUnchanged) {
