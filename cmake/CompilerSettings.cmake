@@ -2,8 +2,8 @@
 add_library(vexo_settings INTERFACE)
 target_compile_options(vexo_settings INTERFACE -Wall -Wextra -Wpedantic -Wshadow -Wnon-virtual-dtor
                                                -Woverloaded-virtual -fno-omit-frame-pointer)
-# Nobody puts functions of their own in the place of a library's, so the library's calls of them need not go through
-# its table of symbols and can be inlined.
+# Nobody puts functions of their own in the place of our libraries', so a library's calls of its own functions need not
+# go through its table of symbols and can be inlined.
 target_compile_options(vexo_settings INTERFACE -fno-semantic-interposition)
 target_link_options(vexo_settings INTERFACE LINKER:-Bsymbolic-functions)
 # Operations and fields of the system begin with an underscore and keep their names to the letter. As class

@@ -60,8 +60,8 @@ platform::ImageRef countedApart(const platform::ImageRef& image) {
     return {std::make_shared<platform::ImageRef>(image), image.get()};
 }
 
-int creationYear(const platform::DateRef& creationDate) {
-    return creationDate ? platform::yearInCurrentCalendar(*creationDate) : yearWithoutCreationDate;
+int creationYear(const platform::DateRef& creationDate, const platform::LocalZone& zone) {
+    return creationDate ? platform::yearInCurrentCalendar(*creationDate, zone) : yearWithoutCreationDate;
 }
 
 }  // namespace
@@ -249,7 +249,7 @@ std::optional<VXReelixPlugin::EventLibraryScan::ClipDates> VXReelixPlugin::Event
     if (!attributes)
         return std::nullopt;
     const auto& creation = attributes->creationDate;
-    return ClipDates{own, creation, year ? *year : creationYear(creation)};
+    return ClipDates{own, creation, year ? *year : creationYear(creation, zone_)};
 }
 
 VXReelixPlugin::Object VXReelixPlugin::EventLibraryScan::newClip(std::string name, std::string clip,

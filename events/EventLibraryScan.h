@@ -1,4 +1,4 @@
-// Goes through the event folders of one library, a few clips at a time, on any number of threads. The events
+// Goes through the event folders of one library, some clips at a time, on any number of threads. The events
 // are those in listing order, and so are their clips.
 #pragma once
 
@@ -8,12 +8,15 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "core/VXReelixPlugin.h"
 #include "events/ClipDates.h"
 #include "events/SharedWork.h"
+#include "platform/CalendarDate.h"
 #include "platform/FileManager.h"
+#include "platform/LocalZone.h"
 #include "platform/ThreadSafety.h"
 #include "platform/Value.h"
 

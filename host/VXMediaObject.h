@@ -83,7 +83,7 @@ class VXMediaObject final {
         std::string_view key;  // lives as long as the process
         platform::Value value;
     };
-    // Nearly all items have one attribute, which needs no memory of its own.
+    // A clip, as most items are, has one attribute, which needs no memory of its own.
     class Attributes {
       public:
         const platform::Value* find(std::string_view key) const;

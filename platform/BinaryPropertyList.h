@@ -83,6 +83,7 @@ class BinaryPropertyList {
     void read(std::uint64_t offset, std::span<std::byte> buffer);
     // An unsigned big-endian number of 1 to 8 bytes.
     std::uint64_t number(std::uint64_t offset, std::size_t width);
+    // The same, wherever it lies.
     std::uint64_t readNumber(std::uint64_t offset, std::size_t width);
 
     PageCache bytes_;

@@ -12,9 +12,9 @@
 //
 // The calendar is the Gregorian one for all times; the year before year 1 is year 0.
 //
-// Thread-safe. Parsing and printing use the local time zone at the moment of the call, unless they are handed
-// one, so a change of TZ or of the machine's zone counts from the next call on; a CalendarDate keeps the zone
-// offset it was made with.
+// Thread-safe. Parsing, unless it is handed a zone, and printing use the local time zone at the moment of the
+// call, so a change of TZ or of the machine's zone counts from the next call on; a CalendarDate keeps the
+// zone offset it was made with.
 #pragma once
 
 #include <memory>

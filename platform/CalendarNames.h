@@ -28,7 +28,8 @@ class CalendarNames {
     CalendarNames(const CalendarNames&) = delete;
     CalendarNames& operator=(const CalendarNames&) = delete;
 
-    // Counted from 0: January, Sunday and the morning come first. Empty where the locale has no such name.
+    // Counted from 0: January, Sunday and the morning come first. Empty where the locale has no such name. A
+    // part of this object.
     std::string_view name(NameKind kind, int index) const;
 
     struct Match {

@@ -1,7 +1,6 @@
 #include "platform/CalendarParser.h"
 
 #include <algorithm>
-#include <utility>
 
 namespace platform {
 

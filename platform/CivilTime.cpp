@@ -11,16 +11,15 @@ namespace {
 namespace chrono = std::chrono;
 
 constexpr std::int64_t secondsPerDay = 86400;
-constexpr double daysPerYear = 365.2425;
-constexpr double billionYears = 1e9 * daysPerYear * secondsPerDay;
 
 // The standard library's years have 16 bits. So dates are looked up in one era, the 400 years after which the
 // calendar repeats, days of the week included.
 constexpr chrono::year firstYearOfEra{2000};
-constexpr chrono::sys_days firstDayOfEra = firstYearOfEra / chrono::January / 1;
+constexpr chrono::sys_days firstDayOfEra = firstYearOfEra / 1 / 1;
 constexpr std::int64_t yearsPerEra = 400;
 constexpr std::int64_t daysPerEra =
     (chrono::sys_days((firstYearOfEra + chrono::years(yearsPerEra)) / 1 / 1) - firstDayOfEra).count();
+constexpr double billionYears = 1e9 * (static_cast<double>(daysPerEra) / yearsPerEra) * secondsPerDay;
 constexpr std::int64_t referenceDay = (chrono::sys_days(chrono::year{2001} / 1 / 1) - firstDayOfEra).count();
 
 struct Division {

@@ -5,7 +5,6 @@
 #include <cstdlib>
 
 #include "platform/CivilTime.h"
-#include "platform/LocalZone.h"
 
 namespace platform {
 
@@ -19,9 +18,9 @@ std::string_view signOf(int year) {
 
 }  // namespace
 
-int yearInCurrentCalendar(const Date& date) {
+int yearInCurrentCalendar(const Date& date, const LocalZone& zone) {
     const auto seconds = wholeSeconds(date.secondsSinceReferenceDate());
-    return seconds ? civilTimeOf(*seconds + LocalZone::current().secondsFromGMT(*seconds)).year : 0;
+    return seconds ? civilTimeOf(*seconds + zone.secondsFromGMT(*seconds)).year : 0;
 }
 
 std::string iso8601String(const Date& date) {

@@ -6,6 +6,8 @@
 #include <optional>
 #include <string>
 
+#include "platform/LocalZone.h"
+
 namespace platform {
 
 class Date;
@@ -40,7 +42,7 @@ class Date {
 // the year 0 and an empty text. The year before year 1 is year 0.
 
 // The year of `date` in the user's calendar, which on Linux is the Gregorian one, in the local time zone.
-int yearInCurrentCalendar(const Date& date);
+int yearInCurrentCalendar(const Date& date, const LocalZone& zone = LocalZone::current());
 
 // ISO 8601 in UTC with whole seconds, rounded down: "2008-12-31T23:59:59Z", "+12000-01-01T00:00:00Z",
 // "-0044-03-15T00:00:00Z".

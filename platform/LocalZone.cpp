@@ -18,6 +18,11 @@ constexpr std::int64_t nearby = 10 * hour;
 // apart (Freetown in 1939).
 constexpr std::int64_t aroundAnyChange = beyondAnyOffset + nearby;
 
+std::optional<std::string> environmentTZ() {
+    const char* const TZ = std::getenv("TZ");
+    return TZ ? std::optional<std::string>(TZ) : std::nullopt;
+}
+
 bool clockShows(const ZonedTime& time, std::int64_t civilSeconds) {
     return time.seconds + time.secondsFromGMT == civilSeconds;
 }
@@ -31,7 +36,7 @@ class LocalZone::QuietTime {
     // nil where the clock may change.
     std::optional<ZonedTime> timeOfClock(std::int64_t civilSeconds, const LocalZone& zone) const {
         const bool isNear = firstCivil_ <= civilSeconds && civilSeconds <= lastCivil_;
-        if (!isNear || zone_.second_ != zone.second_ || zone_.TZ_ != zone.TZ_)
+        if (!isNear || zone_ != zone)
             return std::nullopt;
         return ZonedTime{civilSeconds - secondsFromGMT_, secondsFromGMT_};
     }
@@ -52,9 +57,8 @@ class LocalZone::QuietTime {
 
 LocalZone LocalZone::current() {
     LocalZone zone;
-    if (const char* const TZ = std::getenv("TZ")) {
-        zone.TZ_ = TZ;
-    } else {
+    zone.TZ_ = environmentTZ();
+    if (!zone.TZ_) {
         timespec now{};
         clock_gettime(CLOCK_MONOTONIC_COARSE, &now);
         zone.second_ = now.tv_sec;
@@ -81,7 +85,8 @@ LocalTimes LocalZone::timesOfClock(std::int64_t civilSeconds) const {
     const int offsetBefore = secondsFromGMT(civilSeconds - aroundAnyChange);
     const int offsetAfter = secondsFromGMT(civilSeconds + aroundAnyChange);
     if (offsetBefore == offsetAfter) {
-        quiet.set(civilSeconds, *this, offsetBefore);
+        if (TZ_ == environmentTZ())  // else the offset need not be this zone's
+            quiet.set(civilSeconds, *this, offsetBefore);
         return {{civilSeconds - offsetBefore, offsetBefore}, std::nullopt};
     }
     const ZonedTime byOffsetBefore = zonedTime(civilSeconds - offsetBefore);
@@ -93,15 +98,13 @@ LocalTimes LocalZone::timesOfClock(std::int64_t civilSeconds) const {
     return {byOffsetBefore, isShownTwice ? std::optional(byOffsetAfter) : std::nullopt};
 }
 
-// localtime_r need not notice that the zone has changed. What threads share here is not written where nothing
-// has.
+// localtime_r need not notice that the setting has changed.
 std::optional<std::tm> LocalZone::fieldsAt(std::int64_t seconds) const {
-    static std::atomic<std::time_t> lastLookWithoutTZ = -1;
-    const bool hasLooked = lastLookWithoutTZ == second_;
-    if (TZ_ || !hasLooked)
+    static std::atomic<std::time_t> lastLookWithoutTZ = -1;  // -1 when the last look found TZ
+    if (TZ_ || lastLookWithoutTZ < second_) {
         tzset();
-    if (!hasLooked)
-        lastLookWithoutTZ = second_;
+        lastLookWithoutTZ = environmentTZ() ? -1 : second_;
+    }
     const std::time_t time = seconds + secondsTo1970;
     std::tm fields{};
     return localtime_r(&time, &fields) ? std::optional(fields) : std::nullopt;

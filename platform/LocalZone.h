@@ -27,7 +27,7 @@ struct LocalTimes {
 // one after another. When the setting changes, zones made before may go by the old one or by the new.
 class LocalZone {
   public:
-    // As it is set at this moment.
+    // By what TZ is at this moment, and without it by the machine's setting.
     static LocalZone current();
 
     // Points in time are seconds from 2001-01-01 00:00:00 UTC.
@@ -43,14 +43,15 @@ class LocalZone {
     class QuietTime;
 
     LocalZone() = default;
+    bool operator==(const LocalZone&) const = default;
 
-    // localtime_r, after the setting has been looked up where that is needed; nil for years that no int can
-    // hold.
+    // localtime_r, which has looked at the setting where that is needed; nil for years that no int can hold.
     std::optional<std::tm> fieldsAt(std::int64_t seconds) const;
     ZonedTime zonedTime(std::int64_t seconds) const;
 
     std::optional<std::string> TZ_;
-    std::time_t second_ = -1;  // in which the machine's own setting was looked at; with TZ, it isn't
+    std::time_t second_ =
+        -1;  // without TZ, when it was made: the machine's setting is looked at once a second
 };
 
 }  // namespace platform

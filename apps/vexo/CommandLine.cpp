@@ -395,8 +395,8 @@ Problems run(const HostCommand& command, Host& host) {
     }
 }
 
-// Of the plug-ins' trees, until the process ends: it takes their memory back at once, while to free a large
-// library item by item takes longer than to print it.
+// Keeps the plug-ins' trees until the process ends, which gives their memory back at once: freed item by
+// item, a large library's takes a tenth of the time of the whole command.
 void keepTrees(const Host& host) {
     static auto& trees = *new std::vector<VXMediaGroupRef>;
     for (const LoadedPlugin& plugin : host.plugins())

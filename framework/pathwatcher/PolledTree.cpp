@@ -7,6 +7,7 @@
 #include <cerrno>
 #include <functional>
 #include <set>
+#include <string_view>
 #include <utility>
 
 #include "framework/pathwatcher/PackageName.h"

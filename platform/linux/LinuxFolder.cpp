@@ -46,8 +46,8 @@ void addItems(std::vector<FolderItem>& items, const char* block, const char* end
     }
 }
 
-// nil, and errno set, when reading fails. Without the C library's stream of a folder, which costs a call and
-// a block of memory a folder, in libraries of small ones a tenth of the load.
+// nil, and errno set, when reading fails. Without the C library's stream of a folder, which asks the system
+// one thing more and takes a block of 32 KiB for any folder.
 std::optional<FolderItems> readItems(int folder) {
     FolderItems content;
     alignas(dirent64) std::array<char, 32 * 1024> buffer;
@@ -60,7 +60,7 @@ std::optional<FolderItems> readItems(int folder) {
         auto block = std::make_unique_for_overwrite<char[]>(static_cast<std::size_t>(size));
         std::copy_n(buffer.data(), size, block.get());
         addItems(content.items, block.get(), block.get() + size);
-        content.names.push_back(std::move(block));
+        content.nameBlocks.push_back(std::move(block));
     }
 }
 
@@ -161,7 +161,7 @@ std::optional<std::ptrdiff_t> LinuxFolder::extendedAttributeOf(const FolderItem&
         isLikeOthers && !device_->mayHaveForeignNames ? ForeignNames::knownToBeMissing : ForeignNames::asked;
     const AttributeAnswer answer = platform::extendedAttribute(
         {listing_.folder.number(), path_, item.name.data()}, attribute, buffer, foreignNames);
-    // Written once: threads that write what others read wait for each other.
+    // Not written for each file: threads that write what others read wait for each other.
     if (foreignNames == ForeignNames::asked && isLikeOthers && !answer.hasForeignNames)
         device_->mayHaveForeignNames = false;
     if (answer.size < 0 && !isUsualForAttributes(static_cast<int>(-answer.size)))

@@ -25,7 +25,8 @@ namespace platform {
 // What lies in a folder, in the order of the file system.
 struct FolderItems {
     std::vector<FolderItem> items;
-    std::vector<std::unique_ptr<const char[]>> names;  // blocks as the kernel filled them
+    std::vector<std::unique_ptr<const char[]>>
+        nameBlocks;  // as the kernel filled them; hold the items' names
 };
 
 // An open folder with what lies in it.

@@ -1,4 +1,5 @@
 // Scanning one event library folder into events and clips.
+#include "platform/Path.h"
 #include "tests/events/EventsTest.h"
 
 namespace testing_support {
@@ -384,6 +385,27 @@ TEST_F(EventScanTest, EventIsFiledUnderItsNewestYearWhenTheNewestComeFirst) {
     addClip("Trip/b.mov", "2007-02-02 00;00;00");
     addClip("Trip/c.mov", "2008-03-03 00;00;00");
     EXPECT_EQ(attributesText(*scannedEvent()), "2009, 2007-02-02T00:00:00Z to 2009-01-01T00:00:00Z");
+}
+
+// More clips than a thread takes at once.
+TEST_F(EventScanTest, LargeEventHasItsClipsInOrderAndTheYearsOfThemAll) {
+    constexpr std::size_t clips = 300;
+    std::vector<std::string> listing;
+    for (std::size_t i = 0; i < clips; ++i) {
+        const char* const date = i == 130   ? "2007-02-02 00;00;00"
+                                 : i == 299 ? "2009-01-01 00;00;00"
+                                            : "2008-03-03 00;00;00";
+        listing.push_back(std::to_string(i * 7 % clips) + ".mov");
+        addClip("Trip/" + listing.back(), date);
+    }
+    files.listings[library() + "/Trip"] = listing;
+
+    const auto event = scannedEvent();
+    std::vector<std::string> shown;
+    for (const auto& clip : event->mediaObjects())
+        shown.push_back(platform::path::lastComponent(clip->ID()));
+    EXPECT_EQ(shown, listing);
+    EXPECT_EQ(attributesText(*event), "2009, 2007-02-02T00:00:00Z to 2009-01-01T00:00:00Z");
 }
 
 TEST_F(EventScanTest, EventIsFiledUnderItsOldestYearWhenTheOldestComeFirst) {
