@@ -77,27 +77,29 @@ void VXMediaGroup::addChildGroups(const VXMediaGroupList& childGroups) {
 }
 
 VXMediaObjectList VXMediaGroup::mediaObjects() const {
+    if (std::optional<VXMediaObjectList> own = ownMediaObjects())
+        return *own;
     std::vector<VXMediaObjectList> lists;
-    addLists(lists);
+    addListsOfChildren(lists);
     return VXMediaObjectList::joining(lists);
 }
 
 std::size_t VXMediaGroup::mediaObjectCount() const {
-    std::vector<VXMediaObjectList> lists;
-    addLists(lists);
+    if (const std::optional<VXMediaObjectList> own = ownMediaObjects())
+        return own->size();
     std::size_t count = 0;
-    for (const VXMediaObjectList& list : lists)
-        count += list.size();
+    for (const VXMediaGroupRef& childGroup : childGroups())
+        count += childGroup->mediaObjectCount();
     return count;
 }
 
-void VXMediaGroup::addLists(std::vector<VXMediaObjectList>& lists) const {
-    if (std::optional<VXMediaObjectList> own = ownMediaObjects()) {
-        lists.push_back(std::move(*own));
-        return;
+void VXMediaGroup::addListsOfChildren(std::vector<VXMediaObjectList>& lists) const {
+    for (const VXMediaGroupRef& childGroup : childGroups()) {
+        if (std::optional<VXMediaObjectList> own = childGroup->ownMediaObjects())
+            lists.push_back(std::move(*own));
+        else
+            childGroup->addListsOfChildren(lists);
     }
-    for (const VXMediaGroupRef& childGroup : childGroups())
-        childGroup->addLists(lists);
 }
 
 void VXMediaGroup::setMediaObjects(VXMediaObjectList mediaObjects) {

@@ -73,8 +73,7 @@ class VXMediaGroup final {
     VXMediaGroupRef copy() const VX_EXCLUDES(mutex_);
 
   private:
-    // Its own, or those of its children.
-    void addLists(std::vector<VXMediaObjectList>& lists) const VX_EXCLUDES(mutex_);
+    void addListsOfChildren(std::vector<VXMediaObjectList>& lists) const VX_EXCLUDES(mutex_);
 
     // Everything a copy shares with its original.
     struct Fields {
