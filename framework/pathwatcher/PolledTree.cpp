@@ -77,7 +77,7 @@ FolderLook lookInto(const std::string& folder, const std::atomic<bool>& stopped)
     if (!listing)
         return {Signature(errno).value(), {}};
     FolderLook look;
-    for (const platform::FolderItem& item : listing->content.items) {
+    for (const platform::FolderItem& item : listing->items) {
         if (stopped)
             break;
         add(look, listing->folder.number(), item.name);

@@ -97,7 +97,7 @@ std::optional<std::vector<std::string>> LinuxFileManager::contentsOfDirectoryAtP
     if (!real)
         return std::nullopt;
     const auto listing = listingOfFolder(*real);
-    return listing ? std::optional(namesOf(listing->content.items)) : std::nullopt;
+    return listing ? std::optional(namesOf(listing->items)) : std::nullopt;
 }
 
 std::unique_ptr<Folder> LinuxFileManager::openFolderAtPath(const std::string& path) const {

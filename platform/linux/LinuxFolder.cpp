@@ -46,27 +46,27 @@ void addItems(std::vector<FolderItem>& items, const char* block, const char* end
     }
 }
 
-// nil, and errno set, when reading fails. Without the C library's stream of a folder, which asks the system
+// False, and errno set, when reading fails. Without the C library's stream of a folder, which asks the system
 // one thing more and takes a block of 32 KiB for any folder.
-std::optional<FolderItems> readItems(int folder) {
-    FolderItems content;
+bool readItems(FolderListing& listing) {
     alignas(dirent64) std::array<char, 32 * 1024> buffer;
     for (;;) {
-        const auto size = uninterrupted([&] { return getdents64(folder, buffer.data(), buffer.size()); });
+        const auto size =
+            uninterrupted([&] { return getdents64(listing.folder.number(), buffer.data(), buffer.size()); });
         if (size == 0 || (size < 0 && errno == ENOENT))  // the latter of a folder that is gone
-            return content;
+            return true;
         if (size < 0)
-            return std::nullopt;
+            return false;
         auto block = std::make_unique_for_overwrite<char[]>(static_cast<std::size_t>(size));
         std::copy_n(buffer.data(), size, block.get());
-        addItems(content.items, block.get(), block.get() + size);
-        content.nameBlocks.push_back(std::move(block));
+        addItems(listing.items, block.get(), block.get() + size);
+        listing.nameBlocks.push_back(std::move(block));
     }
 }
 
 // In any case of letters, because some file systems find the file by any.
 bool holdsHiddenFile(const FolderListing& listing) {
-    return std::ranges::any_of(listing.content.items, [](const FolderItem& item) {
+    return std::ranges::any_of(listing.items, [](const FolderItem& item) {
         return item.name.starts_with('.') && strcasecmp(item.name.data(), ".hidden") == 0;
     });
 }
@@ -79,13 +79,10 @@ dev_t deviceOf(const struct statx& status) {
 
 std::optional<FolderListing> FolderListing::open(int parent, const char* name) {
     constexpr int flags = O_RDONLY | O_DIRECTORY | O_CLOEXEC | O_NONBLOCK;
-    FileDescriptor folder(uninterrupted([&] { return openat(parent, name, flags); }));
-    if (!folder)
+    FolderListing listing{FileDescriptor(uninterrupted([&] { return openat(parent, name, flags); })), {}, {}};
+    if (!listing.folder || !readItems(listing))
         return std::nullopt;
-    auto content = readItems(folder.number());
-    if (!content)
-        return std::nullopt;
-    return FolderListing{std::move(folder), std::move(*content)};
+    return listing;
 }
 
 std::optional<FolderListing> FolderListing::openOrLog(int parent, const char* name, const std::string& path,

@@ -22,14 +22,7 @@
 
 namespace platform {
 
-// What lies in a folder, in the order of the file system.
-struct FolderItems {
-    std::vector<FolderItem> items;
-    std::vector<std::unique_ptr<const char[]>>
-        nameBlocks;  // as the kernel filled them; hold the items' names
-};
-
-// An open folder with what lies in it.
+// An open folder with what lies in it, in the order of the file system.
 struct FolderListing {
     // nil, and errno set, when the folder can't be listed.
     static std::optional<FolderListing> open(const std::string& path) { return open(AT_FDCWD, path.c_str()); }
@@ -40,7 +33,9 @@ struct FolderListing {
                                                   SystemLog& log);
 
     FileDescriptor folder;
-    FolderItems content;
+    std::vector<FolderItem> items;
+    // As the kernel filled them. The items' names lie in these.
+    std::vector<std::unique_ptr<const char[]>> nameBlocks;
 };
 
 class LinuxFolder final : public Folder {
@@ -57,7 +52,7 @@ class LinuxFolder final : public Folder {
     // that are opened from it.
     LinuxFolder(FolderListing listing, std::string path, const Services& services);
 
-    const std::vector<FolderItem>& items() const override { return listing_.content.items; }
+    const std::vector<FolderItem>& items() const override { return listing_.items; }
     std::optional<std::uint32_t> flagsOf(const FolderItem& item) const override;
     bool isPlainFile(const FolderItem& item) const override;
     std::optional<FileAttributes> attributesOf(const FolderItem& item) const override;
