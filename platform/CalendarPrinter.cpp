@@ -11,10 +11,6 @@ namespace platform {
 
 namespace {
 
-void append(fmt::memory_buffer& text, std::string_view more) {
-    text.append(more);
-}
-
 // Of a number below 100.
 void appendTwoDigits(fmt::memory_buffer& text, int number) {
     text.push_back(static_cast<char>('0' + number / 10));
@@ -28,7 +24,7 @@ void appendYear(fmt::memory_buffer& text, int year) {
         text.push_back('-');
     const int size = std::abs(year);
     if (size > 9999)
-        return append(text, fmt::format_int(size).c_str());
+        return text.append(std::string_view(fmt::format_int(size).c_str()));
     appendTwoDigits(text, size / 100);
     appendTwoDigits(text, size % 100);
 }
@@ -53,7 +49,7 @@ std::string CalendarPrinter::print(const CalendarFormat& format) const {
         if (piece.isConversion())
             appendConversion(text, piece.conversion);
         else
-            append(text, piece.literal);
+            text.append(piece.literal);
     }
     return fmt::to_string(text);
 }
@@ -90,9 +86,9 @@ void CalendarPrinter::appendConversion(fmt::memory_buffer& text, char letter) co
             fmt::format_to(end, FMT_COMPILE("{:03}"), milliseconds_);
             return;
         case 'z':
-            return append(text, zoneOffset());
+            return text.append(zoneOffset());
         case 'Z':
-            return append(text, zoneName());
+            return text.append(zoneName());
         default:
             appendInLocale(text, letter);
     }
@@ -102,21 +98,21 @@ void CalendarPrinter::appendInLocale(fmt::memory_buffer& text, char letter) cons
     const auto names = CalendarNames::ofLocale(locale_);
     switch (letter) {
         case 'a':
-            return append(text, names->name(NameKind::shortWeekday, dayOfWeek(time_)));
+            return text.append(names->name(NameKind::shortWeekday, dayOfWeek(time_)));
         case 'A':
-            return append(text, names->name(NameKind::weekday, dayOfWeek(time_)));
+            return text.append(names->name(NameKind::weekday, dayOfWeek(time_)));
         case 'b':
-            return append(text, names->name(NameKind::shortMonth, time_.month - 1));
+            return text.append(names->name(NameKind::shortMonth, time_.month - 1));
         case 'B':
-            return append(text, names->name(NameKind::month, time_.month - 1));
+            return text.append(names->name(NameKind::month, time_.month - 1));
         case 'p':
-            return append(text, names->name(NameKind::halfOfDay, time_.hour / 12));
+            return text.append(names->name(NameKind::halfOfDay, time_.hour / 12));
         case 'c':
-            return append(text, names->print(LocaleForm::dateAndTime, time_));
+            return text.append(names->print(LocaleForm::dateAndTime, time_));
         case 'x':
-            return append(text, names->print(LocaleForm::date, time_));
+            return text.append(names->print(LocaleForm::date, time_));
         default:  // 'X'
-            return append(text, names->print(LocaleForm::time, time_));
+            return text.append(names->print(LocaleForm::time, time_));
     }
 }
 
