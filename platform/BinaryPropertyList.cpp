@@ -7,6 +7,7 @@
 #include <bit>
 #include <cmath>
 
+#include "platform/BigEndian.h"
 #include "platform/Text.h"
 
 namespace platform {
@@ -23,13 +24,6 @@ unsigned highHalf(std::uint64_t marker) {
 
 unsigned lowHalf(std::uint64_t marker) {
     return static_cast<unsigned>(marker) & 0xF;
-}
-
-std::uint64_t bigEndian(std::span<const std::byte> digits) {
-    std::uint64_t number = 0;
-    for (const std::byte digit : digits)
-        number = number << 8 | std::to_integer<std::uint64_t>(digit);
-    return number;
 }
 
 std::string_view characters(std::span<const std::byte> bytes) {

@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <vector>
 
+#include "platform/BigEndian.h"
 #include "platform/Path.h"
 
 namespace platform {
@@ -43,10 +44,7 @@ class Head {
     std::uint32_t number(std::size_t offset, std::size_t width) const {
         if (offset + width > bytes_.size())
             return 0;
-        std::uint32_t result = 0;
-        for (std::size_t i = 0; i < width; ++i)
-            result = result << 8 | std::to_integer<std::uint32_t>(bytes_[offset + i]);
-        return result;
+        return static_cast<std::uint32_t>(bigEndian(std::span(bytes_).subspan(offset, width)));
     }
     std::uint32_t word(std::size_t offset) const { return number(offset, 4); }
 

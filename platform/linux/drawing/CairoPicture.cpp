@@ -7,6 +7,7 @@
 #include <new>
 #include <utility>
 
+#include "platform/BigEndian.h"
 #include "platform/ThreadSafety.h"
 #include "platform/linux/drawing/CairoCanvas.h"
 #include "platform/linux/drawing/VectorCheck.h"
@@ -65,18 +66,11 @@ bool isPNG(Bytes data) {
     return data.size() >= pngSignature.size() && std::memcmp(data.data(), pngSignature.data(), 8) == 0;
 }
 
-std::uint32_t bigEndian(Bytes data, std::size_t offset) {
-    std::uint32_t number = 0;
-    for (std::byte byte : data.subspan(offset, 4))
-        number = number << 8 | std::to_integer<std::uint32_t>(byte);
-    return number;
-}
-
 // Whether the header declares a size that may be decoded. It stands at a fixed place in every PNG.
 bool declaresAllowedSize(Bytes png) {
     constexpr std::size_t widthOffset = 16, heightOffset = 20, headerEnd = 24;
     return png.size() >= headerEnd &&
-           isDrawableSize(bigEndian(png, widthOffset), bigEndian(png, heightOffset));
+           isDrawableSize(bigEndian(png.subspan(widthOffset, 4)), bigEndian(png.subspan(heightOffset, 4)));
 }
 
 cairo_status_t takeBytes(void* closure, unsigned char* buffer, unsigned int count) {
