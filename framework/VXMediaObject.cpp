@@ -184,10 +184,8 @@ platform::Dictionary VXMediaObject::attributes() const {
 const platform::Value* VXMediaObject::Attributes::find(std::string_view key) const {
     if (first_ && first_->key == key)
         return &first_->value;
-    if (!others_)
-        return nullptr;
-    const auto found = std::ranges::find(*others_, key, &Attribute::key);
-    return found != others_->end() ? &found->value : nullptr;
+    const auto found = std::ranges::find(others_, key, &Attribute::key);
+    return found != others_.end() ? &found->value : nullptr;
 }
 
 void VXMediaObject::Attributes::set(Attribute attribute) {
@@ -195,20 +193,16 @@ void VXMediaObject::Attributes::set(Attribute attribute) {
         first_ = std::move(attribute);
         return;
     }
-    if (!others_)
-        others_ = std::make_unique<std::vector<Attribute>>();
-    std::erase_if(*others_, [&](const Attribute& other) { return other.key == attribute.key; });
-    others_->push_back(std::move(attribute));
+    std::erase_if(others_, [&](const Attribute& other) { return other.key == attribute.key; });
+    others_.push_back(std::move(attribute));
 }
 
 platform::Dictionary VXMediaObject::Attributes::dictionary() const {
     platform::Dictionary dictionary;
     if (first_)
         dictionary.emplace(first_->key, first_->value);
-    if (others_) {
-        for (const auto& [key, value] : *others_)
-            dictionary.emplace(key, value);
-    }
+    for (const auto& [key, value] : others_)
+        dictionary.emplace(key, value);
     return dictionary;
 }
 

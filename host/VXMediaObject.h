@@ -92,7 +92,7 @@ class VXMediaObject final {
 
       private:
         std::optional<Attribute> first_;
-        std::unique_ptr<std::vector<Attribute>> others_;  // nil for none
+        std::vector<Attribute> others_;
     };
 
     std::optional<platform::Value> metadataAttributeForKey(std::string_view key) const;
