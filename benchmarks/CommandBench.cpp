@@ -70,6 +70,11 @@ Run run(std::vector<std::string> words, const std::string& folder) {
     return {time.count(), textOf(output)};
 }
 
+void keepFaster(Run& fastest, Run next) {
+    if (next.seconds < fastest.seconds)
+        fastest = std::move(next);
+}
+
 // Of several runs of each program the one that was disturbed least. They take turns, so that what else the
 // machine does disturbs both alike.
 struct FastestRuns {
@@ -81,10 +86,8 @@ FastestRuns fastestRuns(const std::vector<std::string>& floor, const std::vector
                         const std::string& folder, int times) {
     FastestRuns fastest{run(floor, folder), run(tree, folder)};
     for (int i = 1; i < times; ++i) {
-        if (Run next = run(floor, folder); next.seconds < fastest.floor.seconds)
-            fastest.floor = std::move(next);
-        if (Run next = run(tree, folder); next.seconds < fastest.tree.seconds)
-            fastest.tree = std::move(next);
+        keepFaster(fastest.floor, run(floor, folder));
+        keepFaster(fastest.tree, run(tree, folder));
     }
     return fastest;
 }
@@ -98,7 +101,7 @@ void emptyHome(benchmark::State& state) {
     const std::string home = folder.path() + "/home";
     fs::create_directory(home);
     for ([[maybe_unused]] auto iteration : state) {
-        const auto& [floor, tree] = fastestRuns({"/bin/true"}, treeOf(home), folder.path(), 40);
+        const auto [floor, tree] = fastestRuns({"/bin/true"}, treeOf(home), folder.path(), 40);
         if (tree.output.find("Reelix") == std::string::npos)
             state.SkipWithError("there is no tree");
         state.SetIterationTime(tree.seconds);
@@ -129,7 +132,7 @@ void secondTree(benchmark::State& state) {
     makeProjects(bareHome, {});
     const Run first = run(treeOf(home), folder.path());
     for ([[maybe_unused]] auto iteration : state) {
-        const auto& [floor, second] = fastestRuns(treeOf(bareHome), treeOf(home), folder.path(), 15);
+        const auto [floor, second] = fastestRuns(treeOf(bareHome), treeOf(home), folder.path(), 15);
         if (second.output != first.output || second.output == floor.output)
             state.SkipWithError("the second tree is another one");
         state.SetIterationTime(second.seconds);
