@@ -67,7 +67,8 @@ LocalZone LocalZone::current() {
 }
 
 int LocalZone::secondsFromGMT(std::int64_t seconds) const {
-    return zonedTime(seconds).secondsFromGMT;
+    const auto fields = fieldsAt(seconds);
+    return fields ? static_cast<int>(fields->tm_gmtoff) : 0;
 }
 
 std::string LocalZone::abbreviation(std::int64_t seconds) const {
@@ -111,8 +112,7 @@ std::optional<std::tm> LocalZone::fieldsAt(std::int64_t seconds) const {
 }
 
 ZonedTime LocalZone::zonedTime(std::int64_t seconds) const {
-    const auto fields = fieldsAt(seconds);
-    return {seconds, fields ? static_cast<int>(fields->tm_gmtoff) : 0};
+    return {seconds, secondsFromGMT(seconds)};
 }
 
 }  // namespace platform

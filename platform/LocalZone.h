@@ -50,8 +50,8 @@ class LocalZone {
     ZonedTime zonedTime(std::int64_t seconds) const;
 
     std::optional<std::string> TZ_;
-    std::time_t second_ =
-        -1;  // without TZ, when it was made: the machine's setting is looked at once a second
+    // Without TZ, when the zone was made: the machine's setting is looked at once a second.
+    std::time_t second_ = -1;
 };
 
 }  // namespace platform
