@@ -1,5 +1,6 @@
 #include "platform/LocalZone.h"
 
+#include <array>
 #include <atomic>
 #include <cstdlib>
 
@@ -13,10 +14,14 @@ constexpr auto secondsTo1970 = static_cast<std::int64_t>(Date::secondsFrom1970To
 
 constexpr std::int64_t hour = 3600;
 constexpr std::int64_t beyondAnyOffset = 26 * hour;  // farther than any zone is from GMT
-constexpr std::int64_t nearby = 10 * hour;
-// In twice that time no zone changes more than once: in the tz database no two changes are less than 95 hours
-// apart (Freetown in 1939).
-constexpr std::int64_t aroundAnyChange = beyondAnyOffset + nearby;
+// With what is beyond any offset before and after it, such a stretch of time has one change at most: in the
+// tz database no two changes are less than 95 hours apart (Freetown in 1939).
+constexpr std::int64_t stretch = 20 * hour;
+
+std::int64_t beginOfStretch(std::int64_t seconds) {
+    const std::int64_t sinceBegin = seconds % stretch;
+    return seconds - sinceBegin - (sinceBegin < 0 ? stretch : 0);
+}
 
 std::optional<std::string> environmentTZ() {
     const char* const TZ = std::getenv("TZ");
@@ -29,30 +34,36 @@ bool clockShows(const ZonedTime& time, std::int64_t civilSeconds) {
 
 }  // namespace
 
-// A time without changes of the clock around the last date that a thread asked for. Most dates are near the
-// one before them: the clips of an event are of one day.
-class LocalZone::QuietTime {
+// The stretches without a change of the clock that a thread has come to know. Most dates are near others that
+// were asked for before: the clips of an event are of some days, and are listed in any order.
+class LocalZone::QuietStretches {
   public:
-    // nil where the clock may change.
-    std::optional<ZonedTime> timeOfClock(std::int64_t civilSeconds, const LocalZone& zone) const {
-        const bool isNear = firstCivil_ <= civilSeconds && civilSeconds <= lastCivil_;
-        if (!isNear || zone_ != zone)
-            return std::nullopt;
-        return ZonedTime{civilSeconds - secondsFromGMT_, secondsFromGMT_};
+    // How far the zone is from GMT; nil where that isn't known or changes.
+    std::optional<int> secondsFromGMT(std::int64_t begin, const LocalZone& zone) const {
+        const Stretch& kept = kept_[placeOf(begin)];
+        return kept.begin == begin && zone_ == zone ? std::optional(kept.secondsFromGMT) : std::nullopt;
     }
 
-    void set(std::int64_t civilSeconds, const LocalZone& zone, int secondsFromGMT) {
-        firstCivil_ = civilSeconds - nearby;
-        lastCivil_ = civilSeconds + nearby;
+    void keep(std::int64_t begin, const LocalZone& zone, int secondsFromGMT) {
+        if (zone_ != zone)
+            kept_.fill({});
         zone_ = zone;
-        secondsFromGMT_ = secondsFromGMT;
+        kept_[placeOf(begin)] = {begin, secondsFromGMT};
     }
 
   private:
-    std::int64_t firstCivil_ = 0;
-    std::int64_t lastCivil_ = -1;
+    struct Stretch {
+        std::int64_t begin = 1;  // where none begins
+        int secondsFromGMT = 0;
+    };
+    static constexpr std::size_t count = 512;  // more than a year
+
+    static std::size_t placeOf(std::int64_t begin) {
+        return static_cast<std::size_t>(begin / stretch) % count;
+    }
+
+    std::array<Stretch, count> kept_;
     LocalZone zone_;
-    int secondsFromGMT_ = 0;
 };
 
 LocalZone LocalZone::current() {
@@ -80,14 +91,15 @@ std::string LocalZone::abbreviation(std::int64_t seconds) const {
 
 // What holds before and after holds in between, too.
 LocalTimes LocalZone::timesOfClock(std::int64_t civilSeconds) const {
-    thread_local QuietTime quiet;
-    if (const auto time = quiet.timeOfClock(civilSeconds, *this))
-        return {*time, std::nullopt};
-    const int offsetBefore = secondsFromGMT(civilSeconds - aroundAnyChange);
-    const int offsetAfter = secondsFromGMT(civilSeconds + aroundAnyChange);
+    thread_local QuietStretches quiet;
+    const std::int64_t begin = beginOfStretch(civilSeconds);
+    if (const auto offset = quiet.secondsFromGMT(begin, *this))
+        return {{civilSeconds - *offset, *offset}, std::nullopt};
+    const int offsetBefore = secondsFromGMT(begin - beyondAnyOffset);
+    const int offsetAfter = secondsFromGMT(begin + stretch + beyondAnyOffset);
     if (offsetBefore == offsetAfter) {
         if (TZ_ == environmentTZ())  // else the offset need not be this zone's
-            quiet.set(civilSeconds, *this, offsetBefore);
+            quiet.keep(begin, *this, offsetBefore);
         return {{civilSeconds - offsetBefore, offsetBefore}, std::nullopt};
     }
     const ZonedTime byOffsetBefore = zonedTime(civilSeconds - offsetBefore);

@@ -40,7 +40,7 @@ class LocalZone {
     LocalTimes timesOfClock(std::int64_t civilSeconds) const;
 
   private:
-    class QuietTime;
+    class QuietStretches;
 
     LocalZone() = default;
     bool operator==(const LocalZone&) const = default;

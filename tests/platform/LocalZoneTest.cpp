@@ -52,6 +52,24 @@ TEST_F(LocalZoneTest, ZonesThatAreKeptSpoilNoneThatAreMadeLater) {
     }
 }
 
+// Whether a thread has asked for it before or not, and for what else.
+TEST_F(LocalZoneTest, DatesInAnyOrderAreThoseOfTheirOwnTime) {
+    const ScopedEnvironment environment("TZ", "CET-1CEST,M3.5.0,M10.5.0/3");
+    const LocalZone zone = LocalZone::current();
+    constexpr std::int64_t hours =
+        30'011;  // more than three years; a prime, so that each step comes to all of them
+    for (const std::int64_t step : {1, -1, 9973}) {
+        for (std::int64_t i = 0; i < hours; ++i) {
+            const std::int64_t clock = (step * i % hours - hours / 2) * hour;  // before 2001 and after
+            const ZonedTime time = zone.timesOfClock(clock).first;
+            const bool isPutForward = zone.secondsFromGMT(time.seconds - hour) < time.secondsFromGMT;
+            const std::int64_t shown = time.seconds + time.secondsFromGMT;
+            ASSERT_EQ(zone.secondsFromGMT(time.seconds), time.secondsFromGMT) << clock;
+            ASSERT_TRUE(shown == clock || (isPutForward && shown == clock + hour)) << clock;
+        }
+    }
+}
+
 TEST_F(LocalZoneTest, AClockThatIsPutBackShowsATimeTwice) {
     const ScopedEnvironment environment("TZ", "CET-1CEST,M3.5.0,M10.5.0/3");
     constexpr std::int64_t october25In2009 = 278'130'600;  // 02:30 by the clock
