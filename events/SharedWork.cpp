@@ -36,7 +36,7 @@ void SharedWork::abandon() {
 
 void SharedWork::doPieces() {
     try {
-        while (!isOver() && doPiece_()) {
+        while (!isEnded_ && doPiece_()) {
         }
     } catch (...) {
         fail(std::current_exception());
@@ -45,13 +45,9 @@ void SharedWork::doPieces() {
 
 void SharedWork::fail(std::exception_ptr failure) {
     Locked lock(mutex_);
+    isEnded_ = true;
     if (!failure_)
         failure_ = std::move(failure);
-}
-
-bool SharedWork::isOver() const {
-    Locked lock(mutex_);
-    return isEnded_ || failure_;
 }
 
 }  // namespace reelix

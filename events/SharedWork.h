@@ -4,6 +4,7 @@
 // never: a late one finds nothing to do.
 #pragma once
 
+#include <atomic>
 #include <condition_variable>
 #include <exception>
 #include <functional>
@@ -29,13 +30,13 @@ class SharedWork {
   private:
     void doPieces() VX_EXCLUDES(mutex_);
     void fail(std::exception_ptr failure) VX_EXCLUDES(mutex_);
-    bool isOver() const VX_EXCLUDES(mutex_);
 
     const std::function<bool()> doPiece_;
-    mutable platform::Mutex mutex_;
+    platform::Mutex mutex_;
     std::condition_variable_any helperLeft_;
     int helpers_ VX_GUARDED_BY(mutex_) = 0;
-    bool isEnded_ VX_GUARDED_BY(mutex_) = false;
+    // Changed under the mutex, and read without it before each piece.
+    std::atomic<bool> isEnded_ = false;
     std::exception_ptr failure_ VX_GUARDED_BY(mutex_);
 };
 
