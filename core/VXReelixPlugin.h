@@ -235,7 +235,6 @@ class VXReelixPlugin : public vexo::VXMediaManager,
   private:
     void writeProjects(const Groups& projects, platform::Pasteboard& toPasteboard);
 
-    struct ScannedEvent;
     struct EventYears;
     class EventLibraryScan;
     class EventScansAhead;
@@ -258,8 +257,6 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     std::shared_ptr<EventLibraryScan> scanOfEventLibrary(const std::string& folder) VX_REQUIRES(_monitor);
     Group eventGroupForFolder(const std::string& folder, const std::string& libraryFolder,
                               platform::DateRef modificationDate);
-    // Gives the event its clips; false when it has none.
-    bool finishEvent(ScannedEvent scanned);
     void writeEventAttributes(const Group& event, const EventYears& years);
 
     void scheduleProjectsReload();

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <exception>
+#include <iterator>
 
 #include "core/ProcessCaches.h"
 #include "host/VXMediaBrowserUtilities.h"
@@ -95,141 +96,162 @@ bool VXReelixPlugin::EventLibraryScan::hasEntries() const {
     return hasEntries_;
 }
 
-std::vector<VXReelixPlugin::ScannedEvent> VXReelixPlugin::EventLibraryScan::takeEvents() {
+VXReelixPlugin::Groups VXReelixPlugin::EventLibraryScan::events() const {
     Locked lock(mutex_);
-    std::erase_if(events_, [](const ScannedEvent& scanned) { return !scanned.event; });
-    return std::move(events_);
+    Groups events;
+    for (const ScannedFolder& folder : folders_) {
+        if (folder.event)
+            events.push_back(folder.event);
+    }
+    return events;
 }
 
 bool VXReelixPlugin::EventLibraryScan::scanNextClips() {
     const std::optional<Piece> piece = takePiece();
     if (!piece)
         return false;
-    EventYears years;
-    for (std::size_t i = piece->begin; i < piece->end; ++i)
-        piece->event->clips[i] = clipForFile(*piece->folder, *piece->event, piece->folder->items()[i], years);
-    piece->event->years[piece->begin / clipsAPiece] = std::move(years);
+    Objects& clips = piece->found->clips;
+    clips.reserve(piece->items.size());
+    for (const platform::FolderItem& item : piece->items) {
+        if (Object clip = clipForFile(item, *piece))
+            clips.push_back(std::move(clip));
+    }
+    finishPiece(*piece->folder);
     return true;
 }
 
-// Folders are opened without the lock, so that small ones, where that is most of the work, are gone through
-// by each thread on its own. What is open comes before what is not: few folders are open at a time.
+// Folders are opened and read without the lock, so that small ones, where that is most of the work, are gone
+// through by each thread on its own.
 std::optional<VXReelixPlugin::EventLibraryScan::Piece> VXReelixPlugin::EventLibraryScan::takePiece() {
-    for (;;) {
-        ScannedEvent* event = nullptr;
-        const platform::Folder* library = nullptr;
-        {
-            Locked lock(mutex_);
-            if (!isOpened_)
-                openLibrary();
-            waitForWork();
-            if (!openFolders_.empty())
-                return nextPiece();
-            event = nextFolderToOpen();
-            library = library_.get();
-        }
-        if (!event)
+    ScannedFolder* folder = nullptr;
+    const platform::Folder* library = nullptr;
+    {
+        Locked lock(mutex_);
+        if (!isOpened_)
+            openLibrary();
+        while (!(folder = takeFolder()) && foldersBeingRead_ > 0)
+            folderRead_.wait(mutex_);
+        if (!folder)
             return std::nullopt;
-        openEvent(*library, *event);
+        ++foldersBeingRead_;
+        library = library_.get();
     }
+    return readPiece(library, *folder);
 }
 
 void VXReelixPlugin::EventLibraryScan::openLibrary() {
     isOpened_ = true;
     library_ = platform::services().fileManager.openFolderAtPath(libraryFolder_);
-    if (!library_)
-        return;
-    hasEntries_ = !library_->items().empty();
-    for (const platform::FolderItem& item : library_->items()) {
+    const auto items = library_ ? library_->allItems() : std::nullopt;
+    hasEntries_ = items && !items->empty();
+    for (const platform::FolderItem& item : items.value_or(std::vector<platform::FolderItem>{})) {
         if (!isHiddenName(item.name) && hasFlags(library_->flagsOf(item), platform::itemIsContainer))
-            events_.push_back({path::appending(libraryFolder_, item.name), &item, nullptr, nullptr, {}, {}});
+            folders_.emplace_back(path::appending(libraryFolder_, item.name), item);
     }
     closeLibraryWhenDone();
 }
 
 // An open folder keeps its volume from being unmounted.
 void VXReelixPlugin::EventLibraryScan::closeLibraryWhenDone() {
-    if (nextEvent_ == events_.size() && foldersBeingOpened_ == 0)
+    if (nextFolder_ == folders_.size() && foldersBeingRead_ == 0)
         library_ = nullptr;
 }
 
-void VXReelixPlugin::EventLibraryScan::waitForWork() {
-    while (openFolders_.empty() && nextEvent_ == events_.size() && foldersBeingOpened_ > 0)
-        folderOpened_.wait(mutex_);
+// What is open comes before what is not: few folders are open at a time.
+VXReelixPlugin::EventLibraryScan::ScannedFolder* VXReelixPlugin::EventLibraryScan::takeFolder() {
+    if (!foldersToReadOn_.empty()) {
+        ScannedFolder* const folder = foldersToReadOn_.front();
+        foldersToReadOn_.pop_front();
+        return folder;
+    }
+    return nextFolder_ < folders_.size() ? &folders_[nextFolder_++] : nullptr;
 }
 
-VXReelixPlugin::EventLibraryScan::Piece VXReelixPlugin::EventLibraryScan::nextPiece() {
-    OpenFolder& open = openFolders_.front();
-    const std::size_t itemCount = open.folder->items().size();
-    Piece piece{open.folder, open.event, open.nextItem, std::min(open.nextItem + clipsAPiece, itemCount)};
-    open.nextItem = piece.end;
-    if (piece.end == itemCount)
-        openFolders_.pop_front();
-    return piece;
-}
-
-VXReelixPlugin::ScannedEvent* VXReelixPlugin::EventLibraryScan::nextFolderToOpen() {
-    if (nextEvent_ == events_.size())
-        return nullptr;
-    ++foldersBeingOpened_;
-    return &events_[nextEvent_++];
-}
-
-// Who waits for the folder hears that it's done, also when opening it raises.
-void VXReelixPlugin::EventLibraryScan::openEvent(const platform::Folder& library, ScannedEvent& event) {
-    FolderRef folder;
+// Who waits for the folder hears that it was read, also when that raises.
+VXReelixPlugin::EventLibraryScan::Piece VXReelixPlugin::EventLibraryScan::readPiece(
+    const platform::Folder* library, ScannedFolder& folder) {
+    std::optional<std::vector<platform::FolderItem>> items;
+    std::list<ScannedFiles> found;
     std::exception_ptr failure;
     try {
-        folder = folderOfEvent(library, event);
+        items = nextItems(library, folder);
+        found.push_back({folder.path, countedApart(iconCache().smallApplicationIcon.get()), {}, {}});
     } catch (...) {
         failure = std::current_exception();
     }
     Locked lock(mutex_);
-    --foldersBeingOpened_;
+    --foldersBeingRead_;
     closeLibraryWhenDone();
-    folderOpened_.notify_all();
+    folderRead_.notify_all();
     if (failure)
         std::rethrow_exception(failure);
-    if (folder)
-        openFolders_.push_back({std::move(folder), &event});
+    folder.isEvent = items && (folder.isEvent || !items->empty());
+    if (items && folder.open->mayHaveMoreItems()) {
+        ++folder.unfinishedPieces;
+        foldersToReadOn_.push_back(&folder);
+    }
+    folder.files.splice(folder.files.end(), found);
+    return {&folder, std::move(items).value_or(std::vector<platform::FolderItem>{}), &folder.files.back()};
 }
 
-// An empty folder is no event.
-VXReelixPlugin::EventLibraryScan::FolderRef VXReelixPlugin::EventLibraryScan::folderOfEvent(
-    const platform::Folder& library, ScannedEvent& event) const {
-    FolderRef folder = library.openFolder(*event.item);
-    if (!folder || folder->items().empty())
-        return nullptr;
-    event.clips.resize(folder->items().size());
-    event.years.resize((event.clips.size() - 1) / clipsAPiece + 1);
-    event.clipIcon = countedApart(iconCache().smallApplicationIcon.get());
-    const auto attributes = folder->attributes();
-    event.event = plugin_.eventGroupForFolder(*event.folder.string(), libraryFolder_,
-                                              attributes ? attributes->modificationDate : nullptr);
-    return folder;
+std::optional<std::vector<platform::FolderItem>> VXReelixPlugin::EventLibraryScan::nextItems(
+    const platform::Folder* library, ScannedFolder& folder) {
+    if (!folder.open)
+        folder.open = library->openFolder(folder.item);
+    return folder.open ? folder.open->nextItems() : std::nullopt;
+}
+
+void VXReelixPlugin::EventLibraryScan::finishPiece(ScannedFolder& folder) const {
+    if (--folder.unfinishedPieces > 0)
+        return;
+    if (folder.isEvent)
+        makeEvent(folder);
+    folder.files.clear();
+    folder.open = nullptr;
+}
+
+void VXReelixPlugin::EventLibraryScan::makeEvent(ScannedFolder& folder) const {
+    const auto attributes = folder.open->attributes();
+    folder.event = plugin_.eventGroupForFolder(folder.path, libraryFolder_,
+                                               attributes ? attributes->modificationDate : nullptr);
+    Objects clips;
+    EventYears years;
+    for (ScannedFiles& files : folder.files) {
+        years.add(files.years);
+        if (clips.empty())
+            clips = std::move(files.clips);
+        else
+            std::ranges::move(files.clips, std::back_inserter(clips));
+    }
+    if (clips.empty())
+        return;
+    clips.shrink_to_fit();
+    folder.event->setMediaObjects(vexo::VXMediaObjectList(std::move(clips)));
+    if (!years.lowestDate)
+        years.lowestDate = years.highestDate;
+    plugin_.writeEventAttributes(folder.event, years);
 }
 
 // A file that is a movie only by its metadata gets its item before its date is known, and keeps its whole
 // name for that reason. That is deliberate.
-VXReelixPlugin::Object VXReelixPlugin::EventLibraryScan::clipForFile(const platform::Folder& folder,
-                                                                     const ScannedEvent& event,
-                                                                     const platform::FolderItem& item,
-                                                                     EventYears& years) const {
+VXReelixPlugin::Object VXReelixPlugin::EventLibraryScan::clipForFile(const platform::FolderItem& item,
+                                                                     const Piece& piece) const {
+    const platform::Folder& folder = *piece.folder->open;
     if (isHiddenName(item.name) || !hasFlags(folder.flagsOf(item), 0))
         return nullptr;
-    std::string clip = path::appending(*event.folder.string(), item.name);
+    std::string clip = path::appending(piece.folder->path, item.name);
     Object mediaObject;
     if (!isSupportedMovie(clip, folder.isPlainFile(item))) {
         if (!isMovieByMetadata(*vexo::VXMediaObject::spotlightProperties(clip)))
             return nullptr;
-        mediaObject = newClip(std::string(item.name), std::move(clip), event);
+        mediaObject = newClip(std::string(item.name), std::move(clip), *piece.found);
     }
     const auto dates = datesOfClip(folder, item);
     if (!dates)
         return nullptr;
     if (!mediaObject)
-        mediaObject = newClip(clipName(dates->own, item.name), std::move(clip), event);
-    years.add(dates->year, dates->own ? dates->own : dates->creation);
+        mediaObject = newClip(clipName(dates->own, item.name), std::move(clip), *piece.found);
+    piece.found->years.add(dates->year, dates->own ? dates->own : dates->creation);
     return mediaObject;
 }
 
@@ -253,14 +275,14 @@ std::optional<VXReelixPlugin::EventLibraryScan::ClipDates> VXReelixPlugin::Event
 }
 
 VXReelixPlugin::Object VXReelixPlugin::EventLibraryScan::newClip(std::string name, std::string clip,
-                                                                 const ScannedEvent& event) const {
+                                                                 const ScannedFiles& files) const {
     const Object mediaObject =
         plugin_.newMediaObjectWithType(vexo::VXMediaTypeMovie, std::move(name), std::move(clip));
     mediaObject->setMediaSourceType(vexo::VXMediaSourceTypeFile);
     mediaObject->setPath(mediaObject->ID());
     mediaObject->setSpotlightPropertiesOfFile(mediaObject->ID());
-    mediaObject->setAttribute(event.folder, vexo::VXReelixProjectPathKey);
-    mediaObject->setIcon(event.clipIcon);
+    mediaObject->setAttribute(files.folder, vexo::VXReelixProjectPathKey);
+    mediaObject->setIcon(files.clipIcon);
     return mediaObject;
 }
 

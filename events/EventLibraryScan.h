@@ -1,10 +1,15 @@
-// Goes through the event folders of one library, some clips at a time, on any number of threads. The events
+// Goes through the event folders of one library, some files at a time, on any number of threads. The events
 // are those in listing order, and so are their clips.
+//
+// A thread reads the next files of a folder and makes their clips; meanwhile another may read on in the same
+// one.
 #pragma once
 
+#include <atomic>
 #include <condition_variable>
 #include <cstddef>
 #include <deque>
+#include <list>
 #include <memory>
 #include <optional>
 #include <string>
@@ -37,16 +42,6 @@ struct VXReelixPlugin::EventYears {
     void add(int year, const platform::DateRef& date);
 };
 
-// A folder that may be an event, and what was found in it.
-struct VXReelixPlugin::ScannedEvent {
-    platform::Value folder;            // its path, one text for all its clips
-    const platform::FolderItem* item;  // of the library's folder, as long as that is open
-    Group event;                       // nil for a folder that is none
-    platform::ImageRef clipIcon;       // asked for once for all its clips
-    Objects clips;                     // one for each item of the folder, nil for what is no clip
-    std::vector<EventYears> years;     // of each piece of the clips
-};
-
 class VXReelixPlugin::EventLibraryScan {
   public:
     // Whoever works on it keeps the plug-in alive.
@@ -60,26 +55,38 @@ class VXReelixPlugin::EventLibraryScan {
 
     // Whether the library's folder can be listed and holds anything.
     bool hasEntries() const VX_EXCLUDES(mutex_);
-    // For the caller to keep.
-    std::vector<ScannedEvent> takeEvents() VX_EXCLUDES(mutex_);
+    // Those of its folders that hold anything, be any of it a clip or not.
+    Groups events() const VX_EXCLUDES(mutex_);
 
   private:
-    static constexpr std::size_t clipsAPiece = 128;
-
-    using FolderRef = std::shared_ptr<const platform::Folder>;
-
-    struct OpenFolder {
-        FolderRef folder;
-        ScannedEvent* event;
-        std::size_t nextItem = 0;  // that nobody has taken
+    // What was found in files that were read together. Their clips have a text and an icon of their own in
+    // common, because threads that count the owners of one object wait for each other at every clip.
+    struct ScannedFiles {
+        platform::Value folder;  // its path
+        platform::ImageRef clipIcon;
+        Objects clips;
+        EventYears years;
     };
 
-    // Items of one event folder, which stays open as long as some of them are being looked at.
+    // A folder that may be an event, and what was found in it.
+    struct ScannedFolder {
+        ScannedFolder(std::string folderPath, const platform::FolderItem& itemOfLibrary)
+            : path(std::move(folderPath)), item(itemOfLibrary) {}
+
+        const std::string path;
+        const platform::FolderItem item;         // of the library's folder, as long as that is open
+        std::unique_ptr<platform::Folder> open;  // nil but while it's being gone through
+        std::list<ScannedFiles> files;           // in listing order; each stays where it is
+        bool isEvent = false;                    // it holds anything, and could be read as far as it was
+        std::atomic<int> unfinishedPieces = 1;   // what is being scanned, and what is yet to be read
+        Group event;                             // nil until the last piece is finished, and where it's none
+    };
+
+    // Files of one folder, for the thread that has read them.
     struct Piece {
-        FolderRef folder;
-        ScannedEvent* event;
-        std::size_t begin;
-        std::size_t end;
+        ScannedFolder* folder;
+        std::vector<platform::FolderItem> items;
+        ScannedFiles* found;
     };
 
     struct ClipDates {
@@ -93,21 +100,21 @@ class VXReelixPlugin::EventLibraryScan {
     std::optional<Piece> takePiece() VX_EXCLUDES(mutex_);
     void openLibrary() VX_REQUIRES(mutex_);
     void closeLibraryWhenDone() VX_REQUIRES(mutex_);
-    // Waits where only what other threads are opening can bring more.
-    void waitForWork() VX_REQUIRES(mutex_);
-    Piece nextPiece() VX_REQUIRES(mutex_);
-    // nil when there is none left.
-    ScannedEvent* nextFolderToOpen() VX_REQUIRES(mutex_);
-    void openEvent(const platform::Folder& library, ScannedEvent& event) VX_EXCLUDES(mutex_);
-    // nil for a folder that is no event.
-    FolderRef folderOfEvent(const platform::Folder& library, ScannedEvent& event) const;
+    // nil when there is none that could be read now.
+    ScannedFolder* takeFolder() VX_REQUIRES(mutex_);
+    // The next of a folder that was taken.
+    Piece readPiece(const platform::Folder* library, ScannedFolder& folder) VX_EXCLUDES(mutex_);
+    // Opens the folder where that is to be done first. nil when its items can't be read.
+    static std::optional<std::vector<platform::FolderItem>> nextItems(const platform::Folder* library,
+                                                                      ScannedFolder& folder);
+    void finishPiece(ScannedFolder& folder) const;
+    void makeEvent(ScannedFolder& folder) const;
     // nil for what is no clip.
-    Object clipForFile(const platform::Folder& folder, const ScannedEvent& event,
-                       const platform::FolderItem& item, EventYears& years) const;
+    Object clipForFile(const platform::FolderItem& item, const Piece& piece) const;
     // nil for a file that is not there.
     std::optional<ClipDates> datesOfClip(const platform::Folder& folder,
                                          const platform::FolderItem& item) const;
-    Object newClip(std::string name, std::string clip, const ScannedEvent& event) const;
+    Object newClip(std::string name, std::string clip, const ScannedFiles& files) const;
     std::string clipName(const platform::CalendarDateRef& date, std::string_view fileName) const;
 
     VXReelixPlugin& plugin_;
@@ -118,13 +125,14 @@ class VXReelixPlugin::EventLibraryScan {
 
     mutable platform::Mutex mutex_;
     bool isOpened_ VX_GUARDED_BY(mutex_) = false;
-    FolderRef library_ VX_GUARDED_BY(mutex_);  // nil but as long as there are events to open
+    // nil but as long as there are folders to open.
+    std::unique_ptr<platform::Folder> library_ VX_GUARDED_BY(mutex_);
     bool hasEntries_ VX_GUARDED_BY(mutex_) = false;
-    std::vector<ScannedEvent> events_ VX_GUARDED_BY(mutex_);  // each stays where it is
-    std::size_t nextEvent_ VX_GUARDED_BY(mutex_) = 0;         // whose folder nobody has begun to open
-    int foldersBeingOpened_ VX_GUARDED_BY(mutex_) = 0;
-    std::deque<OpenFolder> openFolders_ VX_GUARDED_BY(mutex_);  // that have items left
-    std::condition_variable_any folderOpened_;
+    std::deque<ScannedFolder> folders_ VX_GUARDED_BY(mutex_);           // each stays where it is
+    std::size_t nextFolder_ VX_GUARDED_BY(mutex_) = 0;                  // that nobody has begun to open
+    std::deque<ScannedFolder*> foldersToReadOn_ VX_GUARDED_BY(mutex_);  // that are open
+    int foldersBeingRead_ VX_GUARDED_BY(mutex_) = 0;
+    std::condition_variable_any folderRead_;
 
     SharedWork work_;
 };

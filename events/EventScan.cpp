@@ -28,12 +28,11 @@ VXReelixPlugin::Group VXReelixPlugin::_createReelixEventsFolderForPath(
     library->setModificationDate(vexo::VXMediaGroup::modDateForFile(*path));
     library->setIcon(iconCache().calendarIcon.get());
     library->setPath(*path);
-    for (ScannedEvent& scanned : scan->takeEvents()) {
-        const Group event = scanned.event;
-        _flatEventGroupsList->push_back(event);  // also when it turns out to hold no clip
-        if (finishEvent(std::move(scanned)))
-            library->addChildGroup(event);
-    }
+    Groups withClips = scan->events();
+    // Also those that turned out to hold no clip.
+    _flatEventGroupsList->insert(_flatEventGroupsList->end(), withClips.begin(), withClips.end());
+    std::erase_if(withClips, [](const Group& event) { return event->mediaObjectCount() == 0; });
+    library->setChildGroups(vexo::VXMediaGroupList(std::move(withClips)));
     return library;
 }
 
@@ -53,21 +52,6 @@ VXReelixPlugin::Group VXReelixPlugin::eventGroupForFolder(const std::string& fol
     event->setIcon(iconCache().eventIcon.get());
     event->setPath(folder);
     return event;
-}
-
-bool VXReelixPlugin::finishEvent(ScannedEvent scanned) {
-    std::erase(scanned.clips, nullptr);
-    if (scanned.clips.empty())
-        return false;
-    scanned.clips.shrink_to_fit();
-    scanned.event->setMediaObjects(vexo::VXMediaObjectList(std::move(scanned.clips)));
-    EventYears years;
-    for (const EventYears& ofPiece : scanned.years)
-        years.add(ofPiece);
-    if (!years.lowestDate)
-        years.lowestDate = years.highestDate;
-    writeEventAttributes(scanned.event, years);
-    return true;
 }
 
 // An event is filed under the year of its newest clip when the newest events come first, else under that of

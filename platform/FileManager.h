@@ -42,18 +42,34 @@ struct FolderItem {
     Kind kind = Kind::other;
 };
 
-// A folder that is gone through. Each question answers as the operation by path does and costs as few calls
-// to the system as can be, often none: what the listing told is not asked again, so an item that has vanished
-// since may still be told of by everything but its attributes. It holds a file open, so each is
-// closed before the next one further down is entered where a tree may be deep.
+// A folder that is gone through, some of its items at a time. Each question answers as the operation by path
+// does and costs as few calls to the system as can be, often none: what the listing told is not asked again,
+// so an item that has vanished since may still be told of by everything but its attributes. It holds a file
+// open, so each is closed before the next one further down is entered where a tree may be deep.
 //
-// Callable from any thread.
+// The questions may be asked on any thread, also while another one reads on.
 class Folder {
   public:
     virtual ~Folder() = default;
 
-    // As contentsOfDirectoryAtPath answers. The questions below are about one of these.
-    virtual const std::vector<FolderItem>& items() const = 0;
+    // The items that come next, in the order of contentsOfDirectoryAtPath; empty when all have been told. nil
+    // when they can't be read; the reason goes to the system log. The questions below are about one of these.
+    //
+    // For one thread at a time.
+    virtual std::optional<std::vector<FolderItem>> nextItems() = 0;
+    // False once all have been told. Where it is true, there may still turn out to be none.
+    virtual bool mayHaveMoreItems() const = 0;
+    // All that come, nil when some can't be read.
+    std::optional<std::vector<FolderItem>> allItems() {
+        std::vector<FolderItem> all;
+        while (mayHaveMoreItems()) {
+            const auto items = nextItems();
+            if (!items)
+                return std::nullopt;
+            all.insert(all.end(), items->begin(), items->end());
+        }
+        return all;
+    }
 
     // As itemFlagsAtPath answers.
     virtual std::optional<std::uint32_t> flagsOf(const FolderItem& item) const = 0;
@@ -87,7 +103,7 @@ class FileManager {
     virtual std::optional<std::vector<std::string>> contentsOfDirectoryAtPath(
         const std::string& path) const = 0;
 
-    // The same folder, to go through. nil where contentsOfDirectoryAtPath answers nil.
+    // The same folder, to go through. nil when not even its first items can be listed, and logged like that.
     virtual std::unique_ptr<Folder> openFolderAtPath(const std::string& path) const = 0;
 
     // attributesOfItemAtPath:error:; links are followed. nil when they can't be read.

@@ -24,13 +24,17 @@ struct FolderContent {
     std::vector<Item> items;
 };
 
-// What may be seen in a folder. An item whose flags can't be had is skipped.
-std::vector<Item> visibleItems(const platform::Folder& folder, const std::string& path) {
+// What may be seen in a folder; nil when it can't be listed. An item whose flags can't be had is skipped.
+std::optional<std::vector<Item>> visibleItems(const std::string& path) {
+    const auto folder = platform::services().fileManager.openFolderAtPath(path);
+    const auto listed = folder ? folder->allItems() : std::nullopt;
+    if (!listed)
+        return std::nullopt;
     std::vector<Item> items;
-    for (const platform::FolderItem& item : folder.items()) {
+    for (const platform::FolderItem& item : *listed) {
         if (item.name.empty() || item.name.front() == '.')
             continue;
-        const std::uint32_t flags = folder.flagsOf(item).value_or(platform::itemIsInvisible);
+        const std::uint32_t flags = folder->flagsOf(item).value_or(platform::itemIsInvisible);
         if (!(flags & platform::itemIsInvisible))
             items.push_back({path::appending(path, item.name), flags});
     }
@@ -39,14 +43,12 @@ std::vector<Item> visibleItems(const platform::Folder& folder, const std::string
 
 // A folder whose localized form can't be listed is read by its plain name. An unlistable one has no items.
 FolderContent contentOf(const std::string& folder) {
-    const platform::FileManager& files = platform::services().fileManager;
-    if (const auto listed = files.openFolderAtPath(folder))
-        return {folder, visibleItems(*listed, folder)};
+    if (auto items = visibleItems(folder))
+        return {folder, std::move(*items)};
     if (path::extension(folder) != ReelixLocalizedExtension)
         return {folder, {}};
     std::string plain = path::withoutExtension(folder);
-    const auto listed = files.openFolderAtPath(plain);
-    auto items = listed ? visibleItems(*listed, plain) : std::vector<Item>{};
+    auto items = visibleItems(plain).value_or(std::vector<Item>{});
     return {std::move(plain), std::move(items)};
 }
 

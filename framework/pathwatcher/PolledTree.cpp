@@ -73,8 +73,8 @@ void add(FolderLook& look, int folder, std::string_view name) {
 }
 
 FolderLook lookInto(const std::string& folder, const std::atomic<bool>& stopped) {
-    const auto listing = platform::FolderListing::open(folder);
-    if (!listing)
+    auto listing = platform::FolderListing::open(folder);
+    if (!listing || !listing->readToTheEnd())
         return {Signature(errno).value(), {}};
     FolderLook look;
     for (const platform::FolderItem& item : listing->items) {

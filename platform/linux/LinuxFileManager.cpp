@@ -96,7 +96,11 @@ std::optional<std::vector<std::string>> LinuxFileManager::contentsOfDirectoryAtP
     const auto real = kernelPath(path);
     if (!real)
         return std::nullopt;
-    const auto listing = listingOfFolder(*real);
+    auto listing = listingOfFolder(*real);
+    if (listing && !listing->readToTheEnd()) {
+        logFailure("list", *real, errno);
+        return std::nullopt;
+    }
     return listing ? std::optional(namesOf(listing->items)) : std::nullopt;
 }
 

@@ -9,6 +9,7 @@
 #include <array>
 #include <cerrno>
 #include <cstring>
+#include <utility>
 
 #include "platform/Path.h"
 #include "platform/linux/ExtendedAttributes.h"
@@ -38,6 +39,9 @@ FolderItem::Kind kindOf(const dirent64& entry) {
 
 // Of a block as getdents64 fills it, in which their names stay.
 void addItems(std::vector<FolderItem>& items, const char* block, const char* end) {
+    constexpr std::size_t usualSize = 40;  // with a name of 13 to 20 bytes
+    if (items.empty())
+        items.reserve(static_cast<std::size_t>(end - block) / usualSize);
     while (block < end) {
         const auto& entry = *reinterpret_cast<const dirent64*>(block);
         if (!isDotOrDotDot(entry.d_name))
@@ -46,27 +50,10 @@ void addItems(std::vector<FolderItem>& items, const char* block, const char* end
     }
 }
 
-// False, and errno set, when reading fails. Without the C library's stream of a folder, which asks the system
-// one thing more and takes a block of 32 KiB for any folder.
-bool readItems(FolderListing& listing) {
-    alignas(dirent64) std::array<char, 32 * 1024> buffer;
-    for (;;) {
-        const auto size =
-            uninterrupted([&] { return getdents64(listing.folder.number(), buffer.data(), buffer.size()); });
-        if (size == 0 || (size < 0 && errno == ENOENT))  // the latter of a folder that is gone
-            return true;
-        if (size < 0)
-            return false;
-        auto block = std::make_unique_for_overwrite<char[]>(static_cast<std::size_t>(size));
-        std::copy_n(buffer.data(), size, block.get());
-        addItems(listing.items, block.get(), block.get() + size);
-        listing.nameBlocks.push_back(std::move(block));
-    }
-}
-
-// In any case of letters, because some file systems find the file by any.
-bool holdsHiddenFile(const FolderListing& listing) {
-    return std::ranges::any_of(listing.items, [](const FolderItem& item) {
+// In any case of letters, because some file systems find the file by any. Of a large folder nothing is known
+// as long as it isn't read to its end.
+bool mayHoldHiddenFile(const FolderListing& listing) {
+    return !listing.isComplete || std::ranges::any_of(listing.items, [](const FolderItem& item) {
         return item.name.starts_with('.') && strcasecmp(item.name.data(), ".hidden") == 0;
     });
 }
@@ -79,10 +66,42 @@ dev_t deviceOf(const struct statx& status) {
 
 std::optional<FolderListing> FolderListing::open(int parent, const char* name) {
     constexpr int flags = O_RDONLY | O_DIRECTORY | O_CLOEXEC | O_NONBLOCK;
-    FolderListing listing{FileDescriptor(uninterrupted([&] { return openat(parent, name, flags); })), {}, {}};
-    if (!listing.folder || !readItems(listing))
+    FolderListing listing;
+    listing.folder = FileDescriptor(uninterrupted([&] { return openat(parent, name, flags); }));
+    if (!listing.folder || !listing.readOn())
         return std::nullopt;
     return listing;
+}
+
+// Without the C library's stream of a folder, which asks the system one thing more and takes a block of 32
+// KiB for any folder. A block with room for another item mostly is the last, which only the next call tells.
+bool FolderListing::readOn() {
+    alignas(dirent64) std::array<char, 8 * 1024> buffer;
+    std::size_t sizeRead = 0;
+    while (!isComplete && sizeRead + sizeof(dirent64) <= buffer.size()) {
+        const auto size =
+            uninterrupted([&] { return getdents64(folder.number(), buffer.data(), buffer.size()); });
+        if (size < 0 && errno != ENOENT)
+            return false;
+        if (size <= 0) {  // below 0 in a folder that is gone
+            isComplete = true;
+            return true;
+        }
+        auto block = std::make_unique_for_overwrite<char[]>(static_cast<std::size_t>(size));
+        std::copy_n(buffer.data(), size, block.get());
+        addItems(items, block.get(), block.get() + size);
+        nameBlocks.push_back(std::move(block));
+        sizeRead += static_cast<std::size_t>(size);
+    }
+    return true;
+}
+
+bool FolderListing::readToTheEnd() {
+    while (!isComplete) {
+        if (!readOn())
+            return false;
+    }
+    return true;
 }
 
 std::optional<FolderListing> FolderListing::openOrLog(int parent, const char* name, const std::string& path,
@@ -110,10 +129,18 @@ LinuxFolder::LinuxFolder(FolderListing listing, std::string path, const Services
     : listing_(std::move(listing)),
       path_(std::move(path)),
       services_(services),
-      hiddenNames_(holdsHiddenFile(listing_) ? services_.hiddenNames.ofFolder(path_) : nullptr),
+      hiddenNames_(mayHoldHiddenFile(listing_) ? services_.hiddenNames.ofFolder(path_) : nullptr),
       status_(statusOfFile(listing_.folder.number(), "", AT_EMPTY_PATH)),
       device_(deviceOfParent && deviceOfParent->holds(status_) ? deviceOfParent
                                                                : std::make_shared<Device>(status_)) {}
+
+std::optional<std::vector<FolderItem>> LinuxFolder::nextItems() {
+    if (listing_.items.empty() && !listing_.readOn()) {
+        services_.systemLog.log(failureLine("list", path_, errno));
+        return std::nullopt;
+    }
+    return std::exchange(listing_.items, {});
+}
 
 // No call where the listing has told what the item is and nothing but its name can hide it.
 std::optional<std::uint32_t> LinuxFolder::flagsOf(const FolderItem& item) const {

@@ -22,9 +22,9 @@
 
 namespace platform {
 
-// An open folder with what lies in it, in the order of the file system.
+// An open folder, whose items are read in the order of the file system, some at a time.
 struct FolderListing {
-    // nil, and errno set, when the folder can't be listed.
+    // With the first items. nil, and errno set, when the folder can't be listed.
     static std::optional<FolderListing> open(const std::string& path) { return open(AT_FDCWD, path.c_str()); }
     // By its name in an open folder.
     static std::optional<FolderListing> open(int parent, const char* name);
@@ -32,9 +32,15 @@ struct FolderListing {
     static std::optional<FolderListing> openOrLog(int parent, const char* name, const std::string& path,
                                                   SystemLog& log);
 
+    // Adds the next items, if there are more. False, and errno set, when reading fails.
+    bool readOn();
+    // Adds all that are left.
+    bool readToTheEnd();
+
     FileDescriptor folder;
-    std::vector<FolderItem> items;
-    // As the kernel filled them. The items' names lie in these.
+    std::vector<FolderItem> items;  // that were read
+    bool isComplete = false;        // whether there are no more to read
+    // As the kernel filled them. The names of items lie in these.
     std::vector<std::unique_ptr<const char[]>> nameBlocks;
 };
 
@@ -52,7 +58,8 @@ class LinuxFolder final : public Folder {
     // that are opened from it.
     LinuxFolder(FolderListing listing, std::string path, const Services& services);
 
-    const std::vector<FolderItem>& items() const override { return listing_.items; }
+    std::optional<std::vector<FolderItem>> nextItems() override;
+    bool mayHaveMoreItems() const override { return !listing_.isComplete || !listing_.items.empty(); }
     std::optional<std::uint32_t> flagsOf(const FolderItem& item) const override;
     bool isPlainFile(const FolderItem& item) const override;
     std::optional<FileAttributes> attributesOf(const FolderItem& item) const override;
@@ -82,7 +89,7 @@ class LinuxFolder final : public Folder {
     bool isInvisibleByName(std::string_view name) const;
     std::string pathOf(std::string_view name) const;
 
-    const FolderListing listing_;
+    FolderListing listing_;  // its items are those that nobody has taken
     const std::string path_;
     const Services& services_;
     const std::shared_ptr<const NameSet> hiddenNames_;  // nil for none

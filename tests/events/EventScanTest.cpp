@@ -387,7 +387,7 @@ TEST_F(EventScanTest, EventIsFiledUnderItsNewestYearWhenTheNewestComeFirst) {
     EXPECT_EQ(attributesText(*scannedEvent()), "2009, 2007-02-02T00:00:00Z to 2009-01-01T00:00:00Z");
 }
 
-// More clips than a thread takes at once.
+// More clips than are read at a time.
 TEST_F(EventScanTest, LargeEventHasItsClipsInOrderAndTheYearsOfThemAll) {
     constexpr std::size_t clips = 300;
     std::vector<std::string> listing;
@@ -406,6 +406,22 @@ TEST_F(EventScanTest, LargeEventHasItsClipsInOrderAndTheYearsOfThemAll) {
         shown.push_back(platform::path::lastComponent(clip->ID()));
     EXPECT_EQ(shown, listing);
     EXPECT_EQ(attributesText(*event), "2009, 2007-02-02T00:00:00Z to 2009-01-01T00:00:00Z");
+}
+
+TEST_F(EventScanTest, FolderThatCantBeReadToItsEndIsNoEvent) {
+    for (std::size_t i = 0; i <= PathFolder::itemsATime; ++i)
+        addClip("Long/" + std::to_string(i) + ".mov", "2008-03-03 00;00;00");
+    addClip("Trip/a.mov", "2009-01-01 00;00;00");
+    files.readableItems[library() + "/Long"] = PathFolder::itemsATime;
+    EXPECT_THAT(names(scan()->childGroups()), ElementsAre("Trip"));
+    EXPECT_THAT(flatNames(), ElementsAre("Trip"));
+}
+
+// The last reading of a folder may bring nothing.
+TEST_F(EventScanTest, EventMayEndWhereAReadingEnds) {
+    for (std::size_t i = 0; i < 2 * PathFolder::itemsATime; ++i)
+        addClip("Trip/" + std::to_string(i) + ".mov", "2008-03-03 00;00;00");
+    EXPECT_EQ(scannedEvent()->mediaObjects().size(), 2 * PathFolder::itemsATime);
 }
 
 TEST_F(EventScanTest, EventIsFiledUnderItsOldestYearWhenTheOldestComeFirst) {

@@ -13,18 +13,28 @@ bool goesOn(const BeforeOperation& beforeOperation, const std::string& path) {
     return !beforeOperation || beforeOperation(path);
 }
 
+// Tells few items at a time, as a large folder does.
 class FaultyFolder final : public platform::Folder {
   public:
     FaultyFolder(std::unique_ptr<platform::Folder> real, std::string path,
                  const BeforeOperation& beforeOperation)
         : real_(std::move(real)),
           path_(std::move(path)),
-          items_(real_->items()),
+          itemsLeft_(real_->allItems().value()),
           beforeOperation_(beforeOperation) {
-        std::ranges::sort(items_, {}, &platform::FolderItem::name);
+        std::ranges::sort(itemsLeft_, std::ranges::greater(), &platform::FolderItem::name);
     }
 
-    const std::vector<platform::FolderItem>& items() const override { return items_; }
+    std::optional<std::vector<platform::FolderItem>> nextItems() override {
+        if (!goesOn(beforeOperation_, path_))
+            return std::nullopt;
+        constexpr std::size_t few = 2;
+        std::vector<platform::FolderItem> next;
+        for (; !itemsLeft_.empty() && next.size() < few; itemsLeft_.pop_back())
+            next.push_back(itemsLeft_.back());
+        return next;
+    }
+    bool mayHaveMoreItems() const override { return !itemsLeft_.empty(); }
     std::optional<std::uint32_t> flagsOf(const platform::FolderItem& item) const override {
         return asks(item) ? real_->flagsOf(item) : std::nullopt;
     }
@@ -57,7 +67,7 @@ class FaultyFolder final : public platform::Folder {
 
     const std::unique_ptr<platform::Folder> real_;
     const std::string path_;
-    std::vector<platform::FolderItem> items_;
+    std::vector<platform::FolderItem> itemsLeft_;  // the next one last
     const BeforeOperation& beforeOperation_;
 };
 

@@ -21,18 +21,30 @@ using platform::Folder;
 using platform::FolderItem;
 using testing::ElementsAre;
 using testing::IsEmpty;
+using testing::Optional;
 using testing::UnorderedElementsAre;
 
 class FolderTest : public testing::Test {
   protected:
-    std::unique_ptr<Folder> open() const { return files_.openFolderAtPath(home_.path()); }
-    static FolderItem itemNamed(const Folder& folder, std::string_view name) {
-        const auto found = std::ranges::find(folder.items(), name, &FolderItem::name);
-        return found != folder.items().end() ? *found : FolderItem{name};
+    // An open folder with all its items.
+    struct ReadFolder {
+        explicit ReadFolder(std::unique_ptr<Folder> opened)
+            : folder(std::move(opened)), items(folder->allItems().value()) {}
+        const Folder* operator->() const { return folder.get(); }
+        const Folder& operator*() const { return *folder; }
+
+        std::unique_ptr<Folder> folder;
+        std::vector<FolderItem> items;
+    };
+
+    ReadFolder open() const { return ReadFolder(files_.openFolderAtPath(home_.path())); }
+    static FolderItem itemNamed(const ReadFolder& folder, std::string_view name) {
+        const auto found = std::ranges::find(folder.items, name, &FolderItem::name);
+        return found != folder.items.end() ? *found : FolderItem{name};
     }
-    static std::string attribute(const Folder& folder, std::string_view name) {
+    static std::string attribute(const ReadFolder& folder, std::string_view name) {
         std::array<char, 16> value{};
-        const auto size = folder.extendedAttributeOf(itemNamed(folder, name), "date", value);
+        const auto size = folder->extendedAttributeOf(itemNamed(folder, name), "date", value);
         if (!size)
             return "out of reach";
         return *size < 0 ? "missing" : std::string(value.data(), static_cast<std::size_t>(*size));
@@ -82,22 +94,49 @@ TEST_F(FolderTest, ItemsAreThoseOfTheListing) {
     fill(home_);
     const auto folder = open();
     std::vector<std::string> names;
-    for (const FolderItem& item : folder->items())
+    for (const FolderItem& item : folder.items)
         names.emplace_back(item.name);
     EXPECT_EQ(names, files_.contentsOfDirectoryAtPath(home_.path()));
+}
+
+TEST_F(FolderTest, ItemsOfALargeFolderAreToldSomeAtATime) {
+    constexpr std::size_t count = 1000;
+    for (std::size_t i = 0; i < count; ++i)
+        home_.writeFile("a name that takes its room " + std::to_string(i));
+    home_.writeFile(".hidden", "a name that takes its room 0\na name that takes its room 999\n");
+    const auto folder = files_.openFolderAtPath(home_.path());
+    ASSERT_TRUE(folder);
+    std::vector<FolderItem> all;
+    while (folder->mayHaveMoreItems()) {
+        const auto items = folder->nextItems();
+        ASSERT_TRUE(items);
+        EXPECT_LT(items->size(), count / 2);
+        all.insert(all.end(), items->begin(), items->end());
+    }
+    EXPECT_THAT(folder->nextItems(), Optional(IsEmpty()));
+    std::vector<std::string> names;
+    std::vector<std::string_view> invisible;
+    for (const FolderItem& item : all) {
+        names.emplace_back(item.name);
+        if (folder->flagsOf(item).value_or(0) & platform::itemIsInvisible)
+            invisible.push_back(item.name);
+    }
+    EXPECT_EQ(names, files_.contentsOfDirectoryAtPath(home_.path()));
+    EXPECT_THAT(invisible, UnorderedElementsAre(".hidden", "a name that takes its room 0",
+                                                "a name that takes its room 999"));
 }
 
 TEST_F(FolderTest, ItemsAreToldOfAsByPath) {
     fill(home_);
     fileWithDate("dated.mov");
     const auto folder = open();
-    const auto byPath = PathFolder::open(files_, home_.path());
-    std::vector<FolderItem> items = folder->items();
+    const ReadFolder byPath(PathFolder::open(files_, home_.path()));
+    std::vector<FolderItem> items = folder.items;
     for (const char* name : {".", "missing", "file.mov/below"})
         items.push_back({name});
     for (const FolderItem& item : items) {
         EXPECT_EQ(told(*folder, item), told(*byPath, item)) << item.name;
-        EXPECT_EQ(attribute(*folder, item.name), attribute(*byPath, item.name)) << item.name;
+        EXPECT_EQ(attribute(folder, item.name), attribute(byPath, item.name)) << item.name;
     }
 }
 
@@ -105,14 +144,14 @@ TEST_F(FolderTest, ItemsAreToldOfAsByPath) {
 TEST_F(FolderTest, AListingThatSaysNothingChangesNoAnswer) {
     fill(home_);
     const auto folder = open();
-    for (const FolderItem& item : folder->items())
+    for (const FolderItem& item : folder.items)
         EXPECT_EQ(told(*folder, item), told(*folder, {item.name})) << item.name;
 }
 
 TEST_F(FolderTest, AttributesAreThoseByPath) {
     const std::string file = home_.writeFile("a.mov", "content");
     const auto folder = open();
-    const auto attributes = folder->attributesOf(folder->items()[0]);
+    const auto attributes = folder->attributesOf(folder.items[0]);
     const auto byPath = files_.attributesOfItemAtPath(file);
     EXPECT_EQ(attributes->size, byPath->size);
     EXPECT_EQ(attributes->creationDate->secondsSince1970(), byPath->creationDate->secondsSince1970());
@@ -122,9 +161,7 @@ TEST_F(FolderTest, AttributesAreThoseByPath) {
 TEST_F(FolderTest, ItemsTellWhatAScanAsks) {
     fill(home_);
     const auto folder = open();
-    const auto toldOf = [&folder](const std::string& name) {
-        return told(*folder, itemNamed(*folder, name));
-    };
+    const auto toldOf = [&folder](const std::string& name) { return told(*folder, itemNamed(folder, name)); };
     EXPECT_EQ(toldOf("file.mov"), "0 plain attributes");
     EXPECT_EQ(toldOf("folder"), "8 attributes");
     EXPECT_EQ(toldOf("package.qnproject"), "10 attributes");
@@ -161,17 +198,16 @@ TEST_F(FolderTest, AFolderInItIsOpenedAsByPath) {
     fileWithDate("folder/dated.mov");
     home_.makeFolder("hidden folder");
     for (const std::string name : {"folder", "package.qnproject", "link to folder", "hidden folder"}) {
-        const auto inFolder = open()->openFolder({name});  // which is closed again at once
-        const auto byPath = files_.openFolderAtPath(home_.path(name));
-        ASSERT_TRUE(inFolder && byPath) << name;
-        ASSERT_EQ(inFolder->items().size(), byPath->items().size()) << name;
-        for (const FolderItem& item : byPath->items()) {
+        const ReadFolder inFolder(open()->openFolder({name}));  // which is closed again at once
+        const ReadFolder byPath(files_.openFolderAtPath(home_.path(name)));
+        ASSERT_EQ(inFolder.items.size(), byPath.items.size()) << name;
+        for (const FolderItem& item : byPath.items) {
             EXPECT_EQ(told(*inFolder, item), told(*byPath, item)) << name << "/" << item.name;
-            EXPECT_EQ(attribute(*inFolder, item.name), attribute(*byPath, item.name)) << name;
+            EXPECT_EQ(attribute(inFolder, item.name), attribute(byPath, item.name)) << name;
         }
     }
     EXPECT_EQ(told(*open()->openFolder({"folder"}), {"hidden.mov"}), "64 plain attributes");
-    EXPECT_EQ(attribute(*open()->openFolder({"folder"}), "dated.mov"), "2009");
+    EXPECT_EQ(attribute(ReadFolder(open()->openFolder({"folder"})), "dated.mov"), "2009");
 }
 
 TEST_F(FolderTest, WhatCantBeListedInItIsNilAsByPath) {
@@ -188,12 +224,9 @@ TEST_F(FolderTest, WhatCantBeListedInItIsNilAsByPath) {
 }
 
 TEST_F(FolderTest, AFolderOfAnotherFileSystemIsOpenedAsWell) {
-    const auto root = files_.openFolderAtPath("/");
-    ASSERT_TRUE(root);
-    const auto folder = root->openFolder({"proc"});
+    const ReadFolder folder(files_.openFolderAtPath("/")->openFolder({"proc"}));
     const auto byPath = files_.openFolderAtPath("/proc");
-    ASSERT_TRUE(folder && byPath);
-    EXPECT_TRUE(folder->isPlainFile(itemNamed(*folder, "version")));
+    EXPECT_TRUE(folder->isPlainFile(itemNamed(folder, "version")));
     // Where files may be hidden by a flag the file is looked at, and found missing.
     const FolderItem missing{"missing", FolderItem::Kind::plainFile};
     EXPECT_EQ(folder->flagsOf(missing), byPath->flagsOf(missing));
@@ -204,7 +237,7 @@ TEST_F(FolderTest, AFolderThatIsGoneBeforeItIsListedIsEmpty) {
     home_.remove("gone");
     const auto folder = files_.openFolderAtPath("/proc/self/fd/" + std::to_string(gone.number()));
     ASSERT_TRUE(folder);
-    EXPECT_THAT(folder->items(), IsEmpty());
+    EXPECT_THAT(folder->allItems(), Optional(IsEmpty()));
     EXPECT_THAT(log_.lines(), IsEmpty());
 }
 
@@ -212,9 +245,9 @@ TEST_F(FolderTest, AFileThatVanishesHasNoAttributes) {
     home_.writeFile("a.mov");
     const auto folder = open();
     home_.remove("a.mov");
-    ASSERT_EQ(folder->items().size(), 1u);
-    EXPECT_EQ(folder->attributesOf(folder->items()[0]), std::nullopt);
-    EXPECT_EQ(attribute(*folder, "a.mov"), "out of reach");
+    ASSERT_EQ(folder.items.size(), 1u);
+    EXPECT_EQ(folder->attributesOf(folder.items[0]), std::nullopt);
+    EXPECT_EQ(attribute(folder, "a.mov"), "out of reach");
     EXPECT_THAT(log_.lines(), IsEmpty());
 }
 
@@ -222,7 +255,7 @@ TEST_F(FolderTest, WhatWasNoFileAndVanishesIsNothing) {
     home_.makeFifo("a.mov");
     const auto folder = open();
     home_.remove("a.mov");
-    EXPECT_EQ(told(*folder, folder->items()[0]), "nothing");
+    EXPECT_EQ(told(*folder, folder.items[0]), "nothing");
     EXPECT_THAT(log_.lines(), IsEmpty());
 }
 
@@ -230,7 +263,7 @@ TEST_F(FolderTest, HiddenFileInAnyCaseOfLettersHidesAsByPath) {
     home_.writeFile("a.mov");
     home_.writeFile(".HIDDEN", "a.mov\n");
     const auto folder = open();
-    EXPECT_EQ(folder->flagsOf(itemNamed(*folder, "a.mov")), files_.itemFlagsAtPath(home_.path("a.mov")));
+    EXPECT_EQ(folder->flagsOf(itemNamed(folder, "a.mov")), files_.itemFlagsAtPath(home_.path("a.mov")));
 }
 
 TEST_F(FolderTest, AttributesAreReadBesideFilesWithoutAny) {
@@ -239,21 +272,21 @@ TEST_F(FolderTest, AttributesAreReadBesideFilesWithoutAny) {
     home_.writeFile("3.mov");
     fileWithDate("4.mov");
     const auto folder = open();
-    EXPECT_EQ(attribute(*folder, "1.mov"), "missing");
-    EXPECT_EQ(attribute(*folder, "2.mov"), "2009");
-    EXPECT_EQ(attribute(*folder, "3.mov"), "missing");
-    EXPECT_EQ(attribute(*folder, "4.mov"), "2009");
+    EXPECT_EQ(attribute(folder, "1.mov"), "missing");
+    EXPECT_EQ(attribute(folder, "2.mov"), "2009");
+    EXPECT_EQ(attribute(folder, "3.mov"), "missing");
+    EXPECT_EQ(attribute(folder, "4.mov"), "2009");
 }
 
 TEST_F(FolderTest, AttributesFollowLinks) {
     home_.makeLink("link.mov", fileWithDate("elsewhere/target.mov"));
-    EXPECT_EQ(attribute(*open(), "link.mov"), "2009");
+    EXPECT_EQ(attribute(open(), "link.mov"), "2009");
 }
 
 TEST_F(FolderTest, AnAttributeThatDoesNotFitIsAnError) {
     const std::string file = home_.writeFile("a.mov");
     setExtendedAttribute(file, "user.date", std::string(17, 'x'));
-    EXPECT_EQ(attribute(*open(), "a.mov"), "missing");
+    EXPECT_EQ(attribute(open(), "a.mov"), "missing");
     EXPECT_THAT(log_.lines(), IsEmpty());
 }
 

@@ -23,6 +23,7 @@ class ForwardingFiles final : public platform::FileManager {
 
     // What counts in place of the real thing, by path. A folder without a listing is listed in byte order.
     std::map<std::string, std::vector<std::string>> listings;
+    std::map<std::string, std::size_t> readableItems;  // of a folder, before reading it fails
     std::map<std::string, std::optional<platform::FileAttributes>> attributes;
     std::map<std::string, std::optional<std::uint32_t>> flags;
     std::map<std::string, std::optional<std::string>> displayNames;
@@ -52,7 +53,8 @@ class ForwardingFiles final : public platform::FileManager {
         return names;
     }
     std::unique_ptr<platform::Folder> openFolderAtPath(const std::string& path) const override {
-        return PathFolder::open(*this, path);
+        const auto scripted = readableItems.find(path);
+        return PathFolder::open(*this, path, scripted != readableItems.end() ? scripted->second : SIZE_MAX);
     }
     std::optional<platform::FileAttributes> attributesOfItemAtPath(const std::string& path) const override {
         const auto scripted = attributes.find(path);

@@ -2,6 +2,8 @@
 // well.
 #pragma once
 
+#include <algorithm>
+#include <cstdint>
 #include <filesystem>
 #include <memory>
 #include <optional>
@@ -16,19 +18,29 @@ namespace testing_support {
 
 class PathFolder final : public platform::Folder {
   public:
-    // nil where the folder can't be listed. `files` is not owned.
-    static std::unique_ptr<platform::Folder> open(const platform::FileManager& files,
-                                                  const std::string& path) {
-        auto names = files.contentsOfDirectoryAtPath(path);
-        return names ? std::make_unique<PathFolder>(files, path, std::move(*names)) : nullptr;
-    }
-    PathFolder(const platform::FileManager& files, std::string path, std::vector<std::string> names)
-        : files_(files), path_(std::move(path)), names_(std::move(names)) {
-        for (const std::string& name : names_)
-            items_.push_back({name});
-    }
+    static constexpr std::size_t itemsATime = 100;
 
-    const std::vector<platform::FolderItem>& items() const override { return items_; }
+    // nil where the folder can't be listed. `files` is not owned.
+    static std::unique_ptr<platform::Folder> open(const platform::FileManager& files, const std::string& path,
+                                                  std::size_t readableItems = SIZE_MAX) {
+        auto names = files.contentsOfDirectoryAtPath(path);
+        return names ? std::make_unique<PathFolder>(files, path, std::move(*names), readableItems) : nullptr;
+    }
+    // Reading fails after so many items.
+    PathFolder(const platform::FileManager& files, std::string path, std::vector<std::string> names,
+               std::size_t readableItems)
+        : files_(files), path_(std::move(path)), names_(std::move(names)), readableItems_(readableItems) {}
+
+    std::optional<std::vector<platform::FolderItem>> nextItems() override {
+        const std::size_t end = std::min(itemsTold_ + itemsATime, names_.size());
+        if (end > readableItems_)
+            return std::nullopt;
+        std::vector<platform::FolderItem> items;
+        for (; itemsTold_ < end; ++itemsTold_)
+            items.push_back({names_[itemsTold_]});
+        return items;
+    }
+    bool mayHaveMoreItems() const override { return itemsTold_ < names_.size(); }
     std::optional<std::uint32_t> flagsOf(const platform::FolderItem& item) const override {
         return files_.itemFlagsAtPath(pathOf(item));
     }
@@ -61,7 +73,8 @@ class PathFolder final : public platform::Folder {
     const platform::FileManager& files_;
     const std::string path_;
     const std::vector<std::string> names_;
-    std::vector<platform::FolderItem> items_;
+    const std::size_t readableItems_;
+    std::size_t itemsTold_ = 0;
 };
 
 }  // namespace testing_support
