@@ -121,7 +121,7 @@ bool VXReelixPlugin::EventLibraryScan::scanNextClips() {
 }
 
 // Folders are opened and read without the lock, so that small ones, where that is most of the work, are gone
-// through by each thread on its own.
+// through by each thread on its own. What is open comes before what is not: few folders are open at a time.
 std::optional<VXReelixPlugin::EventLibraryScan::Piece> VXReelixPlugin::EventLibraryScan::takePiece() {
     ScannedFolder* folder = nullptr;
     const platform::Folder* library = nullptr;
@@ -129,14 +129,20 @@ std::optional<VXReelixPlugin::EventLibraryScan::Piece> VXReelixPlugin::EventLibr
         Locked lock(mutex_);
         if (!isOpened_)
             openLibrary();
-        while (!(folder = takeFolder()) && foldersBeingRead_ > 0)
-            folderRead_.wait(mutex_);
-        if (!folder)
+        while (pieces_.empty() && nextFolder_ == folders_.size() && foldersBeingRead_ > 0)
+            pieceIsReady_.wait(mutex_);
+        if (!pieces_.empty()) {
+            Piece piece = std::move(pieces_.front());
+            pieces_.pop_front();
+            return piece;
+        }
+        if (nextFolder_ == folders_.size())
             return std::nullopt;
+        folder = &folders_[nextFolder_++];
         ++foldersBeingRead_;
         library = library_.get();
     }
-    return readPiece(library, *folder);
+    return readFolder(*library, *folder);
 }
 
 void VXReelixPlugin::EventLibraryScan::openLibrary() {
@@ -157,48 +163,49 @@ void VXReelixPlugin::EventLibraryScan::closeLibraryWhenDone() {
         library_ = nullptr;
 }
 
-// What is open comes before what is not: few folders are open at a time.
-VXReelixPlugin::EventLibraryScan::ScannedFolder* VXReelixPlugin::EventLibraryScan::takeFolder() {
-    if (!foldersToReadOn_.empty()) {
-        ScannedFolder* const folder = foldersToReadOn_.front();
-        foldersToReadOn_.pop_front();
-        return folder;
-    }
-    return nextFolder_ < folders_.size() ? &folders_[nextFolder_++] : nullptr;
-}
-
-// Who waits for the folder hears that it was read, also when that raises.
-VXReelixPlugin::EventLibraryScan::Piece VXReelixPlugin::EventLibraryScan::readPiece(
-    const platform::Folder* library, ScannedFolder& folder) {
-    std::optional<std::vector<platform::FolderItem>> items;
-    std::list<ScannedFiles> found;
+// Who waits for pieces hears that there are no more of this folder, also when reading it raises.
+VXReelixPlugin::EventLibraryScan::Piece VXReelixPlugin::EventLibraryScan::readFolder(
+    const platform::Folder& library, ScannedFolder& folder) {
+    std::optional<Piece> last;
     std::exception_ptr failure;
     try {
-        items = nextItems(library, folder);
-        found.push_back({folder.path, countedApart(iconCache().smallApplicationIcon.get()), {}, {}});
+        last = readPieces(library, folder);
     } catch (...) {
         failure = std::current_exception();
     }
     Locked lock(mutex_);
     --foldersBeingRead_;
     closeLibraryWhenDone();
-    folderRead_.notify_all();
+    pieceIsReady_.notify_all();
     if (failure)
         std::rethrow_exception(failure);
-    folder.isEvent = items && (folder.isEvent || !items->empty());
-    if (items && folder.open->mayHaveMoreItems()) {
-        ++folder.unfinishedPieces;
-        foldersToReadOn_.push_back(&folder);
-    }
-    folder.files.splice(folder.files.end(), found);
-    return {&folder, std::move(items).value_or(std::vector<platform::FolderItem>{}), &folder.files.back()};
+    return std::move(*last);
 }
 
-std::optional<std::vector<platform::FolderItem>> VXReelixPlugin::EventLibraryScan::nextItems(
-    const platform::Folder* library, ScannedFolder& folder) {
-    if (!folder.open)
-        folder.open = library->openFolder(folder.item);
-    return folder.open ? folder.open->nextItems() : std::nullopt;
+// At one go, while others scan what has been read: what is renamed between two readings may be told of twice.
+VXReelixPlugin::EventLibraryScan::Piece VXReelixPlugin::EventLibraryScan::readPieces(
+    const platform::Folder& library, ScannedFolder& folder) {
+    folder.open = library.openFolder(folder.item);
+    while (folder.open) {
+        auto items = folder.open->nextItems();
+        folder.isEvent = items && (folder.isEvent || !items->empty());
+        if (!items)
+            break;
+        Piece piece = newPiece(folder, std::move(*items));
+        if (!folder.open->mayHaveMoreItems())
+            return piece;
+        ++folder.unfinishedPieces;
+        Locked lock(mutex_);
+        pieces_.push_back(std::move(piece));
+        pieceIsReady_.notify_one();
+    }
+    return newPiece(folder, {});
+}
+
+VXReelixPlugin::EventLibraryScan::Piece VXReelixPlugin::EventLibraryScan::newPiece(
+    ScannedFolder& folder, std::vector<platform::FolderItem> items) {
+    folder.files.push_back({folder.path, countedApart(iconCache().smallApplicationIcon.get()), {}, {}});
+    return {&folder, std::move(items), &folder.files.back()};
 }
 
 void VXReelixPlugin::EventLibraryScan::finishPiece(ScannedFolder& folder) const {
@@ -210,6 +217,7 @@ void VXReelixPlugin::EventLibraryScan::finishPiece(ScannedFolder& folder) const 
     folder.open = nullptr;
 }
 
+// Its year is by the order of this moment. When the order changes, all is read again.
 void VXReelixPlugin::EventLibraryScan::makeEvent(ScannedFolder& folder) const {
     const auto attributes = folder.open->attributes();
     folder.event = plugin_.eventGroupForFolder(folder.path, libraryFolder_,

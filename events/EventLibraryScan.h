@@ -1,8 +1,7 @@
 // Goes through the event folders of one library, some files at a time, on any number of threads. The events
 // are those in listing order, and so are their clips.
 //
-// A thread reads the next files of a folder and makes their clips; meanwhile another may read on in the same
-// one.
+// A folder is read by one thread. The clips of what it has read are made by any.
 #pragma once
 
 #include <atomic>
@@ -59,8 +58,8 @@ class VXReelixPlugin::EventLibraryScan {
     Groups events() const VX_EXCLUDES(mutex_);
 
   private:
-    // What was found in files that were read together. Their clips have a text and an icon of their own in
-    // common, because threads that count the owners of one object wait for each other at every clip.
+    // What was found in one piece of a folder. Its clips have a text and an icon of their own in common,
+    // because threads that count the owners of one object wait for each other at every clip.
     struct ScannedFiles {
         platform::Value folder;  // its path
         platform::ImageRef clipIcon;
@@ -75,14 +74,14 @@ class VXReelixPlugin::EventLibraryScan {
 
         const std::string path;
         const platform::FolderItem item;         // of the library's folder, as long as that is open
-        std::unique_ptr<platform::Folder> open;  // nil but while it's being gone through
+        std::unique_ptr<platform::Folder> open;  // until the last piece is finished; nil where it can't be
         std::list<ScannedFiles> files;           // in listing order; each stays where it is
         bool isEvent = false;                    // it holds anything, and could be read as far as it was
-        std::atomic<int> unfinishedPieces = 1;   // what is being scanned, and what is yet to be read
+        std::atomic<int> unfinishedPieces = 1;   // the last one counts before it's there
         Group event;                             // nil until the last piece is finished, and where it's none
     };
 
-    // Files of one folder, for the thread that has read them.
+    // Files of one folder that were read together.
     struct Piece {
         ScannedFolder* folder;
         std::vector<platform::FolderItem> items;
@@ -100,13 +99,10 @@ class VXReelixPlugin::EventLibraryScan {
     std::optional<Piece> takePiece() VX_EXCLUDES(mutex_);
     void openLibrary() VX_REQUIRES(mutex_);
     void closeLibraryWhenDone() VX_REQUIRES(mutex_);
-    // nil when there is none that could be read now.
-    ScannedFolder* takeFolder() VX_REQUIRES(mutex_);
-    // The next of a folder that was taken.
-    Piece readPiece(const platform::Folder* library, ScannedFolder& folder) VX_EXCLUDES(mutex_);
-    // Opens the folder where that is to be done first. nil when its items can't be read.
-    static std::optional<std::vector<platform::FolderItem>> nextItems(const platform::Folder* library,
-                                                                      ScannedFolder& folder);
+    // Answers the last piece of the folder, which may be empty; others are left for whoever comes first.
+    Piece readFolder(const platform::Folder& library, ScannedFolder& folder) VX_EXCLUDES(mutex_);
+    Piece readPieces(const platform::Folder& library, ScannedFolder& folder) VX_EXCLUDES(mutex_);
+    static Piece newPiece(ScannedFolder& folder, std::vector<platform::FolderItem> items);
     void finishPiece(ScannedFolder& folder) const;
     void makeEvent(ScannedFolder& folder) const;
     // nil for what is no clip.
@@ -128,11 +124,11 @@ class VXReelixPlugin::EventLibraryScan {
     // nil but as long as there are folders to open.
     std::unique_ptr<platform::Folder> library_ VX_GUARDED_BY(mutex_);
     bool hasEntries_ VX_GUARDED_BY(mutex_) = false;
-    std::deque<ScannedFolder> folders_ VX_GUARDED_BY(mutex_);           // each stays where it is
-    std::size_t nextFolder_ VX_GUARDED_BY(mutex_) = 0;                  // that nobody has begun to open
-    std::deque<ScannedFolder*> foldersToReadOn_ VX_GUARDED_BY(mutex_);  // that are open
+    std::deque<ScannedFolder> folders_ VX_GUARDED_BY(mutex_);  // each stays where it is
+    std::size_t nextFolder_ VX_GUARDED_BY(mutex_) = 0;         // that nobody has begun to open
     int foldersBeingRead_ VX_GUARDED_BY(mutex_) = 0;
-    std::condition_variable_any folderRead_;
+    std::deque<Piece> pieces_ VX_GUARDED_BY(mutex_);  // that nobody has taken
+    std::condition_variable_any pieceIsReady_;        // or will never be
 
     SharedWork work_;
 };

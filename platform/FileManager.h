@@ -53,7 +53,8 @@ class Folder {
     virtual ~Folder() = default;
 
     // The items that come next, in the order of contentsOfDirectoryAtPath; empty when all have been told. nil
-    // when they can't be read; the reason goes to the system log. The questions below are about one of these.
+    // when they can't be read; the reason goes to the system log. What is renamed between two calls may be
+    // told twice, by either name, or not at all. The questions below are about one of these.
     //
     // For one thread at a time.
     virtual std::optional<std::vector<FolderItem>> nextItems() = 0;

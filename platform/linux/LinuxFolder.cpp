@@ -89,8 +89,8 @@ bool FolderListing::readOn() {
         }
         auto block = std::make_unique_for_overwrite<char[]>(static_cast<std::size_t>(size));
         std::copy_n(buffer.data(), size, block.get());
-        addItems(items, block.get(), block.get() + size);
         nameBlocks.push_back(std::move(block));
+        addItems(items, nameBlocks.back().get(), nameBlocks.back().get() + size);
         sizeRead += static_cast<std::size_t>(size);
     }
     return true;

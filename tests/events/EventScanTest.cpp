@@ -412,9 +412,22 @@ TEST_F(EventScanTest, FolderThatCantBeReadToItsEndIsNoEvent) {
     for (std::size_t i = 0; i <= PathFolder::itemsATime; ++i)
         addClip("Long/" + std::to_string(i) + ".mov", "2008-03-03 00;00;00");
     addClip("Trip/a.mov", "2009-01-01 00;00;00");
-    files.readableItems[library() + "/Long"] = PathFolder::itemsATime;
+    files.beforeReading = [&](const std::string& path, std::size_t itemsTold) {
+        return path != library() + "/Long" || itemsTold == 0;
+    };
     EXPECT_THAT(names(scan()->childGroups()), ElementsAre("Trip"));
     EXPECT_THAT(flatNames(), ElementsAre("Trip"));
+}
+
+TEST_F(EventScanTest, LibraryThatCantBeReadToItsEndIsNone) {
+    for (std::size_t i = 0; i <= PathFolder::itemsATime; ++i)
+        addClip("Trip " + std::to_string(i) + "/a.mov", "2008-03-03 00;00;00");
+    EXPECT_EQ(scan()->childGroups().size(), PathFolder::itemsATime + 1);
+    files.beforeReading = [&](const std::string& path, std::size_t itemsTold) {
+        return path != library() || itemsTold == 0;
+    };
+    EXPECT_EQ(scan(), nullptr);
+    EXPECT_THAT(flatNames(), IsEmpty());
 }
 
 // The last reading of a folder may bring nothing.

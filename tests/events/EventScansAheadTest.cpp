@@ -125,6 +125,66 @@ TEST_F(SlowFolderTest, TheLoadFailsWhenOpeningItRaises) {
     EXPECT_THROW(plugin().performLoadData(), std::runtime_error);
 }
 
+// The second thread of a load is a real one here, and reads a large event, "Large", on only when the load has
+// begun with the clips of what was read first.
+class LargeFolderTest : public EventScansAheadTest {
+  protected:
+    LargeFolderTest() {
+        for (std::size_t i = 0; i < 3 * PathFolder::itemsATime; ++i)
+            addClip("Large/" + std::to_string(1000 + i) + ".mov");
+        files.beforeListing = [this](const std::string& path) {
+            if (path == home().path("Movies/Reelix Projects"))
+                secondThread_ = std::thread([this] { environment.dispatcher.runDueBlocks(); });
+        };
+        files.beforeReading = [this](const std::string& path, std::size_t itemsTold) {
+            if (path != home().path(inLibrary("Large")) || itemsTold == 0)
+                return true;
+            if (itemsTold == PathFolder::itemsATime) {
+                EXPECT_TRUE(clipBegun_.try_acquire_for(std::chrono::seconds(30)));
+            }
+            return beforeReadingOn();
+        };
+        files.beforeAttributeRead = [this](const std::string& path) {
+            if (path == home().path(inLibrary("Large/1000.mov")))
+                clipBegun_.release();
+        };
+    }
+    ~LargeFolderTest() override {
+        if (secondThread_.joinable())
+            secondThread_.join();
+    }
+    std::vector<std::string> eventNames() {
+        platform::Locked monitor(plugin()._monitor);
+        return names(*plugin()._flatEventGroupsList);
+    }
+
+    std::function<bool()> beforeReadingOn = [] { return true; };
+
+  private:
+    std::binary_semaphore clipBegun_{0};
+    std::thread secondThread_;
+};
+
+TEST_F(LargeFolderTest, HasItsClipsInOrder) {
+    load();
+    std::vector<std::string> expected;
+    for (std::size_t i = 0; i < 3 * PathFolder::itemsATime; ++i)
+        expected.push_back(std::to_string(1000 + i));
+    platform::Locked monitor(plugin()._monitor);
+    EXPECT_EQ(clipNames(plugin()._flatEventGroupsList->front()), expected);
+}
+
+TEST_F(LargeFolderTest, IsMissingAloneWhenItCantBeReadOn) {
+    beforeReadingOn = [] { return false; };
+    load();
+    EXPECT_THAT(eventNames(), ElementsAre("Party", "Trip"));
+}
+
+TEST_F(LargeFolderTest, TheLoadFailsWhenReadingOnRaises) {
+    beforeReadingOn = []() -> bool { throw std::runtime_error("the event can't be read on"); };
+    EXPECT_THROW(plugin().performLoadData(), std::runtime_error);
+}
+
 // The same folder twice among the search paths is two libraries, each with items of its own.
 TEST_F(EventScansAheadTest, EachSearchPathHasItsOwnScan) {
     load();

@@ -23,7 +23,6 @@ class ForwardingFiles final : public platform::FileManager {
 
     // What counts in place of the real thing, by path. A folder without a listing is listed in byte order.
     std::map<std::string, std::vector<std::string>> listings;
-    std::map<std::string, std::size_t> readableItems;  // of a folder, before reading it fails
     std::map<std::string, std::optional<platform::FileAttributes>> attributes;
     std::map<std::string, std::optional<std::uint32_t>> flags;
     std::map<std::string, std::optional<std::string>> displayNames;
@@ -32,6 +31,8 @@ class ForwardingFiles final : public platform::FileManager {
     std::function<void(const std::string& path)> beforeListing;
     std::function<void(const std::string& path)> beforeKind;
     std::function<void(const std::string& path)> beforeDisplayName;
+    std::function<void(const std::string& path)> beforeAttributeRead;
+    PathFolder::BeforeReading beforeReading;
 
     mutable std::vector<std::size_t> attributeReads;  // the buffer sizes of extendedAttribute
 
@@ -53,8 +54,7 @@ class ForwardingFiles final : public platform::FileManager {
         return names;
     }
     std::unique_ptr<platform::Folder> openFolderAtPath(const std::string& path) const override {
-        const auto scripted = readableItems.find(path);
-        return PathFolder::open(*this, path, scripted != readableItems.end() ? scripted->second : SIZE_MAX);
+        return PathFolder::open(*this, path, beforeReading);
     }
     std::optional<platform::FileAttributes> attributesOfItemAtPath(const std::string& path) const override {
         const auto scripted = attributes.find(path);
@@ -72,6 +72,8 @@ class ForwardingFiles final : public platform::FileManager {
     }
     std::ptrdiff_t extendedAttribute(const std::string& path, std::string_view name,
                                      std::span<char> buffer) const override {
+        if (beforeAttributeRead)
+            beforeAttributeRead(path);
         {
             platform::Locked lock(attributeReadsMutex_);
             attributeReads.push_back(buffer.size());

@@ -2,9 +2,8 @@
 // well.
 #pragma once
 
-#include <algorithm>
-#include <cstdint>
 #include <filesystem>
+#include <functional>
 #include <memory>
 #include <optional>
 #include <string>
@@ -20,27 +19,32 @@ class PathFolder final : public platform::Folder {
   public:
     static constexpr std::size_t itemsATime = 100;
 
+    // Called before some of its items are told, with how many have been; whether they can be read.
+    using BeforeReading = std::function<bool(const std::string& path, std::size_t itemsTold)>;
+
     // nil where the folder can't be listed. `files` is not owned.
     static std::unique_ptr<platform::Folder> open(const platform::FileManager& files, const std::string& path,
-                                                  std::size_t readableItems = SIZE_MAX) {
+                                                  const BeforeReading& beforeReading = nullptr) {
         auto names = files.contentsOfDirectoryAtPath(path);
-        return names ? std::make_unique<PathFolder>(files, path, std::move(*names), readableItems) : nullptr;
+        return names ? std::make_unique<PathFolder>(files, path, std::move(*names), beforeReading) : nullptr;
     }
-    // Reading fails after so many items.
     PathFolder(const platform::FileManager& files, std::string path, std::vector<std::string> names,
-               std::size_t readableItems)
-        : files_(files), path_(std::move(path)), names_(std::move(names)), readableItems_(readableItems) {}
+               BeforeReading beforeReading)
+        : files_(files),
+          path_(std::move(path)),
+          names_(std::move(names)),
+          beforeReading_(std::move(beforeReading)) {}
 
     std::optional<std::vector<platform::FolderItem>> nextItems() override {
-        const std::size_t end = std::min(itemsTold_ + itemsATime, names_.size());
-        if (end > readableItems_)
+        if (beforeReading_ && !beforeReading_(path_, itemsTold_))
             return std::nullopt;
         std::vector<platform::FolderItem> items;
-        for (; itemsTold_ < end; ++itemsTold_)
+        for (; items.size() < itemsATime && itemsTold_ < names_.size(); ++itemsTold_)
             items.push_back({names_[itemsTold_]});
+        isAtEnd_ = items.size() < itemsATime;
         return items;
     }
-    bool mayHaveMoreItems() const override { return itemsTold_ < names_.size(); }
+    bool mayHaveMoreItems() const override { return !isAtEnd_; }
     std::optional<std::uint32_t> flagsOf(const platform::FolderItem& item) const override {
         return files_.itemFlagsAtPath(pathOf(item));
     }
@@ -73,8 +77,9 @@ class PathFolder final : public platform::Folder {
     const platform::FileManager& files_;
     const std::string path_;
     const std::vector<std::string> names_;
-    const std::size_t readableItems_;
+    const BeforeReading beforeReading_;
     std::size_t itemsTold_ = 0;
+    bool isAtEnd_ = false;
 };
 
 }  // namespace testing_support
