@@ -162,6 +162,15 @@ TEST_F(CommandLineTest, ItemsAndImagesAreNumberedByIdentity) {
     EXPECT_NE(event["icon"]["image"], library["childGroups"][0]["icon"]["image"]);
 }
 
+TEST_F(CommandLineTest, ClipsOfAllEventsHaveOneImage) {
+    home.writeFile("Movies/Reelix Events/Beach/a.mov");
+    home.writeFile("Movies/Reelix Events/Party/b.mov");
+    const Json document = treeOf(home);
+    const Json& clips = root(document)["mediaObjects"];
+    ASSERT_EQ(clips.size(), 2u);
+    EXPECT_EQ(clips[0]["icon"]["image"], clips[1]["icon"]["image"]);
+}
+
 TEST_F(CommandLineTest, BytesThatAreNotUTF8AreReplacedInTextAndExactInTheURL) {
     home.writeFile("Movies/Reelix Events/Beach/a\xff.mov");
     const Json document = treeOf(home);
