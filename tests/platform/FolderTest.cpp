@@ -198,8 +198,11 @@ TEST_F(FolderTest, AFolderInItIsOpenedAsByPath) {
     fileWithDate("folder/dated.mov");
     home_.makeFolder("hidden folder");
     for (const std::string name : {"folder", "package.qnproject", "link to folder", "hidden folder"}) {
-        const ReadFolder inFolder(open()->openFolder({name}));  // which is closed again at once
-        const ReadFolder byPath(files_.openFolderAtPath(home_.path(name)));
+        auto openedInFolder = open()->openFolder({name});  // which is closed again at once
+        auto openedByPath = files_.openFolderAtPath(home_.path(name));
+        ASSERT_TRUE(openedInFolder && openedByPath) << name;
+        const ReadFolder inFolder(std::move(openedInFolder));
+        const ReadFolder byPath(std::move(openedByPath));
         ASSERT_EQ(inFolder.items.size(), byPath.items.size()) << name;
         for (const FolderItem& item : byPath.items) {
             EXPECT_EQ(told(*inFolder, item), told(*byPath, item)) << name << "/" << item.name;
@@ -224,8 +227,12 @@ TEST_F(FolderTest, WhatCantBeListedInItIsNilAsByPath) {
 }
 
 TEST_F(FolderTest, AFolderOfAnotherFileSystemIsOpenedAsWell) {
-    const ReadFolder folder(files_.openFolderAtPath("/")->openFolder({"proc"}));
+    const auto root = files_.openFolderAtPath("/");
+    ASSERT_TRUE(root);
+    auto opened = root->openFolder({"proc"});
     const auto byPath = files_.openFolderAtPath("/proc");
+    ASSERT_TRUE(opened && byPath);
+    const ReadFolder folder(std::move(opened));
     EXPECT_TRUE(folder->isPlainFile(itemNamed(folder, "version")));
     // Where files may be hidden by a flag the file is looked at, and found missing.
     const FolderItem missing{"missing", FolderItem::Kind::plainFile};

@@ -56,8 +56,8 @@ TEST_F(LocalZoneTest, ZonesThatAreKeptSpoilNoneThatAreMadeLater) {
 TEST_F(LocalZoneTest, DatesInAnyOrderAreThoseOfTheirOwnTime) {
     const ScopedEnvironment environment("TZ", "CET-1CEST,M3.5.0,M10.5.0/3");
     const LocalZone zone = LocalZone::current();
-    constexpr std::int64_t hours =
-        30'011;  // more than three years; a prime, so that each step comes to all of them
+    // More than three years; a prime, so that each step comes to all of them.
+    constexpr std::int64_t hours = 30'011;
     for (const std::int64_t step : {1, -1, 9973}) {
         for (std::int64_t i = 0; i < hours; ++i) {
             const std::int64_t clock = (step * i % hours - hours / 2) * hour;  // before 2001 and after
