@@ -143,8 +143,10 @@ void VXReelixPlugin::EventLibraryScan::openLibrary() {
     isOpened_ = true;
     library_ = platform::services().fileManager.openFolderAtPath(libraryFolder_);
     const auto items = library_ ? library_->allItems() : std::nullopt;
-    hasEntries_ = items && !items->empty();
-    for (const platform::FolderItem& item : items.value_or(std::vector<platform::FolderItem>{})) {
+    if (!items)
+        return closeLibraryWhenDone();
+    hasEntries_ = !items->empty();
+    for (const platform::FolderItem& item : *items) {
         if (!isHiddenName(item.name) && hasFlags(library_->flagsOf(item), platform::itemIsContainer))
             folders_.emplace_back(path::appending(libraryFolder_, item.name), item);
     }

@@ -28,11 +28,11 @@ VXReelixPlugin::Group VXReelixPlugin::_createReelixEventsFolderForPath(
     library->setModificationDate(vexo::VXMediaGroup::modDateForFile(*path));
     library->setIcon(iconCache().calendarIcon.get());
     library->setPath(*path);
-    Groups withClips = scan->events();
+    Groups events = scan->events();
     // Also those that turned out to hold no clip.
-    _flatEventGroupsList->insert(_flatEventGroupsList->end(), withClips.begin(), withClips.end());
-    std::erase_if(withClips, [](const Group& event) { return event->mediaObjectCount() == 0; });
-    library->setChildGroups(vexo::VXMediaGroupList(std::move(withClips)));
+    _flatEventGroupsList->insert(_flatEventGroupsList->end(), events.begin(), events.end());
+    std::erase_if(events, [](const Group& event) { return event->mediaObjectCount() == 0; });
+    library->setChildGroups(vexo::VXMediaGroupList(std::move(events)));
     return library;
 }
 
