@@ -55,6 +55,12 @@ std::optional<int> usableYear(const platform::CalendarDateRef& date) {
     return 0 <= year && year <= 9999 ? std::optional(year) : std::nullopt;
 }
 
+// The same image, whose owners are counted on their own: threads that count them in one place wait for each
+// other at every clip.
+platform::ImageRef countedApart(const platform::ImageRef& image) {
+    return {std::make_shared<platform::ImageRef>(image), image.get()};
+}
+
 int creationYear(const platform::DateRef& creationDate, const platform::LocalZone& zone) {
     return creationDate ? platform::yearInCurrentCalendar(*creationDate, zone) : yearWithoutCreationDate;
 }
@@ -200,7 +206,7 @@ VXReelixPlugin::EventLibraryScan::Piece VXReelixPlugin::EventLibraryScan::readPi
 
 VXReelixPlugin::EventLibraryScan::Piece VXReelixPlugin::EventLibraryScan::newPiece(
     ScannedFolder& folder, std::vector<platform::FolderItem> items) {
-    folder.files.push_back({folder.path, iconCache().smallApplicationIcon.get(), {}, {}});
+    folder.files.push_back({folder.path, countedApart(iconCache().smallApplicationIcon.get()), {}, {}});
     return {&folder, std::move(items), &folder.files.back()};
 }
 

@@ -58,8 +58,8 @@ class VXReelixPlugin::EventLibraryScan {
     Groups events() const VX_EXCLUDES(mutex_);
 
   private:
-    // What was found in one piece of a folder. Its clips have a text of their own in common, because threads
-    // that count the owners of one object wait for each other at every clip.
+    // What was found in one piece of a folder. Its clips have a text and an icon of their own in common,
+    // because threads that count the owners of one object wait for each other at every clip.
     struct ScannedFiles {
         platform::Value folder;  // its path
         platform::ImageRef clipIcon;

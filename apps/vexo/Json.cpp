@@ -123,7 +123,7 @@ Json JsonTreeWriter::image(const platform::ImageRef& image) {
     return {{"name", image->name().empty() ? Json() : jsonText(image->name())},
             {"width", jsonPoints(image->size().width)},
             {"height", jsonPoints(image->size().height)},
-            {"image", imageNumbers_.of(image)}};
+            {"image", imageNumbers_.of(image->weak_from_this())}};
 }
 
 std::optional<std::string> noDataMessage(VXMediaManager& manager, const VXMediaGroupRef& group) {

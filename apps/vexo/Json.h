@@ -44,7 +44,7 @@ class JsonTreeWriter {
     template <typename T>
     class Numbers {
       public:
-        int of(const std::shared_ptr<T>& thing) {
+        int of(const std::weak_ptr<T>& thing) {
             if (numbers_.size() >= 2 * living_)
                 forgetGone();
             const auto [entry, isNew] = numbers_.try_emplace(thing, last_ + 1);

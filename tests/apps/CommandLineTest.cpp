@@ -169,6 +169,7 @@ TEST_F(CommandLineTest, ClipsOfAllEventsHaveOneImage) {
     const Json& clips = root(document)["mediaObjects"];
     ASSERT_EQ(clips.size(), 2u);
     EXPECT_EQ(clips[0]["icon"]["image"], clips[1]["icon"]["image"]);
+    EXPECT_EQ(clips[0]["icon"]["image"], root(document)["icon"]["image"]);
 }
 
 TEST_F(CommandLineTest, BytesThatAreNotUTF8AreReplacedInTextAndExactInTheURL) {
