@@ -38,6 +38,7 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     using Object = vexo::VXMediaObjectRef;
     using Groups = std::vector<Group>;
     using Objects = std::vector<Object>;
+    using OrderedEvents = std::vector<ReelixSupport::OrderedEvent>;
 
     // --- Identity (core/Identity.cpp) ----------------------------------------------------------------------
 
@@ -142,8 +143,10 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     // --- Event folders and clips (events/EventScan.cpp, events/ClipDates.cpp) ------------------------------
 
     // _createReelixEventsFolderForPath:; the library group with its events, nil for a nil path or a folder
-    // without entries. The caller holds the monitor, which guards the flat list that this fills.
-    Group _createReelixEventsFolderForPath(const std::optional<std::string>& path) VX_REQUIRES(_monitor);
+    // without entries. Its events are added to `events` as well. The caller holds the monitor, which guards
+    // the flat list that this fills.
+    Group _createReelixEventsFolderForPath(const std::optional<std::string>& path, OrderedEvents& events)
+        VX_REQUIRES(_monitor);
     // _dateFromExtendedFileAttributeAtPath:
     platform::CalendarDateRef _dateFromExtendedFileAttributeAtPath(const std::string& path);
     // _nonCalendarDateFromDate:; a calendar date as a plain one, any other date or nil as it is.
@@ -246,7 +249,8 @@ class VXReelixPlugin : public vexo::VXMediaManager,
     Object renderedMovieObject(const std::string& movie, const std::string& package);
     Object newRepresentative(const Group& projectGroup, const Object& movie);
 
-    void scanEventLibraries(const Group& holder) VX_REQUIRES(_monitor);
+    // The events of all libraries, in the order in which they were found.
+    OrderedEvents scanEventLibraries() VX_REQUIRES(_monitor);
     void watchEventLibrary(const std::string& folder);
     Group newEventLibraryGroup(const std::optional<std::string>& parentID);
     void fileEventUnderItsYear(ReelixSupport::OrderedEvent event, const Group& eventLibrary,

@@ -96,12 +96,15 @@ bool VXReelixPlugin::EventLibraryScan::hasEntries() const {
     return hasEntries_;
 }
 
-VXReelixPlugin::Groups VXReelixPlugin::EventLibraryScan::events() const {
+VXReelixPlugin::EventLibraryScan::Events VXReelixPlugin::EventLibraryScan::takeEvents() {
     Locked lock(mutex_);
-    Groups events;
-    for (const ScannedFolder& folder : folders_) {
-        if (folder.event)
-            events.push_back(folder.event);
+    Events events;
+    for (ScannedFolder& folder : folders_) {
+        if (!folder.event)
+            continue;
+        events.all.push_back(folder.event->event);
+        if (folder.hasClips)
+            events.withClips.push_back(std::move(*folder.event));
     }
     return events;
 }
@@ -222,8 +225,8 @@ void VXReelixPlugin::EventLibraryScan::finishPiece(ScannedFolder& folder) const 
 // Its year is by the order of this moment. When the order changes, all is read again.
 void VXReelixPlugin::EventLibraryScan::makeEvent(ScannedFolder& folder) const {
     const auto attributes = folder.open->attributes();
-    folder.event = plugin_.eventGroupForFolder(folder.path, libraryFolder_,
-                                               attributes ? attributes->modificationDate : nullptr);
+    const Group event = plugin_.eventGroupForFolder(folder.path, libraryFolder_,
+                                                    attributes ? attributes->modificationDate : nullptr);
     Objects clips;
     EventYears years;
     for (ScannedFiles& files : folder.files) {
@@ -233,13 +236,15 @@ void VXReelixPlugin::EventLibraryScan::makeEvent(ScannedFolder& folder) const {
         else
             std::ranges::move(files.clips, std::back_inserter(clips));
     }
-    if (clips.empty())
-        return;
-    clips.shrink_to_fit();
-    folder.event->setMediaObjects(vexo::VXMediaObjectList(std::move(clips)));
-    if (!years.lowestDate)
-        years.lowestDate = years.highestDate;
-    plugin_.writeEventAttributes(folder.event, years);
+    folder.hasClips = !clips.empty();
+    if (folder.hasClips) {
+        clips.shrink_to_fit();
+        event->setMediaObjects(vexo::VXMediaObjectList(std::move(clips)));
+        if (!years.lowestDate)
+            years.lowestDate = years.highestDate;
+        plugin_.writeEventAttributes(event, years);
+    }
+    folder.event.emplace(event);
 }
 
 // A file that is a movie only by its metadata gets its item before its date is known, and keeps its whole

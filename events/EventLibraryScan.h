@@ -17,6 +17,7 @@
 
 #include "core/VXReelixPlugin.h"
 #include "events/ClipDates.h"
+#include "events/EventOrder.h"
 #include "events/SharedWork.h"
 #include "platform/CalendarDate.h"
 #include "platform/FileManager.h"
@@ -54,8 +55,12 @@ class VXReelixPlugin::EventLibraryScan {
 
     // Whether the library's folder can be listed and holds anything.
     bool hasEntries() const VX_EXCLUDES(mutex_);
-    // Those of its folders that hold anything, be any of it a clip or not.
-    Groups events() const VX_EXCLUDES(mutex_);
+    // In listing order. They can be taken once.
+    struct Events {
+        Groups all;  // of folders that hold anything, be any of it a clip or not
+        OrderedEvents withClips;
+    };
+    Events takeEvents() VX_EXCLUDES(mutex_);
 
   private:
     // What was found in one piece of a folder. Its clips have a text and an icon of their own in common,
@@ -78,7 +83,10 @@ class VXReelixPlugin::EventLibraryScan {
         std::list<ScannedFiles> files;           // in listing order; each stays where it is
         bool isEvent = false;                    // it holds anything, and could be read as far as it was
         std::atomic<int> unfinishedPieces = 1;   // the last one counts before it's there
-        Group event;                             // nil until the last piece is finished, and where it's none
+        bool hasClips = false;
+        // nil until the last piece is finished, and where it's none. What it is ordered by is asked of it
+        // here, on any thread, and not of one cold event after another when all are there.
+        std::optional<ReelixSupport::OrderedEvent> event;
     };
 
     // Files of one folder that were read together.

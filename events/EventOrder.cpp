@@ -95,6 +95,14 @@ std::vector<OrderedEvent> sortedByYear(std::vector<OrderedEvent> events, EventOr
     return sorted;
 }
 
+vexo::VXMediaGroupList groupsOf(const std::vector<OrderedEvent>& events) {
+    std::vector<VXMediaGroupRef> groups;
+    groups.reserve(events.size());
+    for (const OrderedEvent& event : events)
+        groups.push_back(event.event);
+    return vexo::VXMediaGroupList(std::move(groups));
+}
+
 ComparisonResult _eventComparisonAlphabetically(const VXMediaGroupRef& a, const VXMediaGroupRef& b) {
     return compareNames(*a, *b);
 }

@@ -39,6 +39,9 @@ struct OrderedEvent {
 // Sorted by one of the two.
 std::vector<OrderedEvent> sortedByYear(std::vector<OrderedEvent> events, EventOrder order);
 
+// The events alone.
+vexo::VXMediaGroupList groupsOf(const std::vector<OrderedEvent>& events);
+
 // _eventComparisonAlphabetically:; nothing in the plug-in sorts by it.
 ComparisonResult _eventComparisonAlphabetically(const vexo::VXMediaGroupRef& a,
                                                 const vexo::VXMediaGroupRef& b);

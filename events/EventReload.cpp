@@ -11,6 +11,7 @@ namespace reelix {
 
 using platform::Locked;
 using ReelixSupport::EventOrder;
+using ReelixSupport::groupsOf;
 using ReelixSupport::OrderedEvent;
 using ReelixSupport::sortedByYear;
 using vexo::VXMediaGroupList;
@@ -24,21 +25,13 @@ std::optional<platform::Value> yearOf(const vexo::VXMediaGroup& group) {
     return year ? std::optional(*year) : std::nullopt;
 }
 
-VXMediaGroupList groupsOf(std::vector<OrderedEvent> events) {
-    std::vector<vexo::VXMediaGroupRef> groups;
-    groups.reserve(events.size());
-    for (OrderedEvent& event : events)
-        groups.push_back(std::move(event.event));
-    return VXMediaGroupList(std::move(groups));
-}
-
 }  // namespace
 
 // The year groups of one event library, with the events that were filed under them.
 struct VXReelixPlugin::YearGroups {
     struct YearGroup {
         Group group;
-        std::vector<OrderedEvent> events;
+        OrderedEvents events;
     };
 
     std::vector<YearGroup> inOrder;
@@ -65,10 +58,10 @@ VXReelixPlugin::Group VXReelixPlugin::_reloadReelixEvents() {
 VXReelixPlugin::Group VXReelixPlugin::_reloadReelixEvents(const std::optional<std::string>& parentID,
                                                           bool updateRootMediaGroup) {
     _poolingEventsReload = false;  // before all else: a change from now on needs a reload of its own
-    const Group holder = newMediaGroupWithTypeIdentifier(vexo::VXReelixRootGroupTypeIdentifier, std::nullopt);
+    OrderedEvents events;
     {
         Locked monitor(_monitor);
-        scanEventLibraries(holder);
+        events = scanEventLibraries();
     }
     const LoadState whenScanned = loadState();
     if (isCancelLoadRequestPending())
@@ -76,17 +69,16 @@ VXReelixPlugin::Group VXReelixPlugin::_reloadReelixEvents(const std::optional<st
 
     const EventOrder order = _mostRecentEventFirst ? EventOrder::newestFirst : EventOrder::oldestFirst;
     const Group eventLibrary = newEventLibraryGroup(parentID);
-    const VXMediaGroupList events = holder->childGroups();
     YearGroups years;
-    for (OrderedEvent& event : sortedByYear({events.begin(), events.end()}, order)) {
+    for (OrderedEvent& event : sortedByYear(std::move(events), order)) {
         if (isCancelLoadRequestPending())
             break;
         fileEventUnderItsYear(std::move(event), eventLibrary, years);
     }
     for (YearGroups::YearGroup& year : years.inOrder) {
-        if (isCancelLoadRequestPending())
-            break;
-        year.group->setChildGroups(groupsOf(sortedByYear(std::move(year.events), order)));
+        if (!isCancelLoadRequestPending())
+            year.events = sortedByYear(std::move(year.events), order);
+        year.group->setChildGroups(groupsOf(year.events));
     }
 
     if (updateRootMediaGroup && !isCancelLoadRequestPending()) {
@@ -104,19 +96,18 @@ VXReelixPlugin::Group VXReelixPlugin::_reloadReelixEvents(const std::optional<st
     return eventLibrary->childGroups().empty() ? nullptr : eventLibrary;
 }
 
-void VXReelixPlugin::scanEventLibraries(const Group& holder) {
+VXReelixPlugin::OrderedEvents VXReelixPlugin::scanEventLibraries() {
+    OrderedEvents events;
     _flatEventGroupsList = std::make_unique<Groups>();
     if (!_ReelixEventsSearchPaths)
-        return;
+        return events;
     for (const std::string& folder : _ReelixEventsSearchPaths->snapshot()) {
         if (isCancelLoadRequestPending())
-            return;
-        if (const Group library = _createReelixEventsFolderForPath(folder)) {
-            library->setParentID(std::string(vexo::VXReelix));
-            holder->addChildGroups(library->childGroups());
-        }
+            break;
+        _createReelixEventsFolderForPath(folder, events);
         watchEventLibrary(folder);
     }
+    return events;
 }
 
 // Not where the folder around it is watched already.
@@ -146,9 +137,7 @@ void VXReelixPlugin::fileEventUnderItsYear(ReelixSupport::OrderedEvent event, co
         years.inOrder.push_back({newYearGroup(yearOf(*event.event)), {}});
         eventLibrary->addChildGroup(years.inOrder.back().group);
     }
-    YearGroups::YearGroup& year = years.inOrder[place];
-    year.group->addChildGroup(event.event);
-    year.events.push_back(std::move(event));
+    years.inOrder[place].events.push_back(std::move(event));
 }
 
 VXReelixPlugin::Group VXReelixPlugin::newYearGroup(const std::optional<platform::Value>& year) {

@@ -1,8 +1,12 @@
 // Turns one event library folder into its events and their clips.
+#include <algorithm>
+#include <iterator>
+
 #include "core/ProcessCaches.h"
 #include "core/ReelixConstants.h"
 #include "core/VXReelixPlugin.h"
 #include "events/EventLibraryScan.h"
+#include "events/EventOrder.h"
 #include "events/EventScansAhead.h"
 #include "platform/Path.h"
 #include "platform/Services.h"
@@ -12,8 +16,8 @@ namespace reelix {
 
 namespace path = platform::path;
 
-VXReelixPlugin::Group VXReelixPlugin::_createReelixEventsFolderForPath(
-    const std::optional<std::string>& path) {
+VXReelixPlugin::Group VXReelixPlugin::_createReelixEventsFolderForPath(const std::optional<std::string>& path,
+                                                                       OrderedEvents& events) {
     if (!path)
         return nullptr;
     const auto scan = scanOfEventLibrary(*path);
@@ -28,11 +32,10 @@ VXReelixPlugin::Group VXReelixPlugin::_createReelixEventsFolderForPath(
     library->setModificationDate(vexo::VXMediaGroup::modDateForFile(*path));
     library->setIcon(iconCache().calendarIcon.get());
     library->setPath(*path);
-    Groups events = scan->events();
-    // Also those that turned out to hold no clip.
-    _flatEventGroupsList->insert(_flatEventGroupsList->end(), events.begin(), events.end());
-    std::erase_if(events, [](const Group& event) { return event->mediaObjectCount() == 0; });
-    library->setChildGroups(vexo::VXMediaGroupList(std::move(events)));
+    EventLibraryScan::Events found = scan->takeEvents();
+    std::ranges::move(found.all, std::back_inserter(*_flatEventGroupsList));
+    library->setChildGroups(ReelixSupport::groupsOf(found.withClips));
+    std::ranges::move(found.withClips, std::back_inserter(events));
     return library;
 }
 

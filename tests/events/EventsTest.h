@@ -1,6 +1,7 @@
 // What the tests of the event library share: event folders on disk with clips whose dates a test chooses.
 #pragma once
 
+#include "events/EventOrder.h"
 #include "platform/CalendarDate.h"
 #include "tests/support/ForwardingFiles.h"
 #include "tests/support/PluginTest.h"
@@ -39,7 +40,8 @@ class EventsTest : public PluginTest {
     vexo::VXMediaGroupRef scan(const std::optional<std::string>& path) {
         platform::Locked monitor(plugin()._monitor);
         plugin()._flatEventGroupsList = std::make_unique<ExposedPlugin::Groups>();
-        return plugin()._createReelixEventsFolderForPath(path);
+        ExposedPlugin::OrderedEvents events;
+        return plugin()._createReelixEventsFolderForPath(path, events);
     }
     vexo::VXMediaGroupRef scan() { return scan(library()); }
     // The only event of the default library.

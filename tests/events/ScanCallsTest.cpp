@@ -11,6 +11,7 @@
 #include <cstdarg>
 #include <cstdlib>
 
+#include "events/EventOrder.h"
 #include "framework/metadata/MetadataStore.h"
 #include "tests/support/PluginTest.h"
 
@@ -79,7 +80,8 @@ class ScanCallsTest : public PluginTest {
         const Calls before{looks, attributeReads};
         platform::Locked monitor(plugin()._monitor);
         plugin()._flatEventGroupsList = std::make_unique<ExposedPlugin::Groups>();
-        const auto scanned = plugin()._createReelixEventsFolderForPath(library());
+        ExposedPlugin::OrderedEvents events;
+        const auto scanned = plugin()._createReelixEventsFolderForPath(library(), events);
         EXPECT_EQ(scanned->mediaObjects().size(), static_cast<std::size_t>(clips_));
         return {looks - before.looks, attributeReads - before.attributeReads};
     }
