@@ -12,16 +12,23 @@ namespace vexo {
 // until it answers false. Callable from any thread.
 template <typename Visit>
 void visitGroups(const VXMediaGroupRef& root, const Visit& visit) {
+    struct Level {
+        VXMediaGroupList groups;
+        std::size_t next = 0;
+    };
     // A stack of our own: a tree may be as deep as a path can be long.
-    std::vector<VXMediaGroupRef> pending{root};
-    while (!pending.empty()) {
-        const VXMediaGroupRef group = std::move(pending.back());
-        pending.pop_back();
+    std::vector<Level> levels{{VXMediaGroupList{root}}};
+    while (!levels.empty()) {
+        Level& level = levels.back();
+        if (level.next == level.groups.size()) {
+            levels.pop_back();
+            continue;
+        }
+        const VXMediaGroupRef& group = level.groups[level.next++];  // lives as long as the level
         if (!visit(group))
             return;
-        const VXMediaGroupList childGroups = group->childGroups();
-        for (std::size_t i = childGroups.size(); i > 0; --i)
-            pending.push_back(childGroups[i - 1]);
+        if (VXMediaGroupList childGroups = group->childGroups(); !childGroups.empty())
+            levels.push_back({std::move(childGroups)});
     }
 }
 
