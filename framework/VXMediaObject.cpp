@@ -71,17 +71,18 @@ void VXMediaObject::setName(std::string name) {
 
 std::optional<std::string> VXMediaObject::path() const {
     Locked lock(mutex_);
-    if (otherPath_)
-        return *otherPath_;
-    return pathIsID_ ? std::optional(ID_) : std::nullopt;
+    if (pathIsID_)
+        return ID_;
+    return rare_ ? rare_->otherPath : std::nullopt;
 }
 
 void VXMediaObject::setPath(std::string_view path) {
     const bool isID = path == ID_;
-    auto other = isID ? nullptr : std::make_unique<const std::string>(path);
+    auto other = isID ? std::nullopt : std::optional<std::string>(path);
     Locked lock(mutex_);
     pathIsID_ = isID;
-    otherPath_.swap(other);
+    if (rare_ || other)
+        rare().otherPath.swap(other);
 }
 
 std::optional<platform::URL> VXMediaObject::URL() const {
@@ -119,8 +120,8 @@ void VXMediaObject::setIcon(platform::ImageRef icon) {
 platform::ImageRef VXMediaObject::thumbnailImage() const {
     {
         Locked lock(mutex_);
-        if (thumbnailImage_)
-            return thumbnailImage_;
+        if (rare_ && rare_->thumbnailImage)
+            return rare_->thumbnailImage;
     }
     const std::optional<std::string> file = path();
     const HostServices* const host = hostServicesIfAny();
@@ -128,16 +129,16 @@ platform::ImageRef VXMediaObject::thumbnailImage() const {
         return nullptr;
     const platform::ImageRef image = host->thumbnails.thumbnailOfFile(*file);
     Locked lock(mutex_);
-    if (!thumbnailImage_)  // else another thread was first
-        thumbnailImage_ = image;
-    return thumbnailImage_;
+    if (!rare().thumbnailImage)  // else another thread was first
+        rare().thumbnailImage = image;
+    return rare().thumbnailImage;
 }
 
 void VXMediaObject::setThumbnailImage(platform::ImageRef image) {
     const platform::ImageRef shown = image;
     {
         Locked lock(mutex_);
-        thumbnailImage_.swap(image);
+        rare().thumbnailImage.swap(image);
     }
     const bool isItsOwn = shown && shown == image;
     if (isItsOwn && shown->picture())
@@ -147,7 +148,7 @@ void VXMediaObject::setThumbnailImage(platform::ImageRef image) {
 std::optional<platform::Value> VXMediaObject::attributeForKey(std::string_view key) const {
     {
         Locked lock(mutex_);
-        if (const platform::Value* attribute = attributes_.find(key))
+        if (const platform::Value* attribute = ownAttributeForKey(key))
             return *attribute;
     }
     return metadataAttributeForKey(key);
@@ -173,43 +174,46 @@ std::optional<platform::Value> VXMediaObject::metadataAttributeForKey(std::strin
 void VXMediaObject::setAttribute(platform::Value attribute, std::string_view forKey) {
     const std::string_view key = lastingText(forKey);
     Locked lock(mutex_);
-    attributes_.set({key, std::move(attribute)});
+    if (!firstAttribute_ || firstAttribute_->key == key) {
+        firstAttribute_ = {key, std::move(attribute)};
+        return;
+    }
+    std::vector<Attribute>& further = rare().furtherAttributes;
+    std::erase_if(further, [&](const Attribute& other) { return other.key == key; });
+    further.push_back({key, std::move(attribute)});
 }
 
 platform::Dictionary VXMediaObject::attributes() const {
     Locked lock(mutex_);
-    return attributes_.dictionary();
-}
-
-const platform::Value* VXMediaObject::Attributes::find(std::string_view key) const {
-    if (first_ && first_->key == key)
-        return &first_->value;
-    const auto found = std::ranges::find(others_, key, &Attribute::key);
-    return found != others_.end() ? &found->value : nullptr;
-}
-
-void VXMediaObject::Attributes::set(Attribute attribute) {
-    if (!first_ || first_->key == attribute.key) {
-        first_ = std::move(attribute);
-        return;
-    }
-    std::erase_if(others_, [&](const Attribute& other) { return other.key == attribute.key; });
-    others_.push_back(std::move(attribute));
-}
-
-platform::Dictionary VXMediaObject::Attributes::dictionary() const {
     platform::Dictionary dictionary;
-    if (first_)
-        dictionary.emplace(first_->key, first_->value);
-    for (const auto& [key, value] : others_)
-        dictionary.emplace(key, value);
+    if (firstAttribute_)
+        dictionary.emplace(firstAttribute_->key, firstAttribute_->value);
+    if (rare_) {
+        for (const auto& [key, value] : rare_->furtherAttributes)
+            dictionary.emplace(key, value);
+    }
     return dictionary;
+}
+
+const platform::Value* VXMediaObject::ownAttributeForKey(std::string_view key) const {
+    if (firstAttribute_ && firstAttribute_->key == key)
+        return &firstAttribute_->value;
+    if (!rare_)
+        return nullptr;
+    const auto found = std::ranges::find(rare_->furtherAttributes, key, &Attribute::key);
+    return found != rare_->furtherAttributes.end() ? &found->value : nullptr;
+}
+
+VXMediaObject::Rare& VXMediaObject::rare() const {
+    if (!rare_)
+        rare_ = std::make_unique<Rare>();
+    return *rare_;
 }
 
 void VXMediaObject::setSpotlightProperties(VXMetadataPropertiesRef properties) {
     Locked lock(mutex_);
     propertiesAreOfID_ = false;
-    spotlightProperties_.swap(properties);
+    rare().spotlightProperties.swap(properties);
 }
 
 void VXMediaObject::setSpotlightPropertiesOfFile(const std::string& path) {
@@ -217,20 +221,21 @@ void VXMediaObject::setSpotlightPropertiesOfFile(const std::string& path) {
     VXMetadataPropertiesRef properties = areOfID ? nullptr : spotlightProperties(path);
     Locked lock(mutex_);
     propertiesAreOfID_ = areOfID;
-    spotlightProperties_.swap(properties);
+    if (rare_ || properties)
+        rare().spotlightProperties.swap(properties);
 }
 
 VXMetadataPropertiesRef VXMediaObject::spotlightProperties() const {
     {
         Locked lock(mutex_);
         if (!propertiesAreOfID_)
-            return spotlightProperties_;
+            return rare_ ? rare_->spotlightProperties : nullptr;
     }
     VXMetadataPropertiesRef ofID = spotlightProperties(ID_);
     Locked lock(mutex_);
     if (std::exchange(propertiesAreOfID_, false))  // else another thread was first
-        spotlightProperties_.swap(ofID);
-    return spotlightProperties_;
+        rare().spotlightProperties.swap(ofID);
+    return rare_ ? rare_->spotlightProperties : nullptr;
 }
 
 VXMetadataPropertiesRef VXMediaObject::spotlightProperties(const std::string& path) {

@@ -83,19 +83,17 @@ class VXMediaObject final {
         std::string_view key;  // lives as long as the process
         platform::Value value;
     };
-    // A clip, as most items are, has one attribute, which needs no memory of its own.
-    class Attributes {
-      public:
-        const platform::Value* find(std::string_view key) const;
-        void set(Attribute attribute);
-        platform::Dictionary dictionary() const;
-
-      private:
-        std::optional<Attribute> first_;
-        std::vector<Attribute> others_;
+    // What most items of a loaded library don't have, or not before somebody looks at them.
+    struct Rare {
+        std::optional<std::string> otherPath;  // nil when the path is the ID
+        std::vector<Attribute> furtherAttributes;
+        platform::ImageRef thumbnailImage;  // made when first asked for
+        VXMetadataPropertiesRef spotlightProperties;
     };
 
+    const platform::Value* ownAttributeForKey(std::string_view key) const VX_REQUIRES(mutex_);
     std::optional<platform::Value> metadataAttributeForKey(std::string_view key) const;
+    Rare& rare() const VX_REQUIRES(mutex_);
 
     const std::string ID_;
     const int mediaType_;
@@ -105,11 +103,9 @@ class VXMediaObject final {
     // Whether the properties are those of the file that the ID names, until somebody asks for them.
     mutable bool propertiesAreOfID_ VX_GUARDED_BY(mutex_) = false;
     std::string name_ VX_GUARDED_BY(mutex_);
-    std::unique_ptr<const std::string> otherPath_ VX_GUARDED_BY(mutex_);  // nil when the path is the ID
-    Attributes attributes_ VX_GUARDED_BY(mutex_);
+    std::optional<Attribute> firstAttribute_ VX_GUARDED_BY(mutex_);  // a clip has one only
     platform::ImageRef icon_ VX_GUARDED_BY(mutex_);
-    mutable platform::ImageRef thumbnailImage_ VX_GUARDED_BY(mutex_);  // made when first asked for
-    mutable VXMetadataPropertiesRef spotlightProperties_ VX_GUARDED_BY(mutex_);
+    mutable std::unique_ptr<Rare> rare_ VX_GUARDED_BY(mutex_);  // nil until it is needed
 };
 
 using VXMediaObjectList = platform::SnapshotList<VXMediaObjectRef>;

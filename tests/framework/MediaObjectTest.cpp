@@ -182,7 +182,7 @@ TEST_F(StoredMetadataTest, AClipTakesLittleMoreThanItsPathAndItsName) {
     const std::size_t before = bytesWith(small);
     const std::size_t bytes = (bytesWith(large) - before) / (large - small);
     const std::size_t pathAndName = folder.size() + 2 * std::string("/clip 100000").size();
-    EXPECT_LE(bytes, pathAndName + 270);
+    EXPECT_LE(bytes, pathAndName + 200);
     EXPECT_EQ(clips.back()->attributeForKey(VXReelixProjectPathKey), event);
 }
 
