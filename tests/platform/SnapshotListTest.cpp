@@ -104,12 +104,21 @@ TEST(SnapshotListTest, AgreesWithPlainVectorsWhateverGrowsFromWhat) {
     std::vector<std::vector<int>> expected(1);
     for (int i = 0; i < 2000; ++i) {
         const std::size_t origin = random() % lists.size();
-        lists.push_back(lists[origin].appending(i));
+        const std::size_t other = random() % lists.size();
+        const bool joins = random() % 8 == 0 && lists[origin].size() + lists[other].size() < 1000;
+        lists.push_back(joins ? Numbers::joining({lists[origin], lists[other]}) : lists[origin].appending(i));
         expected.push_back(expected[origin]);
-        expected.back().push_back(i);
+        if (joins)
+            expected.back().insert(expected.back().end(), expected[other].begin(), expected[other].end());
+        else
+            expected.back().push_back(i);
     }
-    for (std::size_t i = 0; i < lists.size(); ++i)
+    for (std::size_t i = 0; i < lists.size(); ++i) {
         ASSERT_EQ(std::vector<int>(lists[i].begin(), lists[i].end()), expected[i]);
+        ASSERT_EQ(lists[i].size(), expected[i].size());
+        for (std::size_t place = 0; place < expected[i].size(); ++place)
+            ASSERT_EQ(lists[i][place], expected[i][place]);
+    }
 }
 
 TEST(SnapshotListTest, ThreadsMayAppendToCopiesOfOneList) {
@@ -135,6 +144,37 @@ TEST(SnapshotListTest, ListsAreJoinedInTheirOrder) {
     EXPECT_THAT(Numbers::joining({{1, 2}, {}, {3}, {4, 5}}), ElementsAre(1, 2, 3, 4, 5));
     EXPECT_TRUE(Numbers::joining({}).empty());
     EXPECT_TRUE(Numbers::joining({{}, {}}).empty());
+}
+
+TEST(SnapshotListTest, JoinedListsAreListsLikeAnyOther) {
+    Numbers joined = Numbers::joining({{1, 2}, {3}, {4, 5}});
+    EXPECT_EQ(joined.size(), 5u);
+    EXPECT_EQ(joined.front(), 1);
+    EXPECT_EQ(joined.back(), 5);
+    for (int i = 0; i < 5; ++i)
+        EXPECT_EQ(joined[static_cast<std::size_t>(i)], i + 1);
+    const Numbers longer = joined.appending(6);
+    EXPECT_THAT(longer, ElementsAre(1, 2, 3, 4, 5, 6));
+    EXPECT_THAT(joined, ElementsAre(1, 2, 3, 4, 5));
+    EXPECT_THAT(Numbers::joining({joined, {}, longer}), ElementsAre(1, 2, 3, 4, 5, 1, 2, 3, 4, 5, 6));
+    Numbers other{7};
+    joined.swap(other);
+    EXPECT_THAT(joined, ElementsAre(7));
+    EXPECT_THAT(other, ElementsAre(1, 2, 3, 4, 5));
+}
+
+TEST(SnapshotListTest, AListMayBeJoinedWithThoseThatItGrewFrom) {
+    const Numbers three = Numbers{1, 2}.appending(3);
+    const Numbers four = three.appending(4);  // in the same buffer
+    EXPECT_THAT(Numbers::joining({four, three, three}), ElementsAre(1, 2, 3, 4, 1, 2, 3, 1, 2, 3));
+}
+
+TEST(SnapshotListTest, JoiningCopiesNoElement) {
+    const SnapshotList<Counted> few(std::vector<Counted>(3));
+    const SnapshotList<Counted> more(std::vector<Counted>(5));
+    Counted::transfers = 0;
+    EXPECT_EQ(SnapshotList<Counted>::joining({few, more}).size(), 8u);
+    EXPECT_EQ(Counted::transfers, 0u);
 }
 
 TEST(SnapshotListTest, AListJoinedWithEmptyOnesIsThatList) {
