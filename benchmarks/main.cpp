@@ -9,8 +9,6 @@
 #include <string_view>
 #include <vector>
 
-#include "platform/linux/HeapGrowth.h"
-
 namespace {
 
 class Table final : public benchmark::BenchmarkReporter {
@@ -52,7 +50,6 @@ class Table final : public benchmark::BenchmarkReporter {
 }  // namespace
 
 int main(int argc, char** argv) {
-    platform::letHeapsGrowAtOnce();  // as the programs do
     benchmark::Initialize(&argc, argv);
     if (benchmark::ReportUnrecognizedArguments(argc, argv))
         return 2;

@@ -4,11 +4,9 @@
 
 #include "apps/vexo/CommandLine.h"
 #include "platform/linux/DescriptorRoom.h"
-#include "platform/linux/HeapGrowth.h"
 
 int main(int argc, char** argv) {
     std::setlocale(LC_ALL, "");
-    platform::letHeapsGrowAtOnce();
     try {
         platform::requireRoomForDescriptors();
         return vexo::runCommandLine(argc, argv);
