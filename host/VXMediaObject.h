@@ -85,7 +85,7 @@ class VXMediaObject final {
     };
     // What most items of a loaded library don't have, or not before somebody looks at them.
     struct Rare {
-        std::optional<std::string> otherPath;  // nil when the path is the ID
+        std::optional<std::string> otherPath;  // nil when the path is the ID, and without one
         std::vector<Attribute> furtherAttributes;
         platform::ImageRef thumbnailImage;  // made when first asked for
         VXMetadataPropertiesRef spotlightProperties;

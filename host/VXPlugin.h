@@ -18,7 +18,8 @@ namespace vexo {
 
 class VXMediaManager;
 
-// Raised whenever a header in host/ or platform/ changes what a built plug-in relies on.
+// Raised by each release, after the first, that changes in a header of host/ or platform/ what a built
+// plug-in relies on.
 inline constexpr int VXHostInterfaceVersion = 1;
 
 // The resources of a plug-in's bundle. Outlives every object made from the bundle's code. Thread-safe.

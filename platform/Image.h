@@ -61,8 +61,8 @@ class Picture {
 class Image;
 using ImageRef = std::shared_ptr<Image>;
 
-// One image may have owners that are counted apart from each other. What tells images apart by their owners
-// asks the image itself, by `weak_from_this`.
+// Made by make_shared. It may have owners that are counted apart from the others, so what tells images apart
+// by their owners asks the image itself, by `weak_from_this`.
 class Image : public std::enable_shared_from_this<Image> {
   public:
     explicit Image(std::shared_ptr<const Picture> picture, std::string name = {});

@@ -43,16 +43,17 @@ class SnapshotList {
 
     // The elements of all lists, one list after another. Where one alone has any it is answered itself.
     static SnapshotList joining(const std::vector<SnapshotList>& lists) {
+        const auto filled = std::ranges::find_if_not(lists, &SnapshotList::empty);
+        if (filled == lists.end())
+            return {};
+        if (std::all_of(filled + 1, lists.end(), [](const SnapshotList& list) { return list.empty(); }))
+            return *filled;
         auto parts = std::make_unique<Parts>();
         for (const SnapshotList& list : lists)
             parts->add(list);
-        if (parts->lists.size() == 1)
-            return parts->lists.front();
         SnapshotList joined;
-        if (!parts->lists.empty()) {
-            joined.count_ = parts->ends.back();
-            joined.buffer_ = std::make_shared<Buffer>(std::move(parts));
-        }
+        joined.count_ = parts->ends.back();
+        joined.buffer_ = std::make_shared<Buffer>(std::move(parts));
         return joined;
     }
 

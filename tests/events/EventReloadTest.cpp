@@ -584,11 +584,17 @@ class CancelledReloadTest : public EventReloadTest {
         plugin().cancelAfter(questions);
         const auto library = plugin()._reloadReelixEvents();
         plugin().neverCancel();
-        return library ? names(library->childGroups()) : std::vector<std::string>{"nil"};
+        eventsOfYears.clear();
+        if (!library)
+            return {"nil"};
+        for (const VXMediaGroupRef& year : library->childGroups())
+            eventsOfYears.push_back(names(year->childGroups()));
+        return names(library->childGroups());
     }
 
     VXMediaGroupRef root;
     int publications = 0;
+    std::vector<std::vector<std::string>> eventsOfYears;
 
   private:
     const std::shared_ptr<int> observer_ = std::make_shared<int>();
@@ -608,6 +614,15 @@ TEST_F(CancelledReloadTest, AnswersTheEventsFiledSoFar) {
     EXPECT_THAT(reloadCancelledAfter(4), ElementsAre("2009"));
     EXPECT_THAT(reloadCancelledAfter(5), ElementsAre("2009", "2008"));
     EXPECT_THAT(reloadCancelledAfter(6), ElementsAre("2009", "2008"));
+}
+
+TEST_F(CancelledReloadTest, LeavesTheEventsFiledSoFarInTheirYears) {
+    reloadCancelledAfter(4);
+    EXPECT_THAT(eventsOfYears, ElementsAre(ElementsAre("A")));
+    for (const int questions : {5, 6, 7}) {
+        reloadCancelledAfter(questions);
+        EXPECT_THAT(eventsOfYears, ElementsAre(ElementsAre("A"), ElementsAre("B"))) << questions;
+    }
 }
 
 TEST_F(CancelledReloadTest, LeavesTheRootUntilTheBranchIsInstalled) {

@@ -159,6 +159,29 @@ TEST_F(StoredMetadataTest, ThreadsThatAskForPropertiesAtOnceGetTheSameObject) {
     }
 }
 
+TEST_F(StoredMetadataTest, WhatFewItemsHaveIsKeptBesideTheRest) {
+    const auto movie = movieAt(environment.home.writeFile("a.mov"));
+    const VXMetadataPropertiesRef properties = movie->spotlightProperties();
+    const platform::ImageRef thumbnail = movie->thumbnailImage();
+    movie->setAttribute(1, "first");
+    movie->setAttribute(2, "second");
+    movie->setPath("/b.mov");
+    EXPECT_EQ(movie->path(), "/b.mov");
+    movie->setPath(movie->ID());
+    EXPECT_EQ(movie->path(), movie->ID());
+    EXPECT_EQ(movie->spotlightProperties(), properties);
+    EXPECT_EQ(movie->thumbnailImage(), thumbnail);
+    EXPECT_EQ(movie->attributes().size(), 2u);
+    EXPECT_EQ(movie->attributeForKey("second"), platform::Value(2));
+
+    const auto others = VXMediaObject::spotlightProperties(environment.home.writeFile("b.mov"));
+    movie->setSpotlightProperties(others);
+    EXPECT_EQ(movie->spotlightProperties(), others);
+    movie->setSpotlightPropertiesOfFile(movie->ID());
+    EXPECT_EQ(fileName(*movie), platform::Value("a.mov"));
+    EXPECT_EQ(movie->thumbnailImage(), thumbnail);
+}
+
 std::size_t allocatedBytes() {
     const struct mallinfo2 info = mallinfo2();
     return info.uordblks + info.hblkhd;

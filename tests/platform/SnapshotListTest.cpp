@@ -163,6 +163,21 @@ TEST(SnapshotListTest, JoinedListsAreListsLikeAnyOther) {
     EXPECT_THAT(other, ElementsAre(1, 2, 3, 4, 5));
 }
 
+TEST(SnapshotListTest, AJoinedListJoinedWithEmptyOnesIsThatList) {
+    const Numbers joined = Numbers::joining({{1, 2}, {3}});
+    EXPECT_EQ(Numbers::joining({{}, joined, {}}).begin(), joined.begin());
+}
+
+TEST(SnapshotListTest, AJoinedListIsWalkedAsLongAsACopyLives) {
+    auto joined = std::make_unique<Numbers>(Numbers::joining({{1, 2}, {3}}));
+    const Numbers copy = *joined;
+    auto place = joined->begin();
+    joined = nullptr;
+    EXPECT_EQ(*++place, 2);
+    EXPECT_EQ(*++place, 3);
+    EXPECT_EQ(++place, copy.end());
+}
+
 TEST(SnapshotListTest, AListMayBeJoinedWithThoseThatItGrewFrom) {
     const Numbers three = Numbers{1, 2}.appending(3);
     const Numbers four = three.appending(4);  // in the same buffer
